@@ -1,0 +1,11 @@
+# Sanitized builds trade hardening for reports; every other build is hardened.
+if(TARN_SANITIZE)
+    add_compile_options(-fsanitize=${TARN_SANITIZE} -fno-sanitize-recover=all -fno-omit-frame-pointer)
+    add_link_options(-fsanitize=${TARN_SANITIZE})
+else()
+    add_compile_options(-fstack-protector-strong -fstack-clash-protection -fcf-protection)
+    add_compile_options($<$<CONFIG:Release>:-D_FORTIFY_SOURCE=2>)
+    add_link_options(-Wl,-z,relro,-z,now -Wl,--as-needed)
+    include(CheckPIESupported)
+    check_pie_supported()
+endif()

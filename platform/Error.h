@@ -1,0 +1,22 @@
+#pragma once
+
+#include <cstdint>
+#include <map>
+#include <string>
+
+namespace tarn {
+
+/// The error value that travels to a client: which domain, which code, and texts for a person.
+struct Error {
+    std::string domain;
+    std::int64_t code = 0;
+    std::map<std::string, std::string> userInfo;
+
+    bool operator==(const Error&) const = default;
+};
+
+/// Keys of Error::userInfo, also used inside `errorDict` and on the transport.
+inline constexpr char localizedDescriptionKey[] = "LocalizedDescription";
+inline constexpr char localizedFailureReasonKey[] = "LocalizedFailureReason";
+
+} // namespace tarn

@@ -1,0 +1,35 @@
+#pragma once
+
+#include <cstdint>
+#include <functional>
+#include <map>
+#include <string>
+#include <string_view>
+
+#include "platform/Registration.h"
+
+namespace tarn {
+
+/// Something that happened to one object. `sender` only identifies it; handlers never dereference it.
+struct Notification {
+    std::string_view name;
+    const void* sender = nullptr;
+    std::map<std::string, std::uint64_t, std::less<>> info;
+};
+
+/// Passes notifications from whoever posts them to whoever listens. Any thread may call.
+class NotificationCenter {
+public:
+    using Handler = std::function<void(const Notification&)>;
+
+    virtual ~NotificationCenter() = default;
+
+    /// `handler` runs on the posting thread, for notifications of that name from that sender only.
+    [[nodiscard]] virtual RegistrationHandle addObserver(std::string_view name, const void* sender,
+                                                         Handler handler) = 0;
+
+    /// Calls the handlers that are registered now, in order of registration, with no lock held.
+    virtual void post(const Notification& notification) = 0;
+};
+
+} // namespace tarn

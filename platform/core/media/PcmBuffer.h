@@ -1,0 +1,19 @@
+#pragma once
+
+#include <cstddef>
+#include <vector>
+
+namespace tarn {
+
+/// Frames on their way to the output. The simulated engine counts frames and leaves `bytes` empty.
+struct PcmBuffer {
+    std::size_t frames = 0;
+    std::vector<std::byte> bytes;
+
+    void clear() {
+        frames = 0;
+        bytes.clear();
+    }
+};
+
+} // namespace tarn
