@@ -1,5 +1,6 @@
 #pragma once
 
+#include <string>
 #include <vector>
 
 #include "platform/MediaMetadataItem.h"
@@ -15,6 +16,9 @@ namespace tarn {
 class MediaAsset {
 public:
     virtual ~MediaAsset() = default;
+
+    /// As openAsset() was given it; names the file where nothing better does.
+    virtual const std::string& URL() const = 0;
 
     virtual const std::vector<MediaMetadataItem>& commonMetadata() const = 0;
 
