@@ -2,6 +2,7 @@
 
 #include <cstdint>
 #include <map>
+#include <optional>
 #include <string>
 
 namespace tarn {
@@ -18,5 +19,11 @@ struct Error {
 /// Keys of Error::userInfo, also used inside `errorDict` and on the transport.
 inline constexpr char localizedDescriptionKey[] = "LocalizedDescription";
 inline constexpr char localizedFailureReasonKey[] = "LocalizedFailureReason";
+
+/// For the log: the texts if there are any, with domain and code.
+std::string describe(const Error& error);
+
+/// As above; "no error given" when there is none.
+std::string describe(const std::optional<Error>& error);
 
 } // namespace tarn
