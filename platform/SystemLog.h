@@ -4,6 +4,7 @@
 #include <cstdint>
 #include <initializer_list>
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <variant>
@@ -15,12 +16,13 @@ enum class LogLevel { standard, error };
 /// The categories of the subsystem "ostrel.pellion".
 enum class LogCategory { standard, extensionLoading, backgroundAppRefresh };
 
-/// One argument of a log line.
+/// One argument of a log line. An absent text is written as "(null)".
 class LogArgument {
 public:
     LogArgument(std::string_view text) : value_(text) {}
     LogArgument(const std::string& text) : value_(std::string_view(text)) {}
-    LogArgument(const char* text) : value_(std::string_view(text)) {}
+    LogArgument(const char* text) : value_(text ? std::string_view(text) : absent) {}
+    LogArgument(const std::optional<std::string>& text) : value_(text ? std::string_view(*text) : absent) {}
     LogArgument(const void* address) : value_(address) {}
     LogArgument(double number) : value_(number) {}
     template <std::integral T>
@@ -29,10 +31,13 @@ public:
     const std::variant<std::string_view, const void*, double, std::int64_t>& value() const { return value_; }
 
 private:
+    static constexpr std::string_view absent = "(null)";
+
     std::variant<std::string_view, const void*, double, std::int64_t> value_;
 };
 
-/// One finished line.
+/// One finished line; `message` begins with the method and the line, and is one line of valid UTF-8 of at
+/// most 3,000 bytes.
 struct LogRecord {
     LogLevel level;
     LogCategory category;
