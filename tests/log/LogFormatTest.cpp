@@ -9,7 +9,6 @@ namespace {
 
 using testing::ElementsAre;
 using testing::EndsWith;
-using testing::Not;
 
 constexpr const char* method = "-[Player play]";
 

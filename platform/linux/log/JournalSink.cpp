@@ -1,11 +1,9 @@
 #include "platform/linux/log/JournalSink.h"
 
-#include <algorithm>
 #include <cerrno>
 #include <string_view>
 #include <sys/socket.h>
 #include <sys/un.h>
-#include <unistd.h>
 #include <utility>
 
 #include "platform/core/log/LogLine.h"
@@ -51,14 +49,9 @@ JournalSink::JournalSink(std::string identifier, std::shared_ptr<LogSink> fallba
       socketPath_(std::move(socketPath)),
       socket_(socket(AF_UNIX, SOCK_DGRAM | SOCK_CLOEXEC, 0)) {}
 
-JournalSink::~JournalSink() {
-    if (socket_ >= 0)
-        close(socket_);
-}
-
 bool JournalSink::take(const LogRecord& record) {
     const std::string datagram = journalDatagram(record, identifier_);
-    if (sendWithoutWaiting(socket_, socketPath_, datagram) >= 0)
+    if (sendWithoutWaiting(socket_.get(), socketPath_, datagram) >= 0)
         return true;
     if (errno == EAGAIN || errno == ENOBUFS)
         return false;

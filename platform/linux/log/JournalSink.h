@@ -3,6 +3,7 @@
 #include <memory>
 #include <string>
 
+#include "platform/linux/FileDescriptor.h"
 #include "platform/linux/log/LossyLogSink.h"
 
 namespace tarn {
@@ -16,10 +17,6 @@ public:
     /// `identifier` is the name of the program in the journal.
     JournalSink(std::string identifier, std::shared_ptr<LogSink> fallback,
                 std::string socketPath = "/run/systemd/journal/socket");
-    ~JournalSink() override;
-
-    JournalSink(const JournalSink&) = delete;
-    JournalSink& operator=(const JournalSink&) = delete;
 
 private:
     bool take(const LogRecord& record) override;
@@ -27,7 +24,7 @@ private:
     const std::string identifier_;
     const std::shared_ptr<LogSink> fallback_;
     const std::string socketPath_;
-    const int socket_;
+    const FileDescriptor socket_;
 };
 
 } // namespace tarn
