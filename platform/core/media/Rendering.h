@@ -2,6 +2,7 @@
 
 #include <chrono>
 #include <cstddef>
+#include <functional>
 #include <memory>
 #include <optional>
 
@@ -14,11 +15,15 @@ namespace tarn {
 class MediaAsset;
 
 /// What one render() made: `frames` output frames that play the media from `start` to `end`.
+///
+/// Spans join: the next one starts where this one ends, and the media moves evenly within a span, so that the
+/// position of every frame follows.
 struct RenderedSpan {
     enum class State {
-        more,   ///< the item goes on behind this span
-        ended,  ///< this span is the item's last (its first, when playing backwards); it may hold no frames
-        failed, ///< the item cannot go on behind this span; `error` says why
+        more,    ///< the item goes on behind this span, which holds at least one frame
+        waiting, ///< nothing is at hand behind this span for now; the rendering says when it goes on
+        ended,   ///< this span is the item's last (its first, when playing backwards); it may hold no frames
+        failed,  ///< the item cannot go on behind this span; `error` says why
     };
 
     std::size_t frames = 0;
@@ -36,10 +41,12 @@ class Rendering {
 public:
     virtual ~Rendering() = default;
 
-    /// Goes on exactly at `position` of the media with the playback rate `rate` (never 0; below 0 is
-    /// backwards). Must precede the first render(). When only the rate differs from the span before, the
-    /// stretcher goes on without a break.
-    virtual void seek(std::chrono::nanoseconds position, float rate) = 0;
+    /// Goes on exactly at `position` of the media (clamped to its length) with the playback rate `rate`
+    /// (finite, never 0; below 0 is backwards), in frames of `format`. Precedes the first render(), and comes
+    /// again whenever one of the three is not what the span before led to.
+    ///
+    /// A rate beyond what can be rendered is rendered as fast or as slow as it can be; the spans tell.
+    virtual void seek(std::chrono::nanoseconds position, float rate, const PcmFormat& format) = 0;
 
     /// Appends at most `maxFrames` output frames to `buffer`, fewer when that is what is at hand.
     virtual RenderedSpan render(PcmBuffer& buffer, std::size_t maxFrames) = 0;
@@ -55,8 +62,10 @@ public:
 
     virtual ~RenderingFactory() = default;
 
-    /// Rendering of `asset` to frames of the format `output`.
-    virtual Outcome open(const std::shared_ptr<MediaAsset>& asset, const PcmFormat& output) = 0;
+    /// Opens `asset`, which makes its item ready to play; nothing is decoded for the ear yet. `goesOn` is
+    /// called on the player thread, outside render(), each time that a rendering which answered `waiting` has
+    /// more; never after the rendering's end.
+    virtual Outcome open(const std::shared_ptr<MediaAsset>& asset, std::function<void()> goesOn) = 0;
 };
 
 } // namespace tarn
