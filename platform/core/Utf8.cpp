@@ -2,6 +2,8 @@
 
 #include <algorithm>
 #include <array>
+#include <cstdint>
+#include <cstring>
 
 namespace tarn {
 
@@ -29,6 +31,14 @@ unsigned char byteAt(std::string_view text, std::size_t index) {
     return static_cast<unsigned char>(text[index]);
 }
 
+bool beginsWithEightAsciiCharacters(std::string_view text) {
+    std::uint64_t bytes = 0;
+    if (text.size() < sizeof bytes)
+        return false;
+    std::memcpy(&bytes, text.data(), sizeof bytes);
+    return (bytes & 0x8080808080808080U) == 0;
+}
+
 } // namespace
 
 std::size_t utf8CharacterLength(std::string_view text) noexcept {
@@ -52,6 +62,10 @@ std::size_t utf8CharacterLength(std::string_view text) noexcept {
 
 bool isValidUtf8(std::string_view text) noexcept {
     while (!text.empty()) {
+        if (beginsWithEightAsciiCharacters(text)) {
+            text.remove_prefix(8);
+            continue;
+        }
         const std::size_t length = utf8CharacterLength(text);
         if (length == 0)
             return false;
