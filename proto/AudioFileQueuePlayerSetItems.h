@@ -1,0 +1,49 @@
+#pragma once
+
+#include <cstddef>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "proto/Message.h"
+
+namespace tarn {
+
+/// A queue player and the player items that it is to play, in order.
+class VLProtoAudioFileQueuePlayerSetItems final : public Message<VLProtoAudioFileQueuePlayerSetItems> {
+public:
+    static constexpr std::string_view className = "VLProtoAudioFileQueuePlayerSetItems";
+
+    const std::optional<std::string>& identifier() const { return identifier_; }
+    void setIdentifier(std::optional<std::string> value) { identifier_ = std::move(value); }
+
+    using playerItemIdentifiersType = std::string;
+    const std::optional<std::vector<std::string>>& playerItemIdentifiers() const {
+        return playerItemIdentifiers_;
+    }
+    void setPlayerItemIdentifiers(std::optional<std::vector<std::string>> list) {
+        playerItemIdentifiers_ = std::move(list);
+    }
+    void clearPlayerItemIdentifiers();
+    void addPlayerItemIdentifiers(std::string element);
+    std::size_t playerItemIdentifiersCount() const {
+        return playerItemIdentifiers_ ? playerItemIdentifiers_->size() : 0;
+    }
+    const std::string& playerItemIdentifiersAtIndex(std::size_t index) const {
+        return playerItemIdentifiers_.value().at(index);
+    }
+
+    static constexpr auto fields() {
+        return std::tuple{required(1, "identifier", &Self::identifier_),
+                          repeated(2, "playerItemIdentifiers", &Self::playerItemIdentifiers_)};
+    }
+
+private:
+    std::optional<std::string> identifier_;
+    std::optional<std::vector<std::string>> playerItemIdentifiers_;
+};
+
+extern template class Message<VLProtoAudioFileQueuePlayerSetItems>;
+
+} // namespace tarn

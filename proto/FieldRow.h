@@ -1,0 +1,92 @@
+#pragma once
+
+#include <concepts>
+#include <cstdint>
+#include <memory>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <tuple>
+#include <type_traits>
+#include <vector>
+
+#include "platform/Data.h"
+#include "platform/core/ProtoCodable.h"
+#include "proto/Boxed.h"
+
+namespace tarn {
+
+template <class Value, class... Choices>
+concept OneOf = (std::same_as<Value, Choices> || ...);
+
+/// How a message holds a scalar: as it is, beside a presence flag when the field is optional.
+template <class Value>
+concept WireScalar =
+    OneOf<Value, bool, std::int32_t, std::int64_t, std::uint32_t, std::uint64_t, float, double>;
+
+/// How a message holds text or bytes: absent and empty differ.
+template <class Value>
+concept WireText =
+    OneOf<Value, std::optional<std::string>, std::optional<Data>, Boxed<std::string>, Boxed<Data>>;
+
+/// How a message holds a repeated field: an emptied list differs from one that was never made.
+template <class Element>
+using WireList = std::optional<std::vector<Element>>;
+
+/// How a message holds an embedded message: shared, so that a payload can be stored in several.
+template <class Value>
+concept WireMessage = std::derived_from<typename Value::element_type, ProtoCodable> &&
+    std::same_as<Value, std::shared_ptr<typename Value::element_type>>;
+
+template <class Value>
+concept WireMessageList = WireMessage<typename Value::value_type::value_type> &&
+    std::same_as<Value, WireList<typename Value::value_type::value_type>>;
+
+/// Everything that a field can be.
+template <class Value>
+concept WireValue = WireScalar<Value> || WireText<Value> || WireMessage<Value> || WireMessageList<Value> ||
+    std::same_as<Value, WireList<std::string>>;
+
+enum class FieldLabel { required, optional, repeated };
+
+/// One row of a message's field table.
+template <class Owner, WireValue Value_, FieldLabel label_>
+struct FieldRow {
+    using Value = Value_;
+    static constexpr FieldLabel label = label_;
+    static constexpr bool isRequired = label == FieldLabel::required;
+    static constexpr bool hasPresenceFlag = label == FieldLabel::optional && WireScalar<Value>;
+
+    unsigned number;
+    std::string_view name; // also the key in the dictionary representation
+    Value Owner::*member;
+};
+
+// What a field table is written with: the field's number, its wire name and where its value is held.
+
+template <class Owner, class Value>
+constexpr auto required(unsigned number, std::string_view name, Value Owner::*member) {
+    return FieldRow<Owner, Value, FieldLabel::required>{number, name, member};
+}
+
+template <class Owner, class Value>
+constexpr auto optional(unsigned number, std::string_view name, Value Owner::*member) {
+    return FieldRow<Owner, Value, FieldLabel::optional>{number, name, member};
+}
+
+template <class Owner, class Value>
+constexpr auto repeated(unsigned number, std::string_view name, Value Owner::*member) {
+    return FieldRow<Owner, Value, FieldLabel::repeated>{number, name, member};
+}
+
+template <class... Rows>
+constexpr bool numbersAscend(const std::tuple<Rows...>& rows) {
+    return std::apply(
+        [](const auto&... row) {
+            unsigned previous = 0;
+            return ((row.number > previous && (previous = row.number, true)) && ...);
+        },
+        rows);
+}
+
+} // namespace tarn

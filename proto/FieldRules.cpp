@@ -1,0 +1,131 @@
+#include "proto/FieldRules.h"
+
+#include <cmath>
+#include <functional>
+#include <limits>
+#include <string_view>
+
+namespace tarn::fieldRules {
+
+bool read(ProtoReader& reader, std::optional<std::string>& value) {
+    if (const auto text = reader.readString())
+        value.emplace(*text);
+    else
+        value.reset();
+    return true;
+}
+
+bool read(ProtoReader& reader, std::optional<Data>& value) {
+    if (const auto bytes = reader.readData())
+        value.emplace(bytes->begin(), bytes->end());
+    else
+        value.reset();
+    return true;
+}
+
+bool read(ProtoReader& reader, WireList<std::string>& value) {
+    if (const auto text = reader.readString()) {
+        if (!value)
+            value.emplace();
+        value->emplace_back(*text);
+    }
+    return true;
+}
+
+bool read(ProtoReader& reader, bool& value) {
+    value = reader.readVarint() != 0;
+    return true;
+}
+
+bool read(ProtoReader& reader, std::int32_t& value) {
+    value = static_cast<std::int32_t>(reader.readVarint());
+    return true;
+}
+
+bool read(ProtoReader& reader, std::int64_t& value) {
+    value = static_cast<std::int64_t>(reader.readVarint());
+    return true;
+}
+
+bool read(ProtoReader& reader, std::uint32_t& value) {
+    value = static_cast<std::uint32_t>(reader.readVarint());
+    return true;
+}
+
+bool read(ProtoReader& reader, std::uint64_t& value) {
+    value = reader.readVarint();
+    return true;
+}
+
+bool read(ProtoReader& reader, float& value) {
+    value = reader.readFloat();
+    return true;
+}
+
+bool read(ProtoReader& reader, double& value) {
+    value = reader.readDouble();
+    return true;
+}
+
+void write(ProtoWriter& writer, unsigned number, const std::optional<std::string>& value) {
+    writer.writeString(value ? std::string_view(*value) : std::string_view(), number);
+}
+
+void write(ProtoWriter& writer, unsigned number, const std::optional<Data>& value) {
+    writer.writeData(value ? std::span(*value) : std::span<const std::uint8_t>(), number);
+}
+
+void write(ProtoWriter& writer, unsigned number, const WireList<std::string>& value) {
+    for (const auto& element : *value)
+        writer.writeString(element, number);
+}
+
+namespace {
+
+std::uint32_t hashOfBytes(std::string_view bytes) {
+    return static_cast<std::uint32_t>(std::hash<std::string_view>()(bytes));
+}
+
+/// Rounds toward zero and saturates; not-a-number gives 0.
+std::uint32_t saturatedToUint32(double value) {
+    constexpr double highest = std::numeric_limits<std::uint32_t>::max();
+    if (!(value > 0))
+        return 0;
+    return value >= highest ? std::numeric_limits<std::uint32_t>::max() : static_cast<std::uint32_t>(value);
+}
+
+} // namespace
+
+std::uint32_t hash(const std::optional<std::string>& value) { return hashOfBytes(*value); }
+
+std::uint32_t hash(const std::optional<Data>& value) {
+    return hashOfBytes({reinterpret_cast<const char*>(value->data()), value->size()});
+}
+
+std::uint32_t hash(const WireList<std::string>& value) {
+    std::uint32_t result = 0;
+    for (const auto& element : *value)
+        result = hashOfElements(result, hashOfBytes(element));
+    return result;
+}
+
+std::uint32_t hash(double value) {
+    constexpr double range = 4294967295.0;
+    const double magnitude = std::fabs(value);
+    const double rounded = std::floor(magnitude + 0.5);
+    return hash(saturatedToUint32(std::fmod(rounded, range))) +
+           saturatedToUint32((magnitude - rounded) * range);
+}
+
+std::uint32_t hashOfElements(std::uint32_t before, std::uint32_t element) {
+    return before * 31 + element + 1;
+}
+
+void put(Dictionary& dictionary, std::string_view name, const WireList<std::string>& value) {
+    DictionaryList list;
+    for (const auto& element : *value)
+        list.push_back({element});
+    dictionary.emplace(name, DictionaryValue{std::move(list)});
+}
+
+} // namespace tarn::fieldRules

@@ -1,0 +1,79 @@
+#pragma once
+
+#include <cstdint>
+#include <memory>
+#include <span>
+#include <string>
+#include <string_view>
+
+#include "platform/core/ProtoCodable.h"
+#include "platform/core/ProtoReader.h"
+#include "proto/FieldRow.h"
+#include "proto/PresenceSet.h"
+
+namespace tarn {
+
+/// The rules that all wire messages share, over the field table of the class: `Class::fields()` tells each
+/// field's number, wire name and place.
+///
+/// Accessors of a field `name`:
+/// - text and bytes: `const std::optional<std::string>& name()`, `setName(value or std::nullopt)`; absent and
+///   empty differ;
+/// - embedded message: `const std::shared_ptr<Class>& name()`, `setName(message or nullptr)`; the message
+///   itself is stored, not a copy;
+/// - scalar: `name()` (0 when it was never set), `setName(value)`;
+/// - optional fields: `hasName()`, and for scalars `setHasName(present)`, which leaves the value alone;
+/// - repeated: see the two classes that have one.
+///
+/// Decoding is lenient where the wire rules are (unknown fields, missing required ones), never allocates
+/// ahead of what has arrived and nests no deeper than the classes do.
+template <class Class>
+class Message : public ProtoCodable {
+public:
+    /// Null when the bytes cannot be decoded. No bytes are an empty message.
+    static std::shared_ptr<Class> fromData(std::span<const std::uint8_t> data);
+
+    bool readFrom(ProtoReader& reader) final;
+    void writeTo(ProtoWriter& writer) const final;
+
+    /// Sets on `other` what is present here; embedded messages are shared with it afterwards.
+    void copyTo(Class& other) const;
+
+    /// A copy that shares nothing with this message.
+    std::shared_ptr<Class> copyWithZone() const;
+
+    /// Replaces by what `other` has, merges embedded messages that both have, and appends lists. A message
+    /// that only `other` has is shared with it afterwards.
+    void mergeFrom(const Class& other);
+
+    bool isEqual(const ProtoCodable& other) const final;
+    std::uint32_t hash() const final;
+    Dictionary dictionaryRepresentation() const final;
+    std::string description() const final;
+
+protected:
+    using Self = Class;
+
+    /// Sets an optional scalar and marks it present.
+    template <WireScalar Scalar>
+    void setFlagged(unsigned fieldNumber, Scalar& field, Scalar value) {
+        field = value;
+        presence_.set(fieldNumber);
+    }
+
+    PresenceSet presence_;
+
+private:
+    const Class& self() const { return static_cast<const Class&>(*this); }
+    Class& self() { return static_cast<Class&>(*this); }
+
+    bool readField(ProtoReader& reader, ProtoKey key);
+    template <class Row>
+    bool hasValue(const Row& row) const;
+    template <class Row>
+    bool isCarried(const Row& row) const;
+    template <class Row>
+    bool isEqualIn(const Row& row, const Class& other) const;
+};
+
+} // namespace tarn

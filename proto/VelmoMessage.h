@@ -1,0 +1,42 @@
+#pragma once
+
+#include <memory>
+#include <string_view>
+
+#include "proto/AudioFilePlayerMessage.h"
+#include "proto/Message.h"
+#include "proto/VelmoPlist.h"
+
+namespace tarn {
+
+/// The envelope: everything that a client sends, and every event that it is sent, is one of these. The
+/// property list is carried for others; this system neither makes nor reads it.
+class VLProtoVelmoMessage final : public Message<VLProtoVelmoMessage> {
+public:
+    static constexpr std::string_view className = "VLProtoVelmoMessage";
+
+    const std::shared_ptr<VLProtoVelmoPlist>& plist() const { return plist_; }
+    void setPlist(std::shared_ptr<VLProtoVelmoPlist> message) { plist_ = std::move(message); }
+    bool hasPlist() const { return plist_ != nullptr; }
+
+    const std::shared_ptr<VLProtoAudioFilePlayerMessage>& audioFilePlayerMessage() const {
+        return audioFilePlayerMessage_;
+    }
+    void setAudioFilePlayerMessage(std::shared_ptr<VLProtoAudioFilePlayerMessage> message) {
+        audioFilePlayerMessage_ = std::move(message);
+    }
+    bool hasAudioFilePlayerMessage() const { return audioFilePlayerMessage_ != nullptr; }
+
+    static constexpr auto fields() {
+        return std::tuple{optional(1, "plist", &Self::plist_),
+                          optional(2, "audioFilePlayerMessage", &Self::audioFilePlayerMessage_)};
+    }
+
+private:
+    std::shared_ptr<VLProtoVelmoPlist> plist_;
+    std::shared_ptr<VLProtoAudioFilePlayerMessage> audioFilePlayerMessage_;
+};
+
+extern template class Message<VLProtoVelmoMessage>;
+
+} // namespace tarn
