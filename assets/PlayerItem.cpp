@@ -1,0 +1,82 @@
+#include "assets/PlayerItem.h"
+
+#include <utility>
+
+#include "proto/AudioFilePlayerStatus.h"
+#include "proto/ObjectMessage.h"
+#include "proto/VelmoMessage.h"
+
+namespace tarn {
+
+std::shared_ptr<VLTorviAudioFilePlayerItem>
+VLTorviAudioFilePlayerItem::initWithPlayerItem(NotificationCenter& notifications,
+                                               std::shared_ptr<MediaItem> playerItem, std::string identifier,
+                                               std::shared_ptr<EventSink> audioServer) {
+    std::shared_ptr<VLTorviAudioFilePlayerItem> item(
+        new VLTorviAudioFilePlayerItem(std::move(playerItem), std::move(identifier), std::move(audioServer)));
+    item->startObserving(notifications);
+    return item;
+}
+
+VLTorviAudioFilePlayerItem::VLTorviAudioFilePlayerItem(std::shared_ptr<MediaItem> playerItem,
+                                                       std::string identifier,
+                                                       std::shared_ptr<EventSink> audioServer)
+    : playerItem_(std::move(playerItem)),
+      audioServer_(std::move(audioServer)),
+      identifier_(std::move(identifier)) {}
+
+void VLTorviAudioFilePlayerItem::startObserving(NotificationCenter& notifications) {
+    // Weakly, or the observation would keep the wrapper, and the wrapper keeps the observation.
+    statusObserver_ = VLTorviKeyValueObserverHelper::startObservingObject(
+        *playerItem_, MediaItem::statusKeyPath,
+        [weakSelf = weak_from_this()](Observable&, const ChangeDescription&) {
+            if (auto self = weakSelf.lock())
+                self->_reportStatus();
+        });
+    didReachEnd_ = addObserver(notifications, MediaItem::didPlayToEndTime,
+                               &VLTorviAudioFilePlayerItem::_playerItemDidReachEnd);
+    failedToReachEnd_ = addObserver(notifications, MediaItem::failedToPlayToEndTime,
+                                    &VLTorviAudioFilePlayerItem::_playerItemFailedToReachEnd);
+    timeJumped_ =
+        addObserver(notifications, MediaItem::timeJumped, &VLTorviAudioFilePlayerItem::_playerItemTimeJumped);
+}
+
+RegistrationHandle VLTorviAudioFilePlayerItem::addObserver(NotificationCenter& notifications,
+                                                           std::string_view name,
+                                                           void (VLTorviAudioFilePlayerItem::*handler)()) {
+    return notifications.addObserver(name, playerItem_.get(),
+                                     [weakSelf = weak_from_this(), handler](const Notification&) {
+                                         if (auto self = weakSelf.lock())
+                                             (self.get()->*handler)();
+                                     });
+}
+
+void VLTorviAudioFilePlayerItem::_reportStatus() {
+    auto status = VLProtoAudioFilePlayerStatus::statusMessageFromPlayerItem(*playerItem_, identifier_);
+    send(*status->velmoMessageForPlayerItemSetStatus());
+}
+
+void VLTorviAudioFilePlayerItem::_playerItemDidReachEnd() {
+    send(*objectMessage()->velmoMessageForPlayerItemNotifyDidPlayToEndTime());
+}
+
+void VLTorviAudioFilePlayerItem::_playerItemFailedToReachEnd() {
+    send(*objectMessage()->velmoMessageForPlayerItemNotifyFailedToPlayToEndTime());
+}
+
+void VLTorviAudioFilePlayerItem::_playerItemTimeJumped() {
+    send(*objectMessage()->velmoMessageForPlayerItemNotifyTimeJumped());
+}
+
+std::shared_ptr<VLProtoObjectMessage> VLTorviAudioFilePlayerItem::objectMessage() const {
+    auto message = std::make_shared<VLProtoObjectMessage>();
+    message->setIdentifier(identifier_);
+    return message;
+}
+
+void VLTorviAudioFilePlayerItem::send(const VLProtoVelmoMessage& envelope) {
+    if (audioServer_)
+        audioServer_->sendData(envelope.serialize());
+}
+
+} // namespace tarn
