@@ -1,6 +1,7 @@
 #pragma once
 
 #include <cstdint>
+#include <memory>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -9,6 +10,11 @@
 #include "proto/Message.h"
 
 namespace tarn {
+
+class MediaItem;
+class MediaQueuePlayer;
+struct Error;
+enum class MediaStatus : std::int32_t;
 
 /// Status of a player item or queue player (0 unknown, 1 ready to play, 2 failed), with the error that
 /// explains a failure. `errorDict` is a binary property list of the error's texts.
@@ -38,6 +44,14 @@ public:
     void setErrorDict(std::optional<Data> value) { errorDict_ = std::move(value); }
     bool hasErrorDict() const { return errorDict_.has_value(); }
 
+    /// What the item reports now: its status, and its error when it has one.
+    static std::shared_ptr<VLProtoAudioFilePlayerStatus>
+    statusMessageFromPlayerItem(const MediaItem& playerItem, std::optional<std::string> identifier);
+
+    /// What the queue player reports now: its status, and its error when it has one.
+    static std::shared_ptr<VLProtoAudioFilePlayerStatus>
+    statusMessageFromPlayer(const MediaQueuePlayer& player, std::optional<std::string> identifier);
+
     static constexpr auto fields() {
         return std::tuple{
             optional(1, "identifier", &Self::identifier_), optional(2, "status", &Self::status_),
@@ -46,6 +60,10 @@ public:
     }
 
 private:
+    static std::shared_ptr<VLProtoAudioFilePlayerStatus>
+    _statusMessageStatus(MediaStatus status, const std::optional<Error>& error,
+                         std::optional<std::string> identifier);
+
     std::optional<std::string> identifier_;
     std::int32_t status_ = 0;
     std::optional<std::string> errorDomain_;

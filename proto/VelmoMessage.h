@@ -27,6 +27,18 @@ public:
     }
     bool hasAudioFilePlayerMessage() const { return audioFilePlayerMessage_ != nullptr; }
 
+    /// A new envelope around a new audio message that holds `subMessage` itself in the field of `setter`.
+    template <class Container>
+    static std::shared_ptr<VLProtoVelmoMessage>
+    velmoMessageWithSubMessage(std::shared_ptr<Container> subMessage,
+                               void (VLProtoAudioFilePlayerMessage::*setter)(std::shared_ptr<Container>)) {
+        auto audioMessage = std::make_shared<VLProtoAudioFilePlayerMessage>();
+        ((*audioMessage).*setter)(std::move(subMessage));
+        auto envelope = std::make_shared<VLProtoVelmoMessage>();
+        envelope->setAudioFilePlayerMessage(std::move(audioMessage));
+        return envelope;
+    }
+
     static constexpr auto fields() {
         return std::tuple{optional(1, "plist", &Self::plist_),
                           optional(2, "audioFilePlayerMessage", &Self::audioFilePlayerMessage_)};
