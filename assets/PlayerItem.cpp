@@ -3,6 +3,7 @@
 #include <utility>
 
 #include "proto/AudioFilePlayerStatus.h"
+#include "proto/Envelope.h"
 #include "proto/ObjectMessage.h"
 #include "proto/VelmoMessage.h"
 
@@ -53,19 +54,19 @@ RegistrationHandle VLTorviAudioFilePlayerItem::addObserver(NotificationCenter& n
 
 void VLTorviAudioFilePlayerItem::_reportStatus() {
     auto status = VLProtoAudioFilePlayerStatus::statusMessageFromPlayerItem(*playerItem_, identifier_);
-    send(*status->velmoMessageForPlayerItemSetStatus());
+    send(*velmoMessageForPlayerItemSetStatus(std::move(status)));
 }
 
 void VLTorviAudioFilePlayerItem::_playerItemDidReachEnd() {
-    send(*objectMessage()->velmoMessageForPlayerItemNotifyDidPlayToEndTime());
+    send(*velmoMessageForPlayerItemNotifyDidPlayToEndTime(objectMessage()));
 }
 
 void VLTorviAudioFilePlayerItem::_playerItemFailedToReachEnd() {
-    send(*objectMessage()->velmoMessageForPlayerItemNotifyFailedToPlayToEndTime());
+    send(*velmoMessageForPlayerItemNotifyFailedToPlayToEndTime(objectMessage()));
 }
 
 void VLTorviAudioFilePlayerItem::_playerItemTimeJumped() {
-    send(*objectMessage()->velmoMessageForPlayerItemNotifyTimeJumped());
+    send(*velmoMessageForPlayerItemNotifyTimeJumped(objectMessage()));
 }
 
 std::shared_ptr<VLProtoObjectMessage> VLTorviAudioFilePlayerItem::objectMessage() const {

@@ -11,6 +11,7 @@
 #include "proto/AudioFilePlayerStatus.h"
 #include "proto/AudioFilePlayerUpdateContainedIdentifier.h"
 #include "proto/AudioFileQueuePlayerSetRate.h"
+#include "proto/Envelope.h"
 #include "proto/VelmoMessage.h"
 #include "queueplayer/RateThreshold.h"
 
@@ -75,7 +76,7 @@ VLTorviAudioFileQueuePlayer::observe(std::string_view keyPath,
 
 void VLTorviAudioFileQueuePlayer::_reportStatus() {
     auto status = VLProtoAudioFilePlayerStatus::statusMessageFromPlayer(*queuePlayer_, identifier_);
-    send(*status->velmoMessageForQueuePlayerSetStatus());
+    send(*velmoMessageForQueuePlayerSetStatus(std::move(status)));
 }
 
 void VLTorviAudioFileQueuePlayer::_reportRate() {
@@ -83,7 +84,7 @@ void VLTorviAudioFileQueuePlayer::_reportRate() {
     auto message = std::make_shared<VLProtoAudioFileQueuePlayerSetRate>();
     message->setIdentifier(identifier_);
     message->setRate(queuePlayer_->rate());
-    send(*message->velmoMessage());
+    send(*velmoMessage(std::move(message)));
 }
 
 void VLTorviAudioFileQueuePlayer::_reportCurrentItem() {
@@ -92,7 +93,7 @@ void VLTorviAudioFileQueuePlayer::_reportCurrentItem() {
     message->setIdentifier(identifier_);
     if (auto item = queuePlayer_->currentItem(); item && playerItemManager_)
         message->setContainedIdentifier(playerItemManager_->identifierForPlayerItem(item.get()));
-    send(*message->velmoMessageForQueuePlayerSetCurrentItem());
+    send(*velmoMessageForQueuePlayerSetCurrentItem(std::move(message)));
 }
 
 void VLTorviAudioFileQueuePlayer::send(const VLProtoVelmoMessage& envelope) {
