@@ -1,0 +1,62 @@
+#include "platform/core/localization/DirectoryLocalization.h"
+
+#include <cstdlib>
+#include <filesystem>
+#include <system_error>
+#include <utility>
+
+#include "platform/core/localization/DirectoryBundle.h"
+#include "platform/core/localization/LanguageChoice.h"
+
+namespace tarn {
+
+namespace {
+
+namespace fs = std::filesystem;
+
+/// "share/tarn" stands beside the folder of the program, in the build tree and wherever it is installed.
+std::string systemErrorBundlePath() {
+    constexpr const char* bundle = "tarn/errors.bundle";
+    std::error_code error;
+    const fs::path program = fs::read_symlink("/proc/self/exe", error);
+    const fs::path besideProgram = program.parent_path().parent_path() / "share" / bundle;
+    return fs::is_directory(besideProgram, error) ? besideProgram : fs::path(TARN_DATA_FOLDER) / bundle;
+}
+
+std::string environmentVariable(const char* name) {
+    const char* value = std::getenv(name);
+    return value ? value : "";
+}
+
+} // namespace
+
+DirectoryLocalization::DirectoryLocalization(std::string errorBundlePath,
+                                             std::vector<std::string> preferredLanguages)
+    : errorBundlePath_(std::move(errorBundlePath)), preferredLanguages_(std::move(preferredLanguages)) {}
+
+std::unique_ptr<Bundle> DirectoryLocalization::openBundle(const std::string& path) const {
+    std::error_code error;
+    return fs::is_directory(path, error) ? std::make_unique<DirectoryBundle>(path, preferredLanguages_)
+                                         : nullptr;
+}
+
+bool DirectoryLocalization::fileExists(const std::string& path) const {
+    std::error_code error;
+    return fs::exists(path, error);
+}
+
+std::optional<Bundle::Strings> DirectoryLocalization::readStringsFile(const std::string& path) const {
+    return readStringsFileAt(path);
+}
+
+std::vector<std::string>
+DirectoryLocalization::preferredLocalizations(const std::vector<std::string>& localizations,
+                                              const std::vector<std::string>& preferences) const {
+    return choosePreferredLocalizations(localizations, preferences);
+}
+
+DirectoryLocalization systemLocalization() {
+    return {systemErrorBundlePath(), languagesFromEnvironment(environmentVariable)};
+}
+
+} // namespace tarn

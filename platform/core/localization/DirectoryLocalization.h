@@ -1,0 +1,29 @@
+#pragma once
+
+#include "platform/Localization.h"
+
+namespace tarn {
+
+/// Localization from folders of the file system.
+class DirectoryLocalization final : public Localization {
+public:
+    DirectoryLocalization(std::string errorBundlePath, std::vector<std::string> preferredLanguages);
+
+    std::vector<std::string> preferredLanguages() const override { return preferredLanguages_; }
+    std::string errorBundlePath() const override { return errorBundlePath_; }
+    std::unique_ptr<Bundle> openBundle(const std::string& path) const override;
+    bool fileExists(const std::string& path) const override;
+    std::optional<Bundle::Strings> readStringsFile(const std::string& path) const override;
+    std::vector<std::string>
+    preferredLocalizations(const std::vector<std::string>& localizations,
+                           const std::vector<std::string>& preferences) const override;
+
+private:
+    const std::string errorBundlePath_;
+    const std::vector<std::string> preferredLanguages_;
+};
+
+/// The tables that are installed, or built, with the running program, in the language of its environment.
+DirectoryLocalization systemLocalization();
+
+} // namespace tarn
