@@ -1,0 +1,78 @@
+#include "platform/simulated/SimulatedLocalization.h"
+
+#include <utility>
+
+#include "platform/core/localization/LanguageChoice.h"
+
+namespace tarn {
+
+namespace {
+
+std::string tablePath(const std::string& bundle, const std::string& language, const std::string& table) {
+    return bundle + "/" + language + "/" + table + ".strings";
+}
+
+class SimulatedBundle final : public Bundle {
+public:
+    SimulatedBundle(const SimulatedLocalization& localization, std::string path,
+                    const std::set<std::string>& languages)
+        : localization_(localization),
+          path_(std::move(path)),
+          languages_(languages.begin(), languages.end()) {}
+
+    std::vector<std::string> localizations() const override { return languages_; }
+
+    std::optional<std::string> pathForResource(const std::string& name, const std::string& type,
+                                               const std::string& localization) const override {
+        std::string path = path_ + "/" + localization + "/" + name + "." + type;
+        return localization_.fileExists(path) ? std::optional(std::move(path)) : std::nullopt;
+    }
+
+    std::string localizedString(const std::string& key, const std::string& defaultValue,
+                                const std::string& table) const override {
+        auto languages = localization_.preferredLocalizations(languages_, localization_.preferredLanguages());
+        languages.emplace_back("en");
+        for (const std::string& language : languages)
+            if (const auto strings = localization_.readStringsFile(tablePath(path_, language, table)))
+                if (const auto entry = strings->find(key); entry != strings->end())
+                    return entry->second;
+        return defaultValue.empty() ? key : defaultValue;
+    }
+
+private:
+    const SimulatedLocalization& localization_;
+    const std::string path_;
+    const std::vector<std::string> languages_;
+};
+
+} // namespace
+
+void SimulatedLocalization::setTable(const std::string& bundlePath, const std::string& language,
+                                     std::optional<Bundle::Strings> strings) {
+    bundles_[bundlePath].insert(language);
+    files_[bundlePath];
+    files_[tablePath(bundlePath, language, "Localizable")] = std::move(strings);
+}
+
+void SimulatedLocalization::addFile(const std::string& path) { files_[path]; }
+
+std::unique_ptr<Bundle> SimulatedLocalization::openBundle(const std::string& path) const {
+    const auto bundle = bundles_.find(path);
+    return bundle == bundles_.end() ? nullptr
+                                    : std::make_unique<SimulatedBundle>(*this, path, bundle->second);
+}
+
+bool SimulatedLocalization::fileExists(const std::string& path) const { return files_.contains(path); }
+
+std::optional<Bundle::Strings> SimulatedLocalization::readStringsFile(const std::string& path) const {
+    const auto file = files_.find(path);
+    return file == files_.end() ? std::nullopt : file->second;
+}
+
+std::vector<std::string>
+SimulatedLocalization::preferredLocalizations(const std::vector<std::string>& localizations,
+                                              const std::vector<std::string>& preferences) const {
+    return choosePreferredLocalizations(localizations, preferences);
+}
+
+} // namespace tarn
