@@ -1,0 +1,118 @@
+#include "platform/linux/controls/LinuxMediaControls.h"
+
+#include <cassert>
+#include <utility>
+
+#include "platform/core/RemoteTargets.h"
+#include "platform/linux/controls/BusAddress.h"
+#include "platform/linux/controls/BusConnection.h"
+#include "platform/linux/controls/BusLoop.h"
+#include "platform/linux/controls/BusText.h"
+#include "platform/linux/controls/MprisObject.h"
+#include "platform/linux/controls/PublicationBoard.h"
+#include "platform/linux/controls/RemoteCommandThread.h"
+#include "platform/linux/controls/SleepGuard.h"
+
+namespace tarn {
+
+namespace {
+
+/// What the player is called on the bus, and for a person when its application has no name.
+constexpr char serviceName[] = "tarnd";
+
+} // namespace
+
+/// The board and the targets are touched by any thread, the state and the bus by the bus thread only.
+class LinuxMediaControls::Implementation {
+public:
+    Implementation(ApplicationName applicationName, Addresses addresses)
+        : applicationName_(std::move(applicationName)),
+          mpris_(loop_, commands_, serviceName),
+          session_(loop_.event(), std::move(addresses.sessionBus), "session bus",
+                   BusConnection::Report::outages, mpris_),
+          sleep_(loop_, commands_, std::move(addresses.systemBus)) {
+        state_.application = label(std::nullopt);
+        loop_.start();
+    }
+
+    ~Implementation() {
+        board_->close();
+        loop_.stop();
+    }
+
+    RemoteTargets& targets() { return targets_; }
+    PublicationBoard& board() { return *board_; }
+
+private:
+    bool playerLives() const {
+        for (const auto kind : {RemoteCommandKind::pause, RemoteCommandKind::play,
+                                RemoteCommandKind::togglePlayPause, RemoteCommandKind::nextTrack})
+            if (!targets_.offers(kind))
+                return false;
+        return true;
+    }
+
+    ApplicationLabel label(const std::optional<std::string>& application) const {
+        const auto named = [this](const std::string& entry) -> std::optional<ApplicationLabel> {
+            const auto name = applicationName_(entry);
+            if (!name || name->empty())
+                return std::nullopt;
+            return ApplicationLabel{busText(*name), busText(entry)};
+        };
+        std::optional<ApplicationLabel> found;
+        if (application)
+            found = named(*application);
+        if (!found)
+            found = named(serviceName);
+        return found.value_or(ApplicationLabel{serviceName, ""});
+    }
+
+    void refresh() {
+        const PublicationBoard::Snapshot snapshot = board_->take();
+        if (std::exchange(publicationSeen_, snapshot.number) != snapshot.number)
+            state_ = state_.next({snapshot.info, snapshot.time, label(snapshot.application)});
+        else if (!snapshot.application)
+            state_.application = label(std::nullopt);
+        const bool alive = playerLives();
+        if (alive)
+            session_.open();
+        mpris_.show(state_, alive);
+        sleep_.setPlaying(alive && state_.playbackStatus == PlaybackStatus::playing);
+    }
+
+    const ApplicationName applicationName_;
+    BusLoop loop_;
+    const std::shared_ptr<PublicationBoard> board_ =
+        std::make_shared<PublicationBoard>([this] { loop_.post([this] { refresh(); }); });
+    RemoteTargets targets_{[board = board_] { board->touch(); }};
+    RemoteCommandThread commands_{targets_};
+    MprisState state_;
+    std::uint64_t publicationSeen_ = 0;
+    MprisObject mpris_;
+    BusConnection session_;
+    SleepGuard sleep_;
+};
+
+LinuxMediaControls::Addresses LinuxMediaControls::Addresses::fromEnvironment() {
+    return {sessionBusAddress(), systemBusAddress()};
+}
+
+LinuxMediaControls::LinuxMediaControls(ApplicationName applicationName, Addresses addresses)
+    : implementation_(std::make_unique<Implementation>(std::move(applicationName), std::move(addresses))) {}
+
+LinuxMediaControls::~LinuxMediaControls() = default;
+
+RemoteCommandCenter& LinuxMediaControls::remoteCommands() { return implementation_->targets(); }
+
+void LinuxMediaControls::setParentApplication(Origin,
+                                              const std::optional<std::string>& applicationIdentifier) {
+    implementation_->board().setApplication(applicationIdentifier);
+}
+
+void LinuxMediaControls::setNowPlayingInfo(Origin, const NowPlayingInfo& info,
+                                           [[maybe_unused]] int mergePolicy) {
+    assert(mergePolicy == mergePolicyReplace);
+    implementation_->board().publish(info);
+}
+
+} // namespace tarn

@@ -1,0 +1,47 @@
+#include "platform/linux/controls/RemoteCommandThread.h"
+
+#include <utility>
+
+#include <pthread.h>
+
+namespace tarn {
+
+RemoteCommandThread::RemoteCommandThread(RemoteTargets& targets)
+    : targets_(targets), thread_([this] { run(); }) {}
+
+RemoteCommandThread::~RemoteCommandThread() {
+    {
+        const std::lock_guard lock(mutex_);
+        ending_ = true;
+    }
+    changed_.notify_one();
+    thread_.join();
+}
+
+bool RemoteCommandThread::deliver(RemoteCommandKind kind, Completion completion) {
+    {
+        const std::lock_guard lock(mutex_);
+        if (waiting_.size() >= limit)
+            return false;
+        waiting_.push_back({kind, std::move(completion)});
+    }
+    changed_.notify_one();
+    return true;
+}
+
+void RemoteCommandThread::run() {
+    pthread_setname_np(pthread_self(), "remote commands");
+    std::unique_lock lock(mutex_);
+    for (;;) {
+        changed_.wait(lock, [this] { return ending_ || !waiting_.empty(); });
+        if (ending_)
+            return;
+        const Delivery delivery = std::move(waiting_.front());
+        waiting_.pop_front();
+        lock.unlock();
+        delivery.completion(targets_.deliver(delivery.kind));
+        lock.lock();
+    }
+}
+
+} // namespace tarn
