@@ -46,7 +46,16 @@ bool DirectoryLocalization::fileExists(const std::string& path) const {
 }
 
 std::optional<Bundle::Strings> DirectoryLocalization::readStringsFile(const std::string& path) const {
-    return readStringsFileAt(path);
+    auto known = readFiles_.withLocked([&](const auto& files) {
+        const auto file = files.find(path);
+        return file == files.end() ? std::nullopt : std::optional(file->second);
+    });
+    if (known)
+        return known;
+    auto strings = readStringsFileAt(path);
+    if (strings)
+        readFiles_.withLocked([&](auto& files) { files.insert_or_assign(path, *strings); });
+    return strings;
 }
 
 std::vector<std::string>
@@ -55,8 +64,9 @@ DirectoryLocalization::preferredLocalizations(const std::vector<std::string>& lo
     return choosePreferredLocalizations(localizations, preferences);
 }
 
-DirectoryLocalization systemLocalization() {
-    return {systemErrorBundlePath(), languagesFromEnvironment(environmentVariable)};
+std::unique_ptr<Localization> systemLocalization() {
+    return std::make_unique<DirectoryLocalization>(systemErrorBundlePath(),
+                                                   languagesFromEnvironment(environmentVariable));
 }
 
 } // namespace tarn

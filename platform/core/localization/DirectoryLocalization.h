@@ -1,10 +1,11 @@
 #pragma once
 
 #include "platform/Localization.h"
+#include "platform/core/MutexProtected.h"
 
 namespace tarn {
 
-/// Localization from folders of the file system.
+/// Localization from folders of the file system. A strings file that could be read once is not read again.
 class DirectoryLocalization final : public Localization {
 public:
     DirectoryLocalization(std::string errorBundlePath, std::vector<std::string> preferredLanguages);
@@ -21,9 +22,10 @@ public:
 private:
     const std::string errorBundlePath_;
     const std::vector<std::string> preferredLanguages_;
+    mutable MutexProtected<std::map<std::string, Bundle::Strings>> readFiles_;
 };
 
 /// The tables that are installed, or built, with the running program, in the language of its environment.
-DirectoryLocalization systemLocalization();
+std::unique_ptr<Localization> systemLocalization();
 
 } // namespace tarn
