@@ -1,0 +1,30 @@
+#pragma once
+
+#include <optional>
+#include <span>
+#include <string>
+
+#include "platform/Data.h"
+#include "platform/Error.h"
+
+namespace tarn {
+
+/// A client's grant: `token` stands for the file at `path`.
+struct Extension {
+    std::string token;
+    std::string path;
+};
+
+/// How a callback was called.
+struct CallReply {
+    std::optional<Data> data;
+    std::optional<Error> error;
+};
+
+/// The bodies of frames. Decoding yields none when the bytes are no such message or lack what it must have.
+Data encodeExtension(const Extension& extension);
+std::optional<Extension> decodeExtension(std::span<const std::uint8_t> body);
+Data encodeReply(const std::optional<Data>& data, const std::optional<Error>& error);
+std::optional<CallReply> decodeReply(std::span<const std::uint8_t> body);
+
+} // namespace tarn
