@@ -19,7 +19,11 @@ public:
     virtual void call(const std::optional<Data>& data, const std::optional<Error>& error) = 0;
 };
 
-/// One call as it arrived: the bytes of an envelope, and the callback if the client wants an answer.
+/// One call as it arrived: the bytes of an envelope, and its callback. When the client wants no answer, the
+/// callback is null or drops what it is called with.
+///
+/// A callback is kept until its call is done with: by the callbacks that live the transport knows how much a
+/// client has sent ahead, and when to stop reading.
 struct ReceivedCall {
     Data data;
     std::unique_ptr<ClientCallback> callback;
@@ -48,6 +52,9 @@ public:
 ///
 /// Exactly one of the two handlers runs, once, on the I/O thread, never inside a send; also when the loss
 /// came before the handlers were set. Letting a connection go does not close it.
+///
+/// Object and handlers are set, and the connection is resumed, while it is offered to the delegate;
+/// remoteObjectProxy() is for any thread.
 class ServiceConnection {
 public:
     virtual ~ServiceConnection() = default;
