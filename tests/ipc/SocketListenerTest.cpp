@@ -1,0 +1,293 @@
+#include "platform/linux/ipc/SocketListener.h"
+
+#include <fcntl.h>
+#include <sys/socket.h>
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <cstdlib>
+#include <filesystem>
+#include <thread>
+
+#include "platform/core/LiveObjects.h"
+#include "platform/linux/ipc/SocketAddress.h"
+#include "platform/linux/ipc/SocketListeners.h"
+#include "platform/linux/ipc/TransportMessages.h"
+#include "tests/ipc/FakeService.h"
+#include "tests/ipc/RawClient.h"
+#include "tests/support/CapturedLog.h"
+#include "tests/support/TemporaryFolder.h"
+
+namespace tarn {
+namespace {
+
+using testing::Contains;
+using testing::ElementsAre;
+using testing::HasSubstr;
+using testing::IsEmpty;
+using testing::SizeIs;
+
+Data bytes(std::string_view text) { return {text.begin(), text.end()}; }
+
+void echo(ReceivedCall call) { call.callback->call(call.data, std::nullopt); }
+
+std::size_t openFiles() {
+    const std::filesystem::directory_iterator files("/proc/self/fd");
+    return static_cast<std::size_t>(std::distance(begin(files), end(files)));
+}
+
+/// A listener on a socket of its own, with a service behind it.
+class Server {
+public:
+    explicit Server(FakeService::Answer answer = nullptr) : service(std::move(answer)) {
+        ::setenv("XDG_RUNTIME_DIR", folder_.path().c_str(), 1);
+        listener_ = listeners_.createWithServiceName("ostrel.test");
+        listener_->setDelegate(&service);
+        listener_->resume();
+    }
+
+    std::string path() const { return (folder_ / "ostrel.test").string(); }
+    RawClient connect() const { return RawClient(path()); }
+
+    CapturedLog log;
+    TokenTable tokens;
+    FakeService service;
+
+private:
+    TemporaryFolder folder_;
+    SocketListeners listeners_{tokens};
+    std::unique_ptr<ServiceListener> listener_;
+};
+
+TEST(SocketListener, AnswersEveryCallOnTheConnectionThatItCameOn) {
+    Server server;
+    auto first = server.connect();
+    ASSERT_TRUE(first.send(FrameKind::call, 7, "first"));
+    server.service.journalOf(2);
+    auto second = server.connect();
+    ASSERT_TRUE(second.send(FrameKind::call, 7, "second"));
+    EXPECT_THAT(server.service.journalOf(4), ElementsAre("offered", "call first", "offered", "call second"));
+
+    auto calls = server.service.takeKeptCalls();
+    ASSERT_THAT(calls, SizeIs(2));
+    calls[1].callback->call(std::nullopt, Error{"domain", -3, {{"key", "text"}}});
+    calls[0].callback->call(bytes("data"), std::nullopt);
+    calls[0].callback->call(bytes("again"), std::nullopt);
+    calls.clear();
+
+    const auto toFirst = first.receive();
+    ASSERT_TRUE(toFirst);
+    EXPECT_EQ(toFirst->kind, FrameKind::reply);
+    EXPECT_EQ(toFirst->callId, 7U);
+    EXPECT_EQ(decodeReply(toFirst->body)->data, bytes("data"));
+    const auto toSecond = second.receive();
+    ASSERT_TRUE(toSecond);
+    EXPECT_EQ(decodeReply(toSecond->body)->data, std::nullopt);
+    EXPECT_EQ(decodeReply(toSecond->body)->error, (Error{"domain", -3, {{"key", "text"}}}));
+
+    ASSERT_TRUE(first.send(FrameKind::call, 8, "next"));
+    server.service.journalOf(5);
+    server.service.takeKeptCalls();
+    const auto next = first.receive();
+    ASSERT_TRUE(next);
+    EXPECT_EQ(next->kind, FrameKind::released) << "the second answer to call 7 must not be there";
+    EXPECT_EQ(next->callId, 8U);
+}
+
+TEST(SocketListener, SendsNothingForACallThatWantsNoAnswer) {
+    Server server(echo);
+    auto client = server.connect();
+    ASSERT_TRUE(client.send(FrameKind::call, 0, "quiet"));
+    ASSERT_TRUE(client.send(FrameKind::call, 1, "loud"));
+    EXPECT_EQ(client.receive()->callId, 1U);
+}
+
+TEST(SocketListener, SendsEventsAndAnswersInTheOrderInWhichTheyWereMade) {
+    constexpr int count = 1'000;
+    FakeService* service = nullptr;
+    Server server([&](ReceivedCall call) {
+        service->connection()->remoteObjectProxy().receiveData(call.data);
+        echo(std::move(call));
+    });
+    service = &server.service;
+    auto client = server.connect();
+    std::jthread sender([&] {
+        for (int i = 1; i <= count; ++i)
+            ASSERT_TRUE(client.send(FrameKind::call, static_cast<std::uint64_t>(i), std::to_string(i)));
+    });
+    for (int i = 1; i <= count; ++i) {
+        const auto event = client.receive();
+        const auto reply = client.receive();
+        ASSERT_TRUE(event && reply);
+        ASSERT_EQ(event->kind, FrameKind::event);
+        ASSERT_EQ(event->body, bytes(std::to_string(i)));
+        ASSERT_EQ(reply->kind, FrameKind::reply);
+        ASSERT_EQ(reply->callId, static_cast<std::uint64_t>(i));
+    }
+}
+
+TEST(SocketListener, ReadsWhatAClientSentBeforeItHungUp) {
+    Server server(echo);
+    auto client = server.connect();
+    for (int i = 0; i < 3; ++i)
+        ASSERT_TRUE(client.send(FrameKind::call, 0, "call"));
+    client.hangUp();
+    EXPECT_THAT(server.service.journalOf(5),
+                ElementsAre("offered", "call call", "call call", "call call", "invalidated"));
+}
+
+TEST(SocketListener, NoticesAHangUpBeforeTheClientThatComesBack) {
+    constexpr std::size_t rounds = 500;
+    Server server(echo);
+    for (std::size_t i = 0; i < rounds; ++i)
+        ASSERT_TRUE(server.connect().send(FrameKind::call, 0, ""));
+    const auto journal = server.service.journalOf(3 * rounds);
+    ASSERT_THAT(journal, SizeIs(3 * rounds));
+    for (std::size_t i = 0; i < rounds; ++i)
+        EXPECT_THAT(std::vector(&journal[3 * i], &journal[3 * i] + 3),
+                    ElementsAre("offered", "call ", "invalidated"));
+    EXPECT_EQ(LiveObjects::counts()["connection"], 1) << "the service still holds the last one";
+}
+
+TEST(SocketListener, EndsABrokenStreamWithOneLineAndServesTheOthers) {
+    Server server(echo);
+    auto good = server.connect();
+    server.service.journalOf(1);
+    auto bad = server.connect();
+    ASSERT_TRUE(bad.send(FrameKind::call, 0, "before"));
+    ASSERT_TRUE(bad.send(FrameKind::event, 0, "not for a client to send"));
+    EXPECT_TRUE(bad.isCutOff());
+    EXPECT_THAT(server.service.journalOf(4), ElementsAre("offered", "offered", "call before", "interrupted"));
+    EXPECT_THAT(server.log.errors(), ElementsAre(HasSubstr("the kind of frame is unknown")));
+    ASSERT_TRUE(good.send(FrameKind::call, 1));
+    EXPECT_TRUE(good.receive());
+}
+
+TEST(SocketListener, ClosesEveryFileThatAClientSends) {
+    Server server(echo);
+    server.connect().hangUp();
+    server.service.journalOf(2);
+    const auto before = openFiles();
+    const std::vector<int> many(253, STDERR_FILENO);
+    for (int i = 0; i < 20; ++i) {
+        auto client = server.connect();
+        Data call;
+        appendFrame(call, FrameKind::call, 0, {});
+        client.sendWithFiles(call, i % 2 == 0 ? many : std::vector{STDERR_FILENO});
+        EXPECT_TRUE(client.isCutOff());
+    }
+    server.service.journalOf(2 + 20 * 2);
+    EXPECT_EQ(openFiles(), before);
+    EXPECT_THAT(server.log.errors(), SizeIs(20));
+}
+
+TEST(SocketListener, TakesGrantedFilesUntilTheirClientGoes) {
+    Server server(echo);
+    const TemporaryFolder folder;
+    const auto path = folder.write("song", "music").string();
+    const FileDescriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC));
+    auto client = server.connect();
+    ASSERT_TRUE(client.grant("one", path, file.get()));
+    ASSERT_TRUE(client.grant("two", path, file.get()));
+    ASSERT_TRUE(client.grant("null", "/dev/null", STDERR_FILENO) && client.send(FrameKind::call, 1));
+    ASSERT_TRUE(client.receive());
+    EXPECT_GE(server.tokens.consume("one"), 0);
+    EXPECT_TRUE(server.tokens.open(path));
+    client.hangUp();
+    server.service.journalOf(3);
+    EXPECT_EQ(server.tokens.consume("two"), -1);
+}
+
+TEST(SocketListener, RefusesTheSixtyFifthClientUntilOneGoes) {
+    Server server(echo);
+    std::vector<RawClient> clients;
+    for (std::size_t i = 0; i < SocketListener::mostConnections; ++i)
+        clients.push_back(server.connect());
+    EXPECT_TRUE(server.connect().isCutOff());
+    EXPECT_TRUE(server.connect().isCutOff());
+    EXPECT_THAT(server.log.errors(), ElementsAre(HasSubstr("there are too many")));
+    clients.pop_back();
+    auto next = server.connect();
+    ASSERT_TRUE(next.send(FrameKind::call, 1));
+    EXPECT_TRUE(next.receive());
+}
+
+TEST(SocketListener, CutsOffAClientThatDoesNotRead) {
+    Server server(echo);
+    auto slow = server.connect();
+    server.service.journalOf(1);
+    auto& proxy = server.service.connection()->remoteObjectProxy();
+    const Data event(10'000, 'e');
+    for (int i = 0; i < 1'000; ++i)
+        proxy.receiveData(event);
+    EXPECT_THAT(server.service.journalOf(2), ElementsAre("offered", "interrupted"));
+    EXPECT_THAT(server.log.errors(), ElementsAre(HasSubstr("does not read")));
+    EXPECT_TRUE(slow.isCutOff());
+}
+
+TEST(SocketListener, DeliversWholeFramesToAClientThatReadsSlowly) {
+    Server server(echo);
+    auto client = server.connect();
+    server.service.journalOf(1);
+    auto& proxy = server.service.connection()->remoteObjectProxy();
+    constexpr int count = 200; // 1 MB: more than the socket takes, less than may wait
+    for (int i = 0; i < count; ++i)
+        proxy.receiveData(Data(5'000, static_cast<std::uint8_t>(i)));
+    for (int i = 0; i < count; ++i)
+        ASSERT_EQ(client.receive()->body, Data(5'000, static_cast<std::uint8_t>(i)));
+    EXPECT_THAT(server.log.errors(), IsEmpty());
+}
+
+TEST(SocketListener, StopsReadingWhileTooManyCallsAreUnfinished) {
+    constexpr std::size_t count = 20'000;
+    Server server;
+    auto client = server.connect();
+    std::jthread sender([&] {
+        for (std::size_t i = 0; i < count; ++i)
+            ASSERT_TRUE(client.send(FrameKind::call, 0, std::string(100, 'c')));
+    });
+    server.service.journalOf(ConnectionSocket::mostUnfinishedCalls);
+    // What came in one read is delivered together, so the limit is passed by one read at most.
+    std::size_t seen = 0;
+    std::size_t most = 0;
+    while (seen < count) {
+        server.service.journalOf(seen + 2);
+        auto calls = server.service.takeKeptCalls();
+        most = std::max(most, calls.size());
+        seen += calls.size();
+    }
+    EXPECT_EQ(seen, count);
+    EXPECT_LE(most, ConnectionSocket::mostUnfinishedCalls + 65'536 / 116 + 1);
+}
+
+TEST(SocketListener, SeesAHangUpWhileItDoesNotRead) {
+    Server server;
+    auto client = server.connect();
+    for (std::uint32_t i = 0; i < ConnectionSocket::mostUnfinishedCalls; ++i)
+        ASSERT_TRUE(client.send(FrameKind::call, 1));
+    server.service.journalOf(1 + ConnectionSocket::mostUnfinishedCalls);
+    client.hangUp();
+    const auto journal = server.service.journalOf(2 + ConnectionSocket::mostUnfinishedCalls);
+    EXPECT_EQ(journal.back(), "invalidated");
+}
+
+TEST(SocketListener, RefusesAClientWhenNoDescriptorIsLeftAndGoesOnWhenOneIs) {
+    Server server(echo);
+    const FileDescriptor socket(::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0));
+    {
+        std::vector<FileDescriptor> all;
+        for (FileDescriptor each(::dup(STDERR_FILENO)); each; each = FileDescriptor(::dup(STDERR_FILENO)))
+            all.push_back(std::move(each));
+        ASSERT_TRUE(SocketAddress(server.path()).connect(socket.get()));
+        char byte = 0;
+        EXPECT_EQ(::recv(socket.get(), &byte, 1, 0), 0) << "refused, not left waiting";
+    }
+    EXPECT_THAT(server.log.errors(), ElementsAre(HasSubstr("no file descriptors are left")));
+    auto next = server.connect();
+    ASSERT_TRUE(next.send(FrameKind::call, 1));
+    EXPECT_TRUE(next.receive());
+}
+
+} // namespace
+} // namespace tarn
