@@ -1,0 +1,62 @@
+#include "platform/simulated/SimulatedServiceListeners.h"
+
+#include <cassert>
+#include <utility>
+
+namespace tarn {
+
+class SimulatedServiceListeners::Listener final : public ServiceListener {
+public:
+    explicit Listener(SimulatedServiceListeners& owner) : owner_(owner) { owner_.listener_ = this; }
+    ~Listener() override { owner_.listener_ = nullptr; }
+
+    void setDelegate(ServiceListenerDelegate* delegate) override { delegate_ = delegate; }
+
+    void resume() override {
+        resumed_ = true;
+        owner_.io_->async([&owner = owner_] { owner.offerWaiting(); });
+    }
+
+    bool isResumed() const { return resumed_; }
+    ServiceListenerDelegate& delegate() { return *delegate_; }
+
+private:
+    SimulatedServiceListeners& owner_;
+    ServiceListenerDelegate* delegate_ = nullptr;
+    bool resumed_ = false;
+};
+
+std::unique_ptr<ServiceListener> SimulatedServiceListeners::createWithServiceName(const std::string& name) {
+    assert(name == "ostrel.tarnd" && listener_ == nullptr);
+    return std::make_unique<Listener>(*this);
+}
+
+std::shared_ptr<SimulatedConnection> SimulatedServiceListeners::connect() {
+    auto connection = std::make_shared<SimulatedConnection>(scheduler_, io_);
+    waiting_.push_back(connection);
+    io_->async([this] { offerWaiting(); });
+    return connection;
+}
+
+void SimulatedServiceListeners::offerWaiting() {
+    if (listener_ == nullptr || !listener_->isResumed())
+        return;
+    for (const auto& connection : std::exchange(waiting_, {}))
+        offer(connection);
+}
+
+void SimulatedServiceListeners::offer(const std::shared_ptr<SimulatedConnection>& connection) {
+    for (const auto& open : open_)
+        if (open->isLost())
+            open->finishLoss();
+    std::erase_if(open_, [](const auto& open) { return open->isLost(); });
+    open_.push_back(connection);
+    listener_->delegate().listenerShouldAcceptNewConnection(*listener_, connection);
+    // What came before the connection was resumed is read now.
+    io_->async([connection] {
+        connection->read();
+        connection->finishLoss();
+    });
+}
+
+} // namespace tarn
