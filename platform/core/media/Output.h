@@ -15,7 +15,7 @@ class OutputListener {
 public:
     virtual ~OutputListener() = default;
 
-    /// There is room for at least half a buffer. Comes once; again only when something was written since.
+    /// The room has come to half a buffer. Comes once; again only when something was written since.
     virtual void outputIsWritable() = 0;
 
     /// The stream broke off and begins anew (sound server gone, back, another format): what was written and

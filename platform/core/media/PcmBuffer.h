@@ -5,7 +5,8 @@
 
 namespace tarn {
 
-/// Frames on their way to the output. The simulated engine counts frames and leaves `bytes` empty.
+/// Frames on their way to the output. In the simulated engine `bytes` tells what they are instead of holding
+/// them.
 struct PcmBuffer {
     std::size_t frames = 0;
     std::vector<std::byte> bytes;

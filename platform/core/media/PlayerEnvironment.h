@@ -17,7 +17,7 @@ struct PlayerEnvironment {
     NotificationCenter& notifications;
 
     /// Guards the state of every item and player of the engine, so that an item that passes from one player
-    /// to another has one truth. Nothing is called out to under it but Output's clock and bookkeeping.
+    /// to another has one truth. Nothing is called out to under it but Output and PlayerLoop::post().
     std::mutex mutex{};
 };
 

@@ -1,0 +1,78 @@
+#include "platform/core/media/CoreMediaItem.h"
+
+#include <algorithm>
+#include <cassert>
+#include <utility>
+
+#include "platform/MediaAsset.h"
+#include "platform/NotificationCenter.h"
+#include "platform/SystemLog.h"
+#include "platform/core/media/MediaTimes.h"
+#include "platform/core/media/PlayQueue.h"
+
+namespace tarn {
+
+CoreMediaItem::CoreMediaItem(PlayerEnvironment& environment, std::shared_ptr<MediaAsset> asset)
+    : environment_(environment),
+      asset_(std::move(asset)),
+      observers_(*this, [this](std::string_view keyPath) { return read(keyPath); }) {}
+
+RegistrationHandle CoreMediaItem::observe(std::string_view keyPath, Block block) {
+    return observers_.observe(keyPath, std::move(block));
+}
+
+MediaStatus CoreMediaItem::status() const {
+    std::lock_guard lock(environment_.mutex);
+    return state_.status;
+}
+
+std::optional<Error> CoreMediaItem::error() const {
+    std::lock_guard lock(environment_.mutex);
+    return state_.error;
+}
+
+MediaTime CoreMediaItem::currentTime() const {
+    std::lock_guard lock(environment_.mutex);
+    return mediaTimeOf(state_.driver ? state_.driver->positionOf(*this) : state_.position);
+}
+
+void CoreMediaItem::seekToTime(MediaTime time) {
+    if (!time.isNumeric()) {
+        SystemLog::error("-[MediaItem seekToTime:]", __LINE__,
+                         "%{public}s:%d: Refused to seek to a time that is not a number.");
+        return;
+    }
+    auto position = std::max(nanosecondsOf(time), std::chrono::nanoseconds(0));
+    if (MediaTime duration = asset_->duration(); duration.isNumeric())
+        position = std::min(position, nanosecondsOf(duration));
+    {
+        std::lock_guard lock(environment_.mutex);
+        state_.playedToEnd = false;
+        if (state_.driver)
+            state_.driver->seek(*this, position);
+        else
+            state_.position = position;
+    }
+    post(timeJumped);
+}
+
+void CoreMediaItem::becomeReady() {
+    {
+        std::lock_guard lock(environment_.mutex);
+        if (std::exchange(state_.status, MediaStatus::readyToPlay) == MediaStatus::readyToPlay)
+            return;
+    }
+    reportStatus();
+}
+
+void CoreMediaItem::post(std::string_view notification) {
+    environment_.notifications.post(
+        {.name = notification, .sender = static_cast<MediaItem*>(this), .info = {}});
+}
+
+ObservedValue CoreMediaItem::read(std::string_view keyPath) const {
+    assert(keyPath == statusKeyPath);
+    return static_cast<std::int64_t>(status());
+}
+
+} // namespace tarn
