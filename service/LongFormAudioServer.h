@@ -1,0 +1,86 @@
+#pragma once
+
+#include <memory>
+#include <vector>
+
+#include "platform/Platform.h"
+#include "platform/SerialQueue.h"
+#include "platform/ServiceListener.h"
+#include "platform/core/LiveObjects.h"
+#include "reply/EventSink.h"
+#include "service/LongFormAudioCommand.h"
+
+namespace tarn {
+
+/// The service: the listener, the one current client connection, the queue of its commands, and the way back
+/// to it for events.
+///
+/// Every change of connection drops the router, and so all objects of the client before. The new connection
+/// is installed behind the commands that were submitted earlier; those that have not begun by then are
+/// cancelled. Connection callbacks come on the I/O thread; see each operation for the rest.
+class VLLongFormAudioServer final : public ServiceListenerDelegate,
+                                    public VLLongFormAudioServerProtocol,
+                                    public EventSink,
+                                    public std::enable_shared_from_this<VLLongFormAudioServer> {
+public:
+    /// The process's service, made by the first call. It is never destroyed: other threads may use it until
+    /// the process ends.
+    static std::shared_ptr<VLLongFormAudioServer> sharedLongFormAudioServer(const Platform& platform);
+
+    /// Does not listen yet.
+    explicit VLLongFormAudioServer(const Platform& platform);
+    ~VLLongFormAudioServer() override;
+
+    /// Listens, and runs the main run loop on the calling (main) thread; returns only if that does.
+    void run();
+
+    /// Always accepts: the newest client is the current one.
+    bool listenerShouldAcceptNewConnection(ServiceListener& listener,
+                                           const std::shared_ptr<ServiceConnection>& connection) override;
+
+    /// Data that is no envelope costs a log line; its callback is let go.
+    void receiveData(std::vector<ReceivedCall> calls) override;
+
+    void sendData(const Data& data) override;
+
+    /// Clears the current connection, whichever was lost. On the I/O thread.
+    void _connectionWasInvalidated();
+
+    /// Waits for the commands before. Never on the main queue or the command queue.
+    void _replaceCurrentConnectionWithConnection(std::shared_ptr<ServiceConnection> connection);
+
+    /// On the main queue, so that commands are submitted in the order of their arrival.
+    void _enqueueAudioCommand(std::shared_ptr<const VLLongFormAudioCommand> command);
+
+    /// Any thread but the guard queue.
+    bool _connectionIsValid() const;
+    void _setConnectionIsValid(bool isValid);
+
+    /// The current connection; null while there is none. Any thread but the guard queue.
+    std::shared_ptr<ServiceConnection> clientConnection() const;
+
+    /// The router of the current connection; null until its first command. On the command queue.
+    const std::shared_ptr<VLTorviAudioFilePlayerServer>& audioFilePlayerServer() const {
+        return audioFilePlayerServer_;
+    }
+    const std::shared_ptr<SerialQueue>& commandServiceQueue() const { return commandServiceQueue_; }
+
+private:
+    std::shared_ptr<ServiceConnection> validConnection() const;
+    void install(std::shared_ptr<ServiceConnection>& connection);
+    void runCommand(const VLLongFormAudioCommand& command);
+    void routeCommand(const VLLongFormAudioCommand& command);
+    void createAudioFilePlayerServer();
+
+    const Platform platform_;
+    bool connectionIsValid_ = false; // guard queue only
+    std::unique_ptr<ServiceListener> zelConnectionListener_;
+    std::shared_ptr<ServiceConnection> clientConnection_; // guard queue only, with the flag
+    const std::shared_ptr<SerialQueue> commandServiceQueue_;
+    const std::shared_ptr<SerialQueue> connectionValidStateGuardQueue_;
+    const std::shared_ptr<SerialQueue> longFormAudioConnectionInvalidated_; // never given work
+    std::shared_ptr<VLTorviAudioFilePlayerServer> audioFilePlayerServer_;
+    LiveObject<"service"> live_;
+};
+
+} // namespace tarn
