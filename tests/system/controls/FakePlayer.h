@@ -1,0 +1,78 @@
+#pragma once
+
+#include <chrono>
+#include <condition_variable>
+#include <mutex>
+#include <string>
+#include <vector>
+
+#include "platform/RemoteCommandCenter.h"
+
+namespace tarn {
+
+/// A queue player as the media controls see it: it answers the commands and remembers them.
+class FakePlayer final {
+public:
+    explicit FakePlayer(RemoteCommandCenter& center) {
+        add(center.pauseCommand(), "pause");
+        add(center.playCommand(), "play");
+        add(center.togglePlayPauseCommand(), "toggle");
+        add(center.nextTrackCommand(), "next");
+        center.previousTrackCommand().setEnabled(false);
+    }
+
+    ~FakePlayer() { letGo(); }
+
+    FakePlayer(const FakePlayer&) = delete;
+    FakePlayer& operator=(const FakePlayer&) = delete;
+
+    void answerWith(RemoteCommandResult result) {
+        const std::lock_guard lock(mutex_);
+        result_ = result;
+    }
+
+    /// From now on handlers wait for letGo(), like a play whose activation takes its time.
+    void hold() {
+        const std::lock_guard lock(mutex_);
+        held_ = true;
+    }
+
+    void letGo() {
+        const std::lock_guard lock(mutex_);
+        held_ = false;
+        changed_.notify_all();
+    }
+
+    /// Waits until that many commands have begun.
+    [[nodiscard]] bool waitForCommands(std::size_t count) {
+        std::unique_lock lock(mutex_);
+        return changed_.wait_for(lock, std::chrono::seconds(10), [&] { return commands_.size() >= count; });
+    }
+
+    std::vector<std::string> commands() {
+        const std::lock_guard lock(mutex_);
+        return commands_;
+    }
+
+private:
+    void add(RemoteCommand& command, const char* name) {
+        registrations_.push_back(command.addTarget([this, name] { return handle(name); }));
+    }
+
+    RemoteCommandResult handle(const char* name) {
+        std::unique_lock lock(mutex_);
+        commands_.emplace_back(name);
+        changed_.notify_all();
+        changed_.wait(lock, [&] { return !held_; });
+        return result_;
+    }
+
+    std::mutex mutex_;
+    std::condition_variable changed_;
+    std::vector<std::string> commands_;
+    RemoteCommandResult result_ = RemoteCommandResult::success;
+    bool held_ = false;
+    std::vector<RegistrationHandle> registrations_;
+};
+
+} // namespace tarn
