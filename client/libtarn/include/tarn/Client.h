@@ -16,11 +16,11 @@ namespace tarn::client {
 /// What is asked of the service for one audio file. Texts that are absent are read from the file.
 struct AssetUpsert {
     std::string identifier;
-    std::optional<std::string> URL; ///< a file: URL, see fileURL(); absent: only the texts are changed
-    std::optional<std::string> title;
-    std::optional<std::string> albumTitle;
-    std::optional<std::string> artist;
-    std::optional<std::string> sandboxExtensionToken; ///< see Client::grantFile()
+    std::optional<std::string> URL{}; ///< a file: URL, see fileURL(); absent: only the texts are changed
+    std::optional<std::string> title{};
+    std::optional<std::string> albumTitle{};
+    std::optional<std::string> artist{};
+    std::optional<std::string> sandboxExtensionToken{}; ///< see Client::grantFile()
 };
 
 /// What the service knows about an audio file.
@@ -50,7 +50,7 @@ public:
         std::string socketPath = defaultSocketPath();
         /// Gets every event, on a thread of the library's own. Without it events wait for nextEvent(), the
         /// last 4,096 of them.
-        std::function<void(const Event& event)> onEvent;
+        std::function<void(const Event& event)> onEvent{};
     };
 
     /// Connects. Throws std::system_error when nobody listens or access is denied.

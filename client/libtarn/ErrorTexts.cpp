@@ -1,0 +1,146 @@
+#include "client/libtarn/ErrorTexts.h"
+
+#include <algorithm>
+#include <array>
+#include <optional>
+#include <string_view>
+
+namespace tarn {
+
+namespace {
+
+using BytesView = std::span<const std::uint8_t>;
+
+constexpr std::string_view magic = "bplist00";
+constexpr std::size_t trailerSize = 32;
+constexpr unsigned integerType = 1;
+constexpr unsigned asciiType = 5;
+constexpr unsigned utf16Type = 6;
+constexpr unsigned dictionaryType = 13;
+
+std::uint64_t bigEndian(BytesView bytes) {
+    std::uint64_t value = 0;
+    for (const auto byte : bytes)
+        value = value << 8 | byte;
+    return value;
+}
+
+void appendUtf8(std::string& text, char32_t character) {
+    if (character < 0x80) {
+        text += static_cast<char>(character);
+        return;
+    }
+    const std::size_t continuations = character < 0x800 ? 1 : character < 0x10000 ? 2 : 3;
+    constexpr std::array<char32_t, 4> leads = {0, 0xC0, 0xE0, 0xF0}; // by number of continuations
+    text += static_cast<char>(leads[continuations] | character >> (6 * continuations));
+    for (std::size_t i = continuations; i > 0; --i)
+        text += static_cast<char>(0x80U | (character >> (6 * (i - 1)) & 0x3FU));
+}
+
+std::string utf8Of(BytesView utf16) {
+    std::string text;
+    for (std::size_t i = 0; i + 1 < utf16.size(); i += 2) {
+        auto character = static_cast<char32_t>(bigEndian(utf16.subspan(i, 2)));
+        if (character >= 0xD800 && character < 0xDC00 && i + 3 < utf16.size()) {
+            const auto low = static_cast<char32_t>(bigEndian(utf16.subspan(i + 2, 2)));
+            character = 0x10000 + ((character - 0xD800) << 10) + ((low - 0xDC00) & 0x3FFU);
+            i += 2;
+        }
+        appendUtf8(text, character);
+    }
+    return text;
+}
+
+/// One object of the list: its type, its count, and everything from its content on.
+struct Object {
+    unsigned type = 0;
+    std::uint64_t count = 0;
+    BytesView content;
+};
+
+class Reader {
+public:
+    explicit Reader(BytesView list) : list_(list) {
+        const auto trailer = list.last(trailerSize);
+        offsetSize_ = trailer[6];
+        referenceSize_ = trailer[7];
+        objectCount_ = bigEndian(trailer.subspan(8, 8));
+        top_ = bigEndian(trailer.subspan(16, 8));
+        tableOffset_ = bigEndian(trailer.subspan(24, 8));
+    }
+
+    std::map<std::string, std::string> texts() const {
+        std::map<std::string, std::string> texts;
+        const auto top = object(top_);
+        if (!top || top->type != dictionaryType || referenceSize_ == 0 ||
+            top->count > top->content.size() / (2 * referenceSize_))
+            return texts;
+        for (std::uint64_t i = 0; i < top->count; ++i) {
+            const auto key = text(reference(*top, i));
+            const auto value = text(reference(*top, top->count + i));
+            if (key && value)
+                texts[*key] = *value;
+        }
+        return texts;
+    }
+
+private:
+    std::uint64_t reference(const Object& dictionary, std::uint64_t index) const {
+        return bigEndian(dictionary.content.subspan(index * referenceSize_, referenceSize_));
+    }
+
+    std::optional<Object> object(std::uint64_t index) const {
+        const auto body = list_.size() - trailerSize;
+        if (index >= objectCount_ || offsetSize_ == 0 || offsetSize_ > 8 || tableOffset_ > body ||
+            index >= (body - tableOffset_) / offsetSize_)
+            return std::nullopt;
+        const auto offset = bigEndian(list_.subspan(tableOffset_ + index * offsetSize_, offsetSize_));
+        if (offset >= body)
+            return std::nullopt;
+        const unsigned marker = list_[offset];
+        Object found{marker >> 4U, marker & 0xFU, list_.subspan(offset + 1, body - offset - 1)};
+        if (found.count == 0xF && !readLongCount(found))
+            return std::nullopt;
+        return found;
+    }
+
+    /// A count of 15 says that the true one stands in front of the content as an integer.
+    static bool readLongCount(Object& object) {
+        if (object.content.empty() || object.content[0] >> 4U != integerType)
+            return false;
+        const auto size = std::size_t{1} << (object.content[0] & 0xFU);
+        if (size > 8 || object.content.size() < 1 + size)
+            return false;
+        object.count = bigEndian(object.content.subspan(1, size));
+        object.content = object.content.subspan(1 + size);
+        return true;
+    }
+
+    std::optional<std::string> text(std::uint64_t index) const {
+        const auto found = object(index);
+        if (found && found->type == asciiType && found->count <= found->content.size())
+            return std::string(found->content.begin(),
+                               found->content.begin() + static_cast<std::ptrdiff_t>(found->count));
+        if (found && found->type == utf16Type && found->count <= found->content.size() / 2)
+            return utf8Of(found->content.first(2 * found->count));
+        return std::nullopt;
+    }
+
+    BytesView list_;
+    std::size_t offsetSize_ = 0;
+    std::size_t referenceSize_ = 0;
+    std::uint64_t objectCount_ = 0;
+    std::uint64_t top_ = 0;
+    std::uint64_t tableOffset_ = 0;
+};
+
+} // namespace
+
+std::map<std::string, std::string> readErrorTexts(BytesView propertyList) {
+    if (propertyList.size() < magic.size() + trailerSize ||
+        !std::equal(magic.begin(), magic.end(), propertyList.begin()))
+        return {};
+    return Reader(propertyList).texts();
+}
+
+} // namespace tarn

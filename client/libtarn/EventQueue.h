@@ -1,0 +1,56 @@
+#pragma once
+
+#include <chrono>
+#include <condition_variable>
+#include <deque>
+#include <mutex>
+#include <optional>
+
+#include <tarn/Event.h>
+
+namespace tarn {
+
+/// The events that a program has not asked for yet. Any thread may call.
+class EventQueue {
+public:
+    static constexpr std::size_t mostEvents = 4'096;
+
+    /// The oldest gives way when there are too many.
+    void push(client::Event event) {
+        std::lock_guard lock(mutex_);
+        ended_ = std::holds_alternative<client::ConnectionLost>(event);
+        if (events_.size() == mostEvents)
+            events_.pop_front();
+        events_.push_back(std::move(event));
+        changed_.notify_one();
+    }
+
+    /// None when the time came first, or when the last event was ConnectionLost.
+    std::optional<client::Event> pop(std::optional<std::chrono::steady_clock::time_point> until) {
+        std::unique_lock lock(mutex_);
+        const auto ready = [&] { return !events_.empty() || ended_; };
+        if (until)
+            changed_.wait_until(lock, *until, ready);
+        else
+            changed_.wait(lock, ready);
+        if (events_.empty())
+            return std::nullopt;
+        client::Event event = std::move(events_.front());
+        events_.pop_front();
+        return event;
+    }
+
+    void clear() {
+        std::lock_guard lock(mutex_);
+        events_.clear();
+        ended_ = false;
+    }
+
+private:
+    std::mutex mutex_;
+    std::condition_variable changed_;
+    std::deque<client::Event> events_;
+    bool ended_ = false;
+};
+
+} // namespace tarn
