@@ -6,17 +6,13 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include <cstdlib>
 #include <filesystem>
 #include <thread>
 
 #include "platform/core/LiveObjects.h"
 #include "platform/linux/ipc/SocketAddress.h"
-#include "platform/linux/ipc/SocketListeners.h"
 #include "platform/linux/ipc/TransportMessages.h"
-#include "tests/ipc/FakeService.h"
-#include "tests/ipc/RawClient.h"
-#include "tests/support/CapturedLog.h"
+#include "tests/ipc/TestServer.h"
 #include "tests/support/TemporaryFolder.h"
 
 namespace tarn {
@@ -37,31 +33,8 @@ std::size_t openFiles() {
     return static_cast<std::size_t>(std::distance(begin(files), end(files)));
 }
 
-/// A listener on a socket of its own, with a service behind it.
-class Server {
-public:
-    explicit Server(FakeService::Answer answer = nullptr) : service(std::move(answer)) {
-        ::setenv("XDG_RUNTIME_DIR", folder_.path().c_str(), 1);
-        listener_ = listeners_.createWithServiceName("ostrel.test");
-        listener_->setDelegate(&service);
-        listener_->resume();
-    }
-
-    std::string path() const { return (folder_ / "ostrel.test").string(); }
-    RawClient connect() const { return RawClient(path()); }
-
-    CapturedLog log;
-    TokenTable tokens;
-    FakeService service;
-
-private:
-    TemporaryFolder folder_;
-    SocketListeners listeners_{tokens};
-    std::unique_ptr<ServiceListener> listener_;
-};
-
 TEST(SocketListener, AnswersEveryCallOnTheConnectionThatItCameOn) {
-    Server server;
+    TestServer server;
     auto first = server.connect();
     ASSERT_TRUE(first.send(FrameKind::call, 7, "first"));
     server.service.journalOf(2);
@@ -96,7 +69,7 @@ TEST(SocketListener, AnswersEveryCallOnTheConnectionThatItCameOn) {
 }
 
 TEST(SocketListener, SendsNothingForACallThatWantsNoAnswer) {
-    Server server(echo);
+    TestServer server(echo);
     auto client = server.connect();
     ASSERT_TRUE(client.send(FrameKind::call, 0, "quiet"));
     ASSERT_TRUE(client.send(FrameKind::call, 1, "loud"));
@@ -106,7 +79,7 @@ TEST(SocketListener, SendsNothingForACallThatWantsNoAnswer) {
 TEST(SocketListener, SendsEventsAndAnswersInTheOrderInWhichTheyWereMade) {
     constexpr int count = 1'000;
     FakeService* service = nullptr;
-    Server server([&](ReceivedCall call) {
+    TestServer server([&](ReceivedCall call) {
         service->connection()->remoteObjectProxy().receiveData(call.data);
         echo(std::move(call));
     });
@@ -128,7 +101,7 @@ TEST(SocketListener, SendsEventsAndAnswersInTheOrderInWhichTheyWereMade) {
 }
 
 TEST(SocketListener, ReadsWhatAClientSentBeforeItHungUp) {
-    Server server(echo);
+    TestServer server(echo);
     auto client = server.connect();
     for (int i = 0; i < 3; ++i)
         ASSERT_TRUE(client.send(FrameKind::call, 0, "call"));
@@ -139,7 +112,7 @@ TEST(SocketListener, ReadsWhatAClientSentBeforeItHungUp) {
 
 TEST(SocketListener, NoticesAHangUpBeforeTheClientThatComesBack) {
     constexpr std::size_t rounds = 500;
-    Server server(echo);
+    TestServer server(echo);
     for (std::size_t i = 0; i < rounds; ++i)
         ASSERT_TRUE(server.connect().send(FrameKind::call, 0, ""));
     const auto journal = server.service.journalOf(3 * rounds);
@@ -151,7 +124,7 @@ TEST(SocketListener, NoticesAHangUpBeforeTheClientThatComesBack) {
 }
 
 TEST(SocketListener, EndsABrokenStreamWithOneLineAndServesTheOthers) {
-    Server server(echo);
+    TestServer server(echo);
     auto good = server.connect();
     server.service.journalOf(1);
     auto bad = server.connect();
@@ -165,7 +138,7 @@ TEST(SocketListener, EndsABrokenStreamWithOneLineAndServesTheOthers) {
 }
 
 TEST(SocketListener, ClosesEveryFileThatAClientSends) {
-    Server server(echo);
+    TestServer server(echo);
     server.connect().hangUp();
     server.service.journalOf(2);
     const auto before = openFiles();
@@ -183,7 +156,7 @@ TEST(SocketListener, ClosesEveryFileThatAClientSends) {
 }
 
 TEST(SocketListener, TakesGrantedFilesUntilTheirClientGoes) {
-    Server server(echo);
+    TestServer server(echo);
     const TemporaryFolder folder;
     const auto path = folder.write("song", "music").string();
     const FileDescriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC));
@@ -200,7 +173,7 @@ TEST(SocketListener, TakesGrantedFilesUntilTheirClientGoes) {
 }
 
 TEST(SocketListener, RefusesTheSixtyFifthClientUntilOneGoes) {
-    Server server(echo);
+    TestServer server(echo);
     std::vector<RawClient> clients;
     for (std::size_t i = 0; i < SocketListener::mostConnections; ++i)
         clients.push_back(server.connect());
@@ -214,7 +187,7 @@ TEST(SocketListener, RefusesTheSixtyFifthClientUntilOneGoes) {
 }
 
 TEST(SocketListener, CutsOffAClientThatDoesNotRead) {
-    Server server(echo);
+    TestServer server(echo);
     auto slow = server.connect();
     server.service.journalOf(1);
     auto& proxy = server.service.connection()->remoteObjectProxy();
@@ -227,7 +200,7 @@ TEST(SocketListener, CutsOffAClientThatDoesNotRead) {
 }
 
 TEST(SocketListener, DeliversWholeFramesToAClientThatReadsSlowly) {
-    Server server(echo);
+    TestServer server(echo);
     auto client = server.connect();
     server.service.journalOf(1);
     auto& proxy = server.service.connection()->remoteObjectProxy();
@@ -241,7 +214,7 @@ TEST(SocketListener, DeliversWholeFramesToAClientThatReadsSlowly) {
 
 TEST(SocketListener, StopsReadingWhileTooManyCallsAreUnfinished) {
     constexpr std::size_t count = 20'000;
-    Server server;
+    TestServer server;
     auto client = server.connect();
     std::jthread sender([&] {
         for (std::size_t i = 0; i < count; ++i)
@@ -262,7 +235,7 @@ TEST(SocketListener, StopsReadingWhileTooManyCallsAreUnfinished) {
 }
 
 TEST(SocketListener, SeesAHangUpWhileItDoesNotRead) {
-    Server server;
+    TestServer server;
     auto client = server.connect();
     for (std::uint32_t i = 0; i < ConnectionSocket::mostUnfinishedCalls; ++i)
         ASSERT_TRUE(client.send(FrameKind::call, 1));
@@ -273,7 +246,7 @@ TEST(SocketListener, SeesAHangUpWhileItDoesNotRead) {
 }
 
 TEST(SocketListener, RefusesAClientWhenNoDescriptorIsLeftAndGoesOnWhenOneIs) {
-    Server server(echo);
+    TestServer server(echo);
     const FileDescriptor socket(::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0));
     {
         std::vector<FileDescriptor> all;

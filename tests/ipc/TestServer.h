@@ -1,0 +1,39 @@
+#pragma once
+
+#include <cstdlib>
+#include <memory>
+#include <string>
+#include <utility>
+
+#include "platform/linux/ipc/SocketListeners.h"
+#include "tests/ipc/FakeService.h"
+#include "tests/ipc/RawClient.h"
+#include "tests/support/CapturedLog.h"
+#include "tests/support/TemporaryFolder.h"
+
+namespace tarn {
+
+/// A listener on a socket of its own, with a fake service behind it. Sets XDG_RUNTIME_DIR.
+class TestServer {
+public:
+    explicit TestServer(FakeService::Answer answer = nullptr) : service(std::move(answer)) {
+        ::setenv("XDG_RUNTIME_DIR", folder_.path().c_str(), 1);
+        listener_ = listeners_.createWithServiceName("ostrel.tarnd");
+        listener_->setDelegate(&service);
+        listener_->resume();
+    }
+
+    std::string path() const { return (folder_ / "ostrel.tarnd").string(); }
+    RawClient connect() const { return RawClient(path()); }
+
+    CapturedLog log;
+    TokenTable tokens;
+    FakeService service;
+
+private:
+    TemporaryFolder folder_;
+    SocketListeners listeners_{tokens};
+    std::unique_ptr<ServiceListener> listener_;
+};
+
+} // namespace tarn
