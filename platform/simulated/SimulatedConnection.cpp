@@ -1,10 +1,7 @@
 #include "platform/simulated/SimulatedConnection.h"
 
-#include <cassert>
 #include <iterator>
 #include <utility>
-
-#include "platform/simulated/SimulatedQueue.h"
 
 namespace tarn {
 
@@ -35,8 +32,7 @@ private:
     bool called_ = false;
 };
 
-SimulatedConnection::SimulatedConnection(SimulatedScheduler& scheduler, std::shared_ptr<SimulatedQueue> io)
-    : scheduler_(scheduler), io_(std::move(io)) {}
+SimulatedConnection::SimulatedConnection(std::shared_ptr<const SimulatedIO> io) : io_(std::move(io)) {}
 
 void SimulatedConnection::setExportedObject(std::shared_ptr<VLLongFormAudioServerProtocol> object) {
     exported_ = std::move(object);
@@ -64,66 +60,94 @@ VLLongFormAudioClientProtocol& SimulatedConnection::remoteObjectProxy() {
 }
 
 void SimulatedConnection::receiveData(const Data& data) {
-    scheduler_.yieldPoint();
+    io_->yieldPoint();
     deliver({SimulatedDelivery::Kind::event, 0, data, {}});
 }
 
 void SimulatedConnection::call(std::uint64_t id, Data data) {
-    if (isLost())
-        return;
     auto callback = id == 0 ? nullptr : std::make_unique<Callback>(weak_from_this(), id);
-    arrived_.push_back({std::move(data), std::move(callback)});
-    io_->async([self = shared_from_this()] { self->read(); });
+    bool isSent = state_.withLocked([&](State& state) {
+        if (state.loss != Loss::none)
+            return false;
+        state.arrived.push_back({std::move(data), std::move(callback)});
+        return true;
+    });
+    if (isSent)
+        io_->queue->async([self = shared_from_this()] { self->read(); });
 }
 
 void SimulatedConnection::lose(Loss loss) {
-    if (isLost())
-        return;
-    loss_ = loss;
-    io_->async([self = shared_from_this()] { self->finishLoss(); });
+    bool isFirst = state_.withLocked([&](State& state) {
+        return std::exchange(state.loss, state.loss == Loss::none ? loss : state.loss) == Loss::none;
+    });
+    if (isFirst)
+        io_->queue->async([self = shared_from_this()] { self->finishLoss(); });
 }
 
 void SimulatedConnection::loseAtStep(int step, Loss loss) {
-    stepsToLoss_ = step;
-    lossAtStep_ = loss;
+    state_.withLocked([&](State& state) {
+        state.stepsToLoss = step;
+        state.lossAtStep = loss;
+    });
 }
 
 void SimulatedConnection::passStep() {
-    if (stepsToLoss_ > 0 && --stepsToLoss_ == 0)
-        lose(lossAtStep_);
+    Loss loss = state_.withLocked([](State& state) {
+        return state.stepsToLoss > 0 && --state.stepsToLoss == 0 ? state.lossAtStep : Loss::none;
+    });
+    if (loss != Loss::none)
+        lose(loss);
 }
 
 void SimulatedConnection::deliver(SimulatedDelivery delivery) {
-    if (!isLost())
-        deliveries_.push_back(std::move(delivery));
+    state_.withLocked([&](State& state) {
+        if (state.loss == Loss::none)
+            state.deliveries.push_back(std::move(delivery));
+    });
+}
+
+std::vector<SimulatedDelivery> SimulatedConnection::deliveries() const {
+    return state_.withLocked([](const State& state) { return state.deliveries; });
+}
+
+bool SimulatedConnection::isLost() const {
+    return state_.withLocked([](const State& state) { return state.loss != Loss::none; });
 }
 
 void SimulatedConnection::read() {
-    if (!resumed_ || finished_ || loss_ == Loss::interrupted || arrived_.empty())
+    if (!resumed_ || finished_)
         return;
-    handOver(1 + scheduler_.random(arrived_.size()));
-    io_->async([self = shared_from_this()] { self->read(); });
+    if (auto calls = takeArrived(false); !calls.empty()) {
+        exported_->receiveData(std::move(calls));
+        io_->queue->async([self = shared_from_this()] { self->read(); });
+    }
 }
 
 void SimulatedConnection::finishLoss() {
     if (!resumed_ || !isLost() || std::exchange(finished_, true))
         return;
-    if (loss_ == Loss::invalidated && !arrived_.empty())
-        handOver(arrived_.size());
-    arrived_.clear();
+    if (auto calls = takeArrived(true); !calls.empty())
+        exported_->receiveData(std::move(calls));
+    bool isInterrupted =
+        state_.withLocked([](const State& state) { return state.loss == Loss::interrupted; });
     auto interruption = std::exchange(interruptionHandler_, nullptr);
     auto invalidation = std::exchange(invalidationHandler_, nullptr);
     exported_ = nullptr;
-    const auto& handler = loss_ == Loss::interrupted ? interruption : invalidation;
-    assert(handler != nullptr);
-    handler();
+    (isInterrupted ? interruption : invalidation)();
 }
 
-void SimulatedConnection::handOver(std::size_t calls) {
-    auto end = arrived_.begin() + static_cast<std::ptrdiff_t>(calls);
-    std::vector<ReceivedCall> batch(std::make_move_iterator(arrived_.begin()), std::make_move_iterator(end));
-    arrived_.erase(arrived_.begin(), end);
-    exported_->receiveData(std::move(batch));
+/// A part of the calls that chance chooses, or all of them. A broken connection delivers none.
+std::vector<ReceivedCall> SimulatedConnection::takeArrived(bool all) {
+    return state_.withLocked([&](State& state) {
+        std::vector<ReceivedCall> taken;
+        if (state.loss == Loss::interrupted || state.arrived.empty())
+            return taken;
+        std::size_t count = all ? state.arrived.size() : 1 + io_->random(state.arrived.size());
+        auto end = state.arrived.begin() + static_cast<std::ptrdiff_t>(count);
+        taken.assign(std::make_move_iterator(state.arrived.begin()), std::make_move_iterator(end));
+        state.arrived.erase(state.arrived.begin(), end);
+        return taken;
+    });
 }
 
 } // namespace tarn

@@ -1,11 +1,15 @@
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
-#include <string>
+#include <functional>
+#include <memory>
+#include <vector>
 
+#include "platform/SerialQueue.h"
 #include "platform/ServiceConnection.h"
 #include "platform/core/LiveObjects.h"
-#include "platform/simulated/SimulatedScheduler.h"
+#include "platform/core/MutexProtected.h"
 
 namespace tarn {
 
@@ -19,14 +23,22 @@ struct SimulatedDelivery {
     std::optional<Error> error;
 };
 
-/// A connection between a SimulatedClient and the service. All handlers and calls run on the I/O thread.
+/// The I/O thread that serves all connections, and where chance comes in. With a queue of the scheduler it is
+/// virtual; with one of WorkerQueues the same connections run on real threads.
+struct SimulatedIO {
+    std::shared_ptr<SerialQueue> queue;
+    std::function<std::size_t(std::size_t limit)> random;
+    std::function<void()> yieldPoint;
+};
+
+/// A connection between a client and the service. Handlers and calls run on the I/O thread.
 class SimulatedConnection final : public ServiceConnection,
                                   public VLLongFormAudioClientProtocol,
                                   public std::enable_shared_from_this<SimulatedConnection> {
 public:
     enum class Loss { none, invalidated, interrupted };
 
-    SimulatedConnection(SimulatedScheduler& scheduler, std::shared_ptr<SimulatedQueue> io);
+    explicit SimulatedConnection(std::shared_ptr<const SimulatedIO> io);
 
     void setExportedObject(std::shared_ptr<VLLongFormAudioServerProtocol> object) override;
     void resume() override;
@@ -36,7 +48,7 @@ public:
 
     void receiveData(const Data& data) override;
 
-    // The client's end.
+    // The client's end. Any thread.
 
     /// Sends a call; 0 for one that wants no answer.
     void call(std::uint64_t id, Data data);
@@ -48,12 +60,12 @@ public:
     /// Loses the connection inside the service's `step`-th call of one of the operations above, from 1.
     void loseAtStep(int step, Loss loss);
 
-    const std::vector<SimulatedDelivery>& deliveries() const { return deliveries_; }
-    bool isLost() const { return loss_ != Loss::none; }
+    std::vector<SimulatedDelivery> deliveries() const;
+    bool isLost() const;
 
     // The I/O thread.
 
-    /// Hands over a part of what arrived, as one read would.
+    /// Hands over a part of what arrived, as one read would, and comes back for the rest.
     void read();
 
     /// After a loss: hands over what still arrives, and runs the handler, once.
@@ -62,23 +74,28 @@ public:
 private:
     class Callback;
 
+    struct State {
+        Loss loss = Loss::none;
+        int stepsToLoss = 0;
+        Loss lossAtStep = Loss::none;
+        std::vector<ReceivedCall> arrived;
+        std::vector<SimulatedDelivery> deliveries;
+    };
+
     void passStep();
     void deliver(SimulatedDelivery delivery);
-    void handOver(std::size_t calls);
+    std::vector<ReceivedCall> takeArrived(bool all);
 
     LiveObject<"connection"> live_;
-    SimulatedScheduler& scheduler_;
-    const std::shared_ptr<SimulatedQueue> io_;
+    const std::shared_ptr<const SimulatedIO> io_;
+    MutexProtected<State> state_;
+
+    // The I/O thread only.
     std::shared_ptr<VLLongFormAudioServerProtocol> exported_;
     std::function<void()> interruptionHandler_;
     std::function<void()> invalidationHandler_;
     bool resumed_ = false;
     bool finished_ = false; // the handler ran
-    Loss loss_ = Loss::none;
-    int stepsToLoss_ = 0;
-    Loss lossAtStep_ = Loss::none;
-    std::vector<ReceivedCall> arrived_;
-    std::vector<SimulatedDelivery> deliveries_;
 };
 
 } // namespace tarn

@@ -21,7 +21,9 @@ struct SimulatedPlatform {
     SimulatedScheduler scheduler;
     SimulatedClock clock{scheduler};
     SimulatedQueues queues{scheduler};
-    SimulatedServiceListeners listeners{scheduler};
+    SimulatedServiceListeners listeners{{scheduler.createQueue("I/O"),
+                                         [this](std::size_t limit) { return scheduler.random(limit); },
+                                         [this] { scheduler.yieldPoint(); }}};
     SimulatedLocalization localization;
     LocalNotificationCenter notifications;
 };

@@ -7,14 +7,25 @@ namespace tarn {
 
 class SimulatedServiceListeners::Listener final : public ServiceListener {
 public:
-    explicit Listener(SimulatedServiceListeners& owner) : owner_(owner) { owner_.listener_ = this; }
-    ~Listener() override { owner_.listener_ = nullptr; }
+    explicit Listener(SimulatedServiceListeners& owner) : owner_(owner) {
+        owner_.io().sync([this] { owner_.listener_ = this; });
+    }
+    ~Listener() override {
+        // The service may go with its last connection, on the I/O thread.
+        auto leave = [this] { owner_.listener_ = nullptr; };
+        if (owner_.io().isCurrent())
+            leave();
+        else
+            owner_.io().sync(leave);
+    }
 
     void setDelegate(ServiceListenerDelegate* delegate) override { delegate_ = delegate; }
 
     void resume() override {
-        resumed_ = true;
-        owner_.io_->async([&owner = owner_] { owner.offerWaiting(); });
+        owner_.io_->queue->async([this, &owner = owner_] {
+            resumed_ = true;
+            owner.offerWaiting();
+        });
     }
 
     bool isResumed() const { return resumed_; }
@@ -27,14 +38,16 @@ private:
 };
 
 std::unique_ptr<ServiceListener> SimulatedServiceListeners::createWithServiceName(const std::string& name) {
-    assert(name == "ostrel.tarnd" && listener_ == nullptr);
+    assert(name == "ostrel.tarnd");
     return std::make_unique<Listener>(*this);
 }
 
 std::shared_ptr<SimulatedConnection> SimulatedServiceListeners::connect() {
-    auto connection = std::make_shared<SimulatedConnection>(scheduler_, io_);
-    waiting_.push_back(connection);
-    io_->async([this] { offerWaiting(); });
+    auto connection = std::make_shared<SimulatedConnection>(io_);
+    io_->queue->async([this, connection] {
+        waiting_.push_back(connection);
+        offerWaiting();
+    });
     return connection;
 }
 
@@ -53,7 +66,7 @@ void SimulatedServiceListeners::offer(const std::shared_ptr<SimulatedConnection>
     open_.push_back(connection);
     listener_->delegate().listenerShouldAcceptNewConnection(*listener_, connection);
     // What came before the connection was resumed is read now.
-    io_->async([connection] {
+    io_->queue->async([connection] {
         connection->read();
         connection->finishLoss();
     });

@@ -4,15 +4,15 @@
 
 #include "platform/ServiceListener.h"
 #include "platform/simulated/SimulatedConnection.h"
-#include "platform/simulated/SimulatedQueue.h"
 
 namespace tarn {
 
-/// The transport: one service, its I/O thread and its connections.
+/// The transport: one service, its I/O thread and its connections. The test that drives it keeps it until
+/// the I/O thread is idle.
 class SimulatedServiceListeners final : public ServiceListeners {
 public:
-    explicit SimulatedServiceListeners(SimulatedScheduler& scheduler)
-        : scheduler_(scheduler), io_(scheduler.createQueue("I/O")) {}
+    explicit SimulatedServiceListeners(SimulatedIO io)
+        : io_(std::make_shared<const SimulatedIO>(std::move(io))) {}
 
     /// There is one listener at a time.
     std::unique_ptr<ServiceListener> createWithServiceName(const std::string& name) override;
@@ -21,7 +21,7 @@ public:
     /// by then are handled first.
     std::shared_ptr<SimulatedConnection> connect();
 
-    SimulatedQueue& io() { return *io_; }
+    SerialQueue& io() { return *io_->queue; }
 
 private:
     class Listener;
@@ -29,8 +29,9 @@ private:
     void offerWaiting();
     void offer(const std::shared_ptr<SimulatedConnection>& connection);
 
-    SimulatedScheduler& scheduler_;
-    const std::shared_ptr<SimulatedQueue> io_;
+    const std::shared_ptr<const SimulatedIO> io_;
+
+    // The I/O thread only.
     Listener* listener_ = nullptr; // while the service holds it
     std::vector<std::shared_ptr<SimulatedConnection>> waiting_;
     std::vector<std::shared_ptr<SimulatedConnection>> open_;
