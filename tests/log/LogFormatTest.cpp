@@ -31,9 +31,9 @@ TEST(LogFormat, WritesEachKindOfValue) {
     EXPECT_EQ(format("%d %lld %x", {-1, std::int64_t{1} << 40, 255}), "-1 1099511627776 ff");
     EXPECT_EQ(format("%.2f %f %g", {1.005, 2.0, 0.5}), "1.00 2.000000 0.5");
     EXPECT_EQ(format("%d %d", {true, false}), "1 0");
-    EXPECT_EQ(
-        format("%{public}@ %{public}s", {std::optional<std::string>(), static_cast<const char*>(nullptr)}),
-        "(null) (null)");
+    const std::vector<std::optional<std::string>> absent(1);
+    EXPECT_EQ(format("%{public}@ %{public}s", {absent.front(), static_cast<const char*>(nullptr)}),
+              "(null) (null)");
     EXPECT_EQ(format("%.400f", {1e308}).find_first_not_of("0123456789."), std::string::npos);
 }
 
