@@ -22,17 +22,17 @@ RegistrationHandle CoreMediaItem::observe(std::string_view keyPath, Block block)
 }
 
 MediaStatus CoreMediaItem::status() const {
-    std::lock_guard lock(environment_.mutex);
+    EngineLock lock(environment_);
     return state_.status;
 }
 
 std::optional<Error> CoreMediaItem::error() const {
-    std::lock_guard lock(environment_.mutex);
+    EngineLock lock(environment_);
     return state_.error;
 }
 
 MediaTime CoreMediaItem::currentTime() const {
-    std::lock_guard lock(environment_.mutex);
+    EngineLock lock(environment_);
     return mediaTimeOf(state_.driver ? state_.driver->positionOf(*this) : state_.position);
 }
 
@@ -46,7 +46,7 @@ void CoreMediaItem::seekToTime(MediaTime time) {
     if (MediaTime duration = asset_->duration(); duration.isNumeric())
         position = std::min(position, nanosecondsOf(duration));
     {
-        std::lock_guard lock(environment_.mutex);
+        EngineLock lock(environment_);
         state_.playedToEnd = false;
         if (state_.driver)
             state_.driver->seek(*this, position);
@@ -58,7 +58,7 @@ void CoreMediaItem::seekToTime(MediaTime time) {
 
 void CoreMediaItem::becomeReady() {
     {
-        std::lock_guard lock(environment_.mutex);
+        EngineLock lock(environment_);
         if (std::exchange(state_.status, MediaStatus::readyToPlay) == MediaStatus::readyToPlay)
             return;
     }

@@ -57,17 +57,17 @@ ObservedValue CoreQueuePlayer::read(std::string_view keyPath) const {
 }
 
 float CoreQueuePlayer::rate() const {
-    std::lock_guard lock(environment_.mutex);
+    EngineLock lock(environment_);
     return playback_->queue().rate();
 }
 
 std::shared_ptr<MediaItem> CoreQueuePlayer::currentItem() const {
-    std::lock_guard lock(environment_.mutex);
+    EngineLock lock(environment_);
     return playback_->queue().current();
 }
 
 MediaTime CoreQueuePlayer::currentTime() const {
-    std::lock_guard lock(environment_.mutex);
+    EngineLock lock(environment_);
     const PlayQueue::Entries& entries = playback_->queue().entries();
     if (entries.empty())
         return MediaTime::zero();
@@ -78,7 +78,7 @@ template <class Change>
 void CoreQueuePlayer::changeRate(Change change) {
     bool changed = false;
     {
-        std::lock_guard lock(environment_.mutex);
+        EngineLock lock(environment_);
         changed = change(playback_->queue());
     }
     if (changed)
@@ -117,7 +117,7 @@ void CoreQueuePlayer::edit(Edit edit) {
     PlayQueue::Entries left; // outlives the lock
     bool changed = false;
     {
-        std::lock_guard lock(environment_.mutex);
+        EngineLock lock(environment_);
         PlayQueue& queue = playback_->queue();
         const CoreMediaItem* before = queue.current().get(); // kept alive by `left`
         left = edit(queue);
@@ -171,13 +171,13 @@ void CoreQueuePlayer::setAudioSession(AudioSession& session) {
     };
     auto subscription = environment_.notifications.addObserver(AudioSession::interruptionNotification,
                                                                &session, std::move(handler));
-    std::lock_guard lock(environment_.mutex);
+    EngineLock lock(environment_);
     session_ = &session;
     std::swap(interruptions_, subscription); // the one before ends behind the lock
 }
 
 AudioSession* CoreQueuePlayer::audioSession() const {
-    std::lock_guard lock(environment_.mutex);
+    EngineLock lock(environment_);
     return session_;
 }
 

@@ -31,7 +31,7 @@ Playback::Playback(PlayerEnvironment& environment)
 
 void Playback::close() {
     PlayQueue::Entries left; // outlives the lock
-    std::lock_guard lock(environment_.mutex);
+    EngineLock lock(environment_);
     closed_ = true;
     left = queue_.removeAll();
     schedule();
@@ -39,11 +39,12 @@ void Playback::close() {
 
 void Playback::schedule() {
     if (!std::exchange(scheduled_, true))
-        environment_.loop.post([self = shared_from_this()] { self->run(); });
+        environment_.afterwards.emplace_back(
+            [self = shared_from_this()] { self->environment_.loop.post([self] { self->run(); }); });
 }
 
 void Playback::scheduleLocking() {
-    std::lock_guard lock(environment_.mutex);
+    EngineLock lock(environment_);
     schedule();
 }
 
@@ -51,7 +52,7 @@ void Playback::run() {
     assert(environment_.loop.isCurrent());
     bool closed = false;
     {
-        std::lock_guard lock(environment_.mutex);
+        EngineLock lock(environment_);
         scheduled_ = false;
         closed = closed_;
     }
@@ -75,7 +76,7 @@ void Playback::run() {
 void Playback::shutDown() {
     timer_.cancel();
     {
-        std::lock_guard lock(environment_.mutex);
+        EngineLock lock(environment_);
         queue_.setClock(nullptr);
     }
     output_.reset();
@@ -83,7 +84,7 @@ void Playback::shutDown() {
 }
 
 void Playback::outputWasReset() {
-    std::lock_guard lock(environment_.mutex);
+    EngineLock lock(environment_);
     queue_.outputWasReset(output_->writeIndex());
     schedule();
 }
@@ -98,7 +99,7 @@ void Playback::reportEnds() {
     while (true) {
         std::optional<PlayQueue::Ending> ending;
         {
-            std::lock_guard lock(environment_.mutex);
+            EngineLock lock(environment_);
             ending = queue_.takeEnd();
         }
         if (!ending)
@@ -125,7 +126,7 @@ void Playback::report(const PlayQueue::Ending& ending) {
 /// The current item and the next one.
 std::array<Playback::Place, 2> Playback::places() {
     std::array<Place, 2> places;
-    std::lock_guard lock(environment_.mutex);
+    EngineLock lock(environment_);
     auto place = places.begin();
     for (auto entry = queue_.entries().begin(); entry != queue_.entries().end() && place != places.end();
          ++entry)
@@ -149,7 +150,7 @@ bool Playback::openPlace(std::size_t index) {
     }
     std::optional<PlayQueue::Ending> ending;
     {
-        std::lock_guard lock(environment_.mutex);
+        EngineLock lock(environment_);
         ending = queue_.fail(place.entry, *error);
     }
     if (ending)
@@ -161,15 +162,15 @@ bool Playback::openPlace(std::size_t index) {
 bool Playback::prepareOutput() {
     if (!output_) {
         {
-            std::lock_guard lock(environment_.mutex);
+            EngineLock lock(environment_);
             if (!queue_.playing())
                 return false;
         }
         output_ = environment_.outputs.create(*this);
-        std::lock_guard lock(environment_.mutex);
+        EngineLock lock(environment_);
         queue_.setClock(output_.get());
     }
-    std::lock_guard lock(environment_.mutex);
+    EngineLock lock(environment_);
     if (!queue_.playing())
         return false;
     auto rewind = queue_.reconcile(output_->firstReplaceable());
@@ -185,7 +186,7 @@ bool Playback::renderPiece() {
         return false;
     std::optional<PlayQueue::Head> head;
     {
-        std::lock_guard lock(environment_.mutex);
+        EngineLock lock(environment_);
         head = queue_.head();
     }
     if (!head)
@@ -209,7 +210,7 @@ void Playback::append(const PlayQueue::Head& head, RenderedSpan span) {
     if (span.state == RenderedSpan::State::failed)
         ending = Timeline::End::failed;
     std::int64_t first = output_->writeIndex();
-    std::lock_guard lock(environment_.mutex);
+    EngineLock lock(environment_);
     queue_.append({.entry = head.entry,
                    .firstFrame = first,
                    .endFrame = first + static_cast<std::int64_t>(span.frames),
@@ -238,7 +239,7 @@ void Playback::stopOutput() {
 void Playback::setTimer() {
     std::optional<std::int64_t> end;
     {
-        std::lock_guard lock(environment_.mutex);
+        EngineLock lock(environment_);
         end = queue_.nextEnd();
     }
     if (end)

@@ -1,0 +1,30 @@
+#pragma once
+
+#include <string>
+#include <vector>
+
+#include "platform/MediaAsset.h"
+#include "platform/core/LiveObjects.h"
+#include "platform/simulated/media/MediaScript.h"
+
+namespace tarn {
+
+/// An asset as its script has it.
+class SimulatedMediaAsset final : public MediaAsset {
+public:
+    SimulatedMediaAsset(std::string URL, MediaScript script);
+
+    const std::vector<MediaMetadataItem>& commonMetadata() const override { return metadata_; }
+    MediaTime duration() const override;
+
+    const std::string& URL() const { return URL_; }
+    const MediaScript& script() const { return script_; }
+
+private:
+    const std::string URL_;
+    const MediaScript script_;
+    std::vector<MediaMetadataItem> metadata_;
+    LiveObject<"media asset"> live_;
+};
+
+} // namespace tarn
