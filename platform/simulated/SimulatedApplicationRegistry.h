@@ -16,7 +16,8 @@ public:
         applications_.insert_or_assign(std::move(extensionIdentifier), std::move(applicationIdentifier));
     }
 
-    std::optional<std::string> applicationContainingExtension(const std::string& extensionIdentifier) override {
+    std::optional<std::string>
+    applicationContainingExtension(const std::string& extensionIdentifier) override {
         auto found = applications_.find(extensionIdentifier);
         return found == applications_.end() ? std::nullopt : std::optional(found->second);
     }

@@ -9,8 +9,8 @@ namespace tarn {
 SimulatedAudioSession::SimulatedAudioSession(SimulatedScheduler& scheduler, NotificationCenter& notifications)
     : scheduler_(scheduler), notifications_(notifications), thread_(scheduler.createQueue("session")) {}
 
-std::optional<Error> SimulatedAudioSession::setCategory(Category category, Mode mode, RouteSharingPolicy policy,
-                                                        std::uint64_t options) {
+std::optional<Error> SimulatedAudioSession::setCategory(Category category, Mode mode,
+                                                        RouteSharingPolicy policy, std::uint64_t options) {
     categorySettings_.push_back({category, mode, policy, options});
     return categoryError_;
 }

@@ -17,7 +17,7 @@ public:
     const std::vector<MediaMetadataItem>& commonMetadata() const override { return metadata_; }
     MediaTime duration() const override;
 
-    const std::string& URL() const { return URL_; }
+    const std::string& URL() const override { return URL_; }
     const MediaScript& script() const { return script_; }
 
 private:

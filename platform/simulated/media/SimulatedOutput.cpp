@@ -109,7 +109,8 @@ std::chrono::nanoseconds SimulatedOutput::Sound::positionAt(std::int64_t frame) 
     if (frame >= end)
         return finish;
     double share = static_cast<double>(frame - first) / static_cast<double>(end - first);
-    return start + std::chrono::nanoseconds(std::llround(share * static_cast<double>((finish - start).count())));
+    return start +
+           std::chrono::nanoseconds(std::llround(share * static_cast<double>((finish - start).count())));
 }
 
 void SimulatedOutput::write(const PcmBuffer& buffer) {

@@ -30,7 +30,8 @@ std::chrono::nanoseconds SimulatedRendering::position() const {
 SimulatedRendering::Obstacle SimulatedRendering::nextObstacle() {
     const MediaScript& script = asset_->script();
     bool backwards = rate_ < 0;
-    Obstacle next{backwards ? std::chrono::nanoseconds(0) : script.duration, RenderedSpan::State::ended, nullptr};
+    Obstacle next{backwards ? std::chrono::nanoseconds(0) : script.duration, RenderedSpan::State::ended,
+                  nullptr};
     auto consider = [&](const Obstacle& other) {
         bool ahead = backwards ? other.position <= origin_ : other.position >= origin_;
         if (ahead && (backwards ? other.position > next.position : other.position < next.position))
@@ -84,7 +85,8 @@ RenderingFactory::Outcome SimulatedRenderingFactory::open(const std::shared_ptr<
     auto simulated = std::static_pointer_cast<SimulatedMediaAsset>(asset);
     if (const auto& error = simulated->script().unplayable)
         return {nullptr, *error};
-    return {std::make_unique<SimulatedRendering>(std::move(simulated), loop_, std::move(goesOn)), std::nullopt};
+    return {std::make_unique<SimulatedRendering>(std::move(simulated), loop_, std::move(goesOn)),
+            std::nullopt};
 }
 
 } // namespace tarn

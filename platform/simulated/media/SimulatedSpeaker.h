@@ -6,9 +6,9 @@
 #include <string>
 #include <vector>
 
+#include "platform/core/MutexProtected.h"
 #include "platform/core/media/Output.h"
 #include "platform/core/media/PlayerLoop.h"
-#include "platform/core/MutexProtected.h"
 
 namespace tarn {
 
