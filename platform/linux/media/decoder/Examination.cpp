@@ -6,9 +6,9 @@
 
 #include "platform/linux/media/decoder/Container.h"
 #include "platform/linux/media/decoder/Gapless.h"
+#include "platform/linux/media/decoder/PacketTimeline.h"
 #include "platform/linux/media/decoder/Samples.h"
 #include "platform/linux/media/decoder/Tags.h"
-#include "platform/linux/media/decoder/Timeline.h"
 
 namespace tarn {
 
@@ -35,7 +35,7 @@ public:
         AVPacket* packet = container_.next();
         if (packet == nullptr)
             return false;
-        timeline_ = Timeline(container_, *packet);
+        timeline_ = PacketTimeline(container_, *packet);
         position_ = packet->pos;
         end_ = timeline_.first();
         note(*packet);
@@ -95,7 +95,7 @@ private:
     }
 
     Container& container_;
-    Timeline timeline_;
+    PacketTimeline timeline_;
     std::int64_t position_ = -1;
     std::int64_t end_ = 0;
     std::int64_t discarded_ = 0;

@@ -45,7 +45,7 @@ std::optional<Error> FileDecoder::open() {
     if (first == nullptr)
         return container_.failure().value_or(
             mediaError(MediaErrorCode::notAudio, "The file holds no audio that can be played."));
-    timeline_ = Timeline(container_, *first);
+    timeline_ = PacketTimeline(container_, *first);
     frame_.reset(av_frame_alloc());
     end_ = info_.frames ? info_.firstFrame + *info_.frames : std::numeric_limits<std::int64_t>::max();
     seek(0);

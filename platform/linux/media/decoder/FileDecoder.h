@@ -3,7 +3,7 @@
 #include "platform/linux/media/decoder/Decoder.h"
 
 #include "platform/linux/media/decoder/Container.h"
-#include "platform/linux/media/decoder/Timeline.h"
+#include "platform/linux/media/decoder/PacketTimeline.h"
 
 namespace tarn {
 
@@ -35,7 +35,7 @@ private:
     ByteSource& source_;
     const AudioFileInfo info_;
     Container container_;
-    Timeline timeline_;
+    PacketTimeline timeline_;
     FfmpegPointer<AVCodecContext> codec_;
     FfmpegPointer<AVFrame> frame_;
 

@@ -10,10 +10,10 @@ namespace tarn {
 ///
 /// Where the stamps are coarser than a frame (milliseconds in Matroska), packets of constant length put them
 /// back on their grid.
-class Timeline {
+class PacketTimeline {
 public:
-    Timeline() = default;
-    Timeline(const Container& container, const AVPacket& first);
+    PacketTimeline() = default;
+    PacketTimeline(const Container& container, const AVPacket& first);
 
     /// Frame at which the first packet begins; below zero when the encoder's delay precedes time zero.
     std::int64_t first() const { return first_; }

@@ -1,4 +1,4 @@
-#include "platform/linux/media/decoder/Timeline.h"
+#include "platform/linux/media/decoder/PacketTimeline.h"
 
 #include <cstdlib>
 #include <cstring>
@@ -20,7 +20,7 @@ PacketTrim trimOf(const AVPacket& packet) {
     return {words[0], words[1]};
 }
 
-Timeline::Timeline(const Container& container, const AVPacket& first) : container_(&container) {
+PacketTimeline::PacketTimeline(const Container& container, const AVPacket& first) : container_(&container) {
     first_ = first.pts == AV_NOPTS_VALUE ? 0 : container.toFrames(first.pts);
     skipped_ = trimOf(first).start;
     if (skipped_ == 0 && first_ < 0)
@@ -37,7 +37,7 @@ Timeline::Timeline(const Container& container, const AVPacket& first) : containe
         grid_ = parameters.frame_size;
 }
 
-std::int64_t Timeline::frameAt(std::int64_t timestamp) const {
+std::int64_t PacketTimeline::frameAt(std::int64_t timestamp) const {
     const std::int64_t frame = container_->toFrames(timestamp);
     if (grid_ <= 0)
         return frame;
