@@ -1,10 +1,10 @@
 #include "platform/core/localization/DirectoryBundle.h"
 
 #include <algorithm>
-#include <fstream>
 #include <system_error>
 #include <utility>
 
+#include "platform/core/RegularFile.h"
 #include "platform/core/localization/LanguageChoice.h"
 #include "platform/core/localization/StringsFile.h"
 
@@ -16,7 +16,7 @@ namespace fs = std::filesystem;
 
 constexpr const char* languageFolderSuffix = ".lproj";
 constexpr const char* developmentLanguage = "en";
-constexpr std::uintmax_t sizeLimit = 1 << 20;
+constexpr std::size_t sizeLimit = 1 << 20;
 
 } // namespace
 
@@ -57,17 +57,8 @@ std::string DirectoryBundle::localizedString(const std::string& key, const std::
 }
 
 std::optional<Bundle::Strings> readStringsFileAt(const fs::path& path) {
-    std::error_code error;
-    if (!fs::is_regular_file(path, error))
-        return std::nullopt;
-    const std::uintmax_t size = fs::file_size(path, error);
-    if (error || size > sizeLimit)
-        return std::nullopt;
-    std::ifstream file(path, std::ios::binary);
-    std::string bytes(size, '\0');
-    if (!file.read(bytes.data(), static_cast<std::streamsize>(size)))
-        return std::nullopt;
-    return parseStringsFile(bytes);
+    const auto bytes = readRegularFile(path, sizeLimit);
+    return bytes ? parseStringsFile(*bytes) : std::nullopt;
 }
 
 } // namespace tarn
