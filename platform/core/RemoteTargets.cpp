@@ -118,7 +118,7 @@ private:
     const std::shared_ptr<TargetList> list_;
 };
 
-RemoteTargets::RemoteTargets(std::function<void()> changed) {
+RemoteTargets::RemoteTargets(const std::function<void()>& changed) {
     for (auto& command : commands_)
         command = std::make_unique<Command>(changed);
 }

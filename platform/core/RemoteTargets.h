@@ -23,7 +23,7 @@ public:
     /// `changed` runs after a command has gained its first target, lost its last one, or was enabled or
     /// disabled, on the thread that did it, with no lock held; it may run until the last registration is
     /// gone.
-    explicit RemoteTargets(std::function<void()> changed = nullptr);
+    explicit RemoteTargets(const std::function<void()>& changed = nullptr);
     ~RemoteTargets() override;
 
     RemoteCommand& pauseCommand() override;

@@ -29,6 +29,7 @@ std::vector<std::string> environmentWith(const std::vector<std::string>& additio
 
 std::vector<char*> pointersTo(std::vector<std::string>& texts) {
     std::vector<char*> result;
+    result.reserve(texts.size() + 1);
     for (std::string& text : texts)
         result.push_back(text.data());
     result.push_back(nullptr);

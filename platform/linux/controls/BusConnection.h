@@ -65,8 +65,7 @@ private:
     bool opened_ = false;
     bool lossReported_ = false;
     std::optional<Clock::time_point> connectedSince_;
-    std::chrono::microseconds delay_{
-        0}; // the last one between two tries; zero when the next one is the first
+    std::chrono::microseconds delay_{0}; // between the last two tries; zero before the second one
     EventSourceHandle timer_;
     EventSourceHandle folder_; // set while there is no bus
     std::string socketName_;

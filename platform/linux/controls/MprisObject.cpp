@@ -113,6 +113,7 @@ void MprisObject::emit(const char* interface, const std::vector<std::string>& pr
     if (properties.empty())
         return;
     std::vector<char*> names;
+    names.reserve(properties.size() + 1);
     for (const std::string& property : properties)
         names.push_back(const_cast<char*>(property.c_str())); // the bus library only reads them
     names.push_back(nullptr);
