@@ -1,0 +1,109 @@
+#include <gmock/gmock.h>
+
+#include "tests/support/ClientStory.h"
+
+namespace tarn {
+namespace {
+
+using commands::destroyAsset;
+using commands::upsertAsset;
+using commands::upsertItem;
+using testing::ElementsAre;
+using testing::HasSubstr;
+using testing::IsEmpty;
+
+class AssetStoriesTest : public ClientStory {
+protected:
+    AssetStoriesTest() {
+        file("file:///tagged.flac", 200, {{"title", "Song"}, {"albumName", "Album"}, {"artist", "Band"}});
+        file("file:///plain%20song.wav", 2.5, {});
+    }
+};
+
+TEST_F(AssetStoriesTest, AnswersWithWhatTheFileTells) {
+    EXPECT_EQ(tell(upsertAsset({.identifier = "a", .URL = "file:///tagged.flac"})),
+              "upsertWithMetaData: albumTitle=Album artist=Band duration=200 identifier=a title=Song\n");
+    EXPECT_THAT(log.messages(), ElementsAre(HasSubstr("Decoded title for audio file asset: Song")));
+
+    EXPECT_EQ(tell(upsertAsset({.identifier = "b", .URL = "file:///plain%20song.wav"})),
+              "upsertWithMetaData: duration=2.5 identifier=b title=plain song.wav\n");
+    EXPECT_THAT(log.messages().back(),
+                HasSubstr("No metadata for title. Using file name for audio file asset: plain song.wav"));
+}
+
+TEST_F(AssetStoriesTest, WhatTheClientGivesComesBeforeWhatTheFileTells) {
+    EXPECT_EQ(tell(upsertAsset({"a", "file:///tagged.flac", "Mine", "My album", "Me"})),
+              "upsertWithMetaData: albumTitle=My album artist=Me duration=200 identifier=a title=Mine\n");
+    // An empty title is given, an empty album or artist is not.
+    EXPECT_EQ(tell(upsertAsset({"a", "file:///tagged.flac", "", "", ""})),
+              "upsertWithMetaData: albumTitle=Album artist=Band duration=200 identifier=a\n");
+}
+
+TEST_F(AssetStoriesTest, AnUpsertWithAURLReplacesTheRecordWhole) {
+    tell(upsertAsset({"a", "file:///tagged.flac", "Mine", "My album", "Me"}));
+    auto before = client->assets->assetWithIdentifier("a");
+    EXPECT_EQ(tell(upsertAsset({.identifier = "a", .URL = "file:///plain%20song.wav"})),
+              "upsertWithMetaData: duration=2.5 identifier=a title=plain song.wav\n");
+    EXPECT_NE(client->assets->assetWithIdentifier("a"), before);
+    EXPECT_EQ(client->assets->vlAssetWithAsset(before.get()), nullptr);
+}
+
+TEST_F(AssetStoriesTest, AnUpdateWithoutAURLChangesOnlyWhatItGives) {
+    tell(upsertAsset({.identifier = "a", .URL = "file:///tagged.flac"}));
+    auto asset = client->assets->assetWithIdentifier("a");
+    EXPECT_EQ(tell(upsertAsset({.identifier = "a", .title = "New", .albumTitle = ""})),
+              "upsertWithMetaData: nothing\n");
+    auto record = client->assets->vlAssetWithAsset(asset.get());
+    ASSERT_TRUE(record);
+    EXPECT_EQ(record->asset, asset);
+    EXPECT_EQ(record->title, "New");
+    EXPECT_EQ(record->albumTitle, "Album");
+    EXPECT_EQ(record->artist, "Band");
+
+    EXPECT_EQ(tell(upsertAsset({.identifier = "unknown", .title = "New"})), "upsertWithMetaData: nothing\n");
+    EXPECT_EQ(client->assets->assetWithIdentifier("unknown"), nullptr);
+}
+
+TEST_F(AssetStoriesTest, ATitleTagThatIsNotTextLeavesNoTitle) {
+    file("file:///odd.mp3", 1, {{"title", std::nullopt}});
+    EXPECT_EQ(tell(upsertAsset({.identifier = "a", .URL = "file:///odd.mp3"})),
+              "upsertWithMetaData: duration=1 identifier=a\n");
+}
+
+TEST_F(AssetStoriesTest, HoldsTheRightOfATokenOnlyWhileTheFileIsOpened) {
+    device.sandboxExtensions.grant("token", "file:///tagged.flac");
+    tell(upsertAsset({.identifier = "a", .URL = "file:///tagged.flac", .sandboxExtensionToken = "token"}));
+    EXPECT_EQ(device.sandboxExtensions.held(), 0);
+    EXPECT_THAT(errors(), IsEmpty());
+
+    tell(upsertAsset({.identifier = "a", .URL = "file:///tagged.flac", .sandboxExtensionToken = ""}));
+    EXPECT_THAT(errors(), IsEmpty());
+
+    EXPECT_EQ(tell(upsertAsset(
+                  {.identifier = "a", .URL = "file:///tagged.flac", .sandboxExtensionToken = "spent"})),
+              "upsertWithMetaData: albumTitle=Album artist=Band duration=200 identifier=a title=Song\n");
+    EXPECT_THAT(errors(), ElementsAre("Failed to consume asset sandox extension (Path: <private>). Playback "
+                                      "will fail."));
+}
+
+TEST_F(AssetStoriesTest, AFileThatDoesNotOpenChangesNothing) {
+    tell(upsertAsset({.identifier = "a", .URL = "file:///tagged.flac"}));
+    auto before = client->assets->assetWithIdentifier("a");
+    device.sandboxExtensions.grant("token", "file:///gone.flac");
+    EXPECT_EQ(
+        tell(upsertAsset({.identifier = "a", .URL = "file:///gone.flac", .sandboxExtensionToken = "token"})),
+        "upsertWithMetaData: error 24\n");
+    EXPECT_EQ(client->assets->assetWithIdentifier("a"), before);
+    EXPECT_EQ(device.sandboxExtensions.held(), 0);
+    EXPECT_THAT(errors(), ElementsAre(HasSubstr("Could not open audio file asset")));
+}
+
+TEST_F(AssetStoriesTest, ADestroyedAssetIsNotFoundAnyMore) {
+    tell(upsertAsset({.identifier = "a", .URL = "file:///tagged.flac"}));
+    EXPECT_EQ(tell(destroyAsset("a")), "destroy: no answer\n");
+    EXPECT_EQ(tell(destroyAsset("a")), "destroy: no answer\n");
+    EXPECT_EQ(tell(upsertItem("i", "a")), "upsertWithAsset: error 26\n");
+}
+
+} // namespace
+} // namespace tarn

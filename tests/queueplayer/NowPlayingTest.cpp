@@ -1,0 +1,93 @@
+#include <gmock/gmock.h>
+
+#include "tests/support/ClientStory.h"
+
+namespace tarn {
+namespace {
+
+using namespace std::chrono_literals;
+using namespace commands;
+
+class NowPlayingTest : public ClientStory {
+protected:
+    NowPlayingTest() {
+        device.applications.add("ostrel.watch.music", "ostrel.music");
+        file("file:///tagged.flac", 200, {{"title", "Song"}, {"albumName", "Album"}, {"artist", "Band"}});
+        tell(upsertAsset({.identifier = "a", .URL = "file:///tagged.flac"}));
+        tell(upsertItem("i", "a"));
+    }
+
+    NowPlayingInfo shown() { return device.nowPlaying.info(); }
+    std::optional<std::string> application() { return device.nowPlaying.parentApplication(); }
+
+    static NowPlayingInfo info(const std::string& title, double duration, double elapsed, float rate) {
+        return {title, duration, elapsed, rate, std::nullopt, std::nullopt};
+    }
+};
+
+TEST_F(NowPlayingTest, IsPublishedTwiceWhenAPlayerIsMadeAndAtEveryChangeOfRateOrItem) {
+    tell(upsertPlayer("x,y,ostrel.watch.music", {"i"}));
+    EXPECT_EQ(device.nowPlaying.publications(), 2);
+    NowPlayingInfo expected = info("Song", 200, 0, 0);
+    expected.artist = "Band";
+    expected.albumTitle = "Album";
+    EXPECT_EQ(shown(), expected);
+    EXPECT_EQ(application(), "ostrel.music");
+
+    tell(setRate("x,y,ostrel.watch.music", 1));
+    pass(5s);
+    tell(setCurrentTime("i", 100));
+    tell(setRate("x,y,ostrel.watch.music", 0));
+    expected.elapsedTime = 100;
+    EXPECT_EQ(shown(), expected);
+    EXPECT_EQ(device.nowPlaying.publications(), 4);
+
+    tell(removeAllItems("x,y,ostrel.watch.music"));
+    EXPECT_TRUE(shown().empty());
+    EXPECT_EQ(device.nowPlaying.publications(), 5);
+    tell(destroyPlayer("x,y,ostrel.watch.music"));
+    EXPECT_EQ(device.nowPlaying.publications(), 5);
+}
+
+TEST_F(NowPlayingTest, HasOnlyWhatTheRecordHas) {
+    file("file:///plain.wav", 3, {});
+    tell(upsertAsset({.identifier = "a", .URL = "file:///plain.wav"}));
+    tell(upsertItem("i", "a"));
+    tell(upsertPlayer("p", {"i"}));
+    EXPECT_EQ(shown(), info("plain.wav", 3, 0, 0));
+    tell(upsertAsset({.identifier = "a", .title = "New", .artist = "Me"}));
+    tell(setRate("p", 1));
+    NowPlayingInfo expected = info("New", 3, 0, 1);
+    expected.artist = "Me";
+    EXPECT_EQ(shown(), expected);
+}
+
+TEST_F(NowPlayingTest, AnItemWithoutRecordOrTitleGoesByTheNameOfItsFile) {
+    tell(upsertAsset({.identifier = "b", .URL = "file:///tagged.flac", .title = ""}));
+    tell(upsertItem("j", "b"));
+    tell(upsertPlayer("p", {"j", "i"}));
+    EXPECT_EQ(shown().title, "tagged.flac");
+    EXPECT_EQ(shown().artist, "Band");
+
+    tell(destroyAsset("a"));
+    tell(advanceToNextItem("p"));
+    EXPECT_EQ(shown(), info("tagged.flac", 200, 0, 0));
+}
+
+TEST_F(NowPlayingTest, TheApplicationIsThatOfTheLastComponentOfTheIdentifier) {
+    struct Case {
+        const char* identifier;
+        std::optional<std::string> application;
+    };
+    for (const Case& known :
+         {Case{"ostrel.watch.music", "ostrel.music"}, Case{",ostrel.watch.music", "ostrel.music"},
+          Case{"ostrel.watch.music,", std::nullopt}, Case{"", std::nullopt},
+          Case{"ostrel.watch.music,unknown", std::nullopt}}) {
+        tell(upsertPlayer(known.identifier, {"i"}));
+        EXPECT_EQ(application(), known.application) << known.identifier;
+        EXPECT_EQ(shown().title, "Song");
+    }
+}
+
+} // namespace
+} // namespace tarn

@@ -1,0 +1,155 @@
+#include <gmock/gmock.h>
+
+#include "platform/MediaQueuePlayer.h"
+#include "tests/support/ClientStory.h"
+
+namespace tarn {
+namespace {
+
+using namespace std::chrono_literals;
+using namespace commands;
+using testing::ElementsAre;
+using testing::IsEmpty;
+
+/// What the queue player does with its queue, and what the client sees of it.
+class QueueStoriesTest : public ClientStory {
+protected:
+    std::shared_ptr<MediaQueuePlayer> player() {
+        return client->players->queuePlayerWithIdentifier("player");
+    }
+};
+
+TEST_F(QueueStoriesTest, PushesStatusRateAndCurrentItemBeforeTheAnswer) {
+    mirror({"a", "b"});
+    EXPECT_EQ(tell(upsertPlayer("player", {"a", "b"})),
+              "push queuePlayer.setStatus identifier=player status=1\n"
+              "push queuePlayer.setRate identifier=player rate=0\n"
+              "push queuePlayer.setCurrentItem containedIdentifier=a identifier=player\n"
+              "upsertWithItems: identifier=a status=1\n");
+}
+
+TEST_F(QueueStoriesTest, AnEmptyQueueHasNoCurrentItem) {
+    EXPECT_EQ(tell(upsertPlayer("player", {})), "push queuePlayer.setStatus identifier=player status=1\n"
+                                                "push queuePlayer.setRate identifier=player rate=0\n"
+                                                "push queuePlayer.setCurrentItem identifier=player\n"
+                                                "upsertWithItems: status=1\n");
+}
+
+TEST_F(QueueStoriesTest, AnUnknownItemMakesAndReplacesNothing) {
+    mirror({"a"});
+    auto before = player();
+    EXPECT_EQ(tell(upsertPlayer("player", {"a", "x", "y"})), "upsertWithItems: error 26\n");
+    EXPECT_EQ(player(), before);
+    client->players->setPlayerItemManager(nullptr);
+    EXPECT_EQ(tell(upsertPlayer("other", {"a"})), "upsertWithItems: error 26\n");
+    EXPECT_THAT(errors(), ElementsAre("Could not find MediaItem with id x when handling `upsertWithItems` "
+                                      "command. Ignoring command.",
+                                      "Could not find MediaItem with id a when handling `upsertWithItems` "
+                                      "command. Ignoring command."));
+}
+
+TEST_F(QueueStoriesTest, PlaysTheQueueToItsEnd) {
+    mirror({"a", "b"});
+    EXPECT_EQ(tell(setRate("player", 1)), "push queuePlayer.setRate identifier=player rate=1\n"
+                                          "setRate: no answer\n");
+    EXPECT_EQ(pass(10s), "push playerItem.notifyDidPlayToEndTime identifier=a\n"
+                         "push queuePlayer.setCurrentItem containedIdentifier=b identifier=player\n");
+    EXPECT_EQ(tell(getCurrentTime("b")), "getCurrentTime: currentTime=0\n");
+    EXPECT_EQ(pass(10s), "push playerItem.notifyDidPlayToEndTime identifier=b\n"
+                         "push queuePlayer.setCurrentItem identifier=player\n"
+                         "push queuePlayer.setRate identifier=player rate=0\n");
+}
+
+TEST_F(QueueStoriesTest, EditsTheQueueWhileItPlays) {
+    mirror({"a", "b", "c"});
+    tell(upsertPlayer("player", {"a"}));
+    tell(setRate("player", 1));
+    EXPECT_EQ(tell(appendItem("player", "b")), "appendItem: no answer\n");
+    EXPECT_EQ(tell(replaceCurrentItem("player", "c")),
+              "push queuePlayer.setCurrentItem containedIdentifier=c identifier=player\n"
+              "replaceCurrentItem: no answer\n");
+    EXPECT_EQ(tell(advanceToNextItem("player")),
+              "push queuePlayer.setCurrentItem containedIdentifier=b identifier=player\n"
+              "advanceToNextItem: no answer\n");
+    EXPECT_EQ(tell(appendItem("player", "a")), "appendItem: no answer\n");
+    EXPECT_EQ(tell(removeItem("player", "b")),
+              "push queuePlayer.setCurrentItem containedIdentifier=a identifier=player\n"
+              "removeItem: no answer\n");
+    EXPECT_EQ(tell(removeAllItems("player")), "push queuePlayer.setCurrentItem identifier=player\n"
+                                              "removeAllItems: no answer\n");
+}
+
+TEST_F(QueueStoriesTest, AnEditWithAnUnknownItemIsAnsweredWhetherThePlayerIsKnownOrNot) {
+    mirror({"a"});
+    for (const char* name : {"player", "unknown"}) {
+        EXPECT_EQ(tell(appendItem(name, "x")), "appendItem: error 26\n");
+        EXPECT_EQ(tell(removeItem(name, "x")), "removeItem: error 26\n");
+        EXPECT_EQ(tell(replaceCurrentItem(name, "x")), "replaceCurrentItem: error 26\n");
+    }
+    EXPECT_EQ(errors().size(), 6u);
+}
+
+TEST_F(QueueStoriesTest, AnUnknownPlayerIsLeftAlone) {
+    mirror({"a"});
+    EXPECT_EQ(tell(setRate("unknown", 1)), "setRate: no answer\n");
+    EXPECT_EQ(tell(advanceToNextItem("unknown")), "advanceToNextItem: no answer\n");
+    EXPECT_EQ(tell(appendItem("unknown", "a")), "appendItem: no answer\n");
+    EXPECT_EQ(tell(removeItem("unknown", "a")), "removeItem: no answer\n");
+    EXPECT_EQ(tell(removeAllItems("unknown")), "removeAllItems: no answer\n");
+    EXPECT_EQ(tell(replaceCurrentItem("unknown", "a")), "replaceCurrentItem: no answer\n");
+    EXPECT_EQ(tell(destroyPlayer("unknown")), "destroy: no answer\n");
+    EXPECT_THAT(errors(), IsEmpty());
+}
+
+TEST_F(QueueStoriesTest, ReplacingThePlayerWhileItPlaysEndsItsSoundAndItsReports) {
+    mirror({"a", "b"});
+    tell(setRate("player", 1));
+    std::weak_ptr<MediaQueuePlayer> before = player();
+    pass(4s);
+    EXPECT_EQ(tell(upsertPlayer("player", {"a", "b"})),
+              "push queuePlayer.setStatus identifier=player status=1\n"
+              "push queuePlayer.setRate identifier=player rate=0\n"
+              "push queuePlayer.setCurrentItem containedIdentifier=a identifier=player\n"
+              "upsertWithItems: identifier=a status=1\n");
+    EXPECT_TRUE(before.expired());
+    EXPECT_EQ(tell(getCurrentTime("a")), "getCurrentTime: currentTime=4\n");
+    EXPECT_EQ(pass(60s), "");
+}
+
+TEST_F(QueueStoriesTest, DestroyingThePlayerWhileItPlaysSaysNothing) {
+    mirror({"a"});
+    tell(setRate("player", 1));
+    EXPECT_EQ(tell(destroyPlayer("player")), "destroy: no answer\n");
+    EXPECT_EQ(pass(60s), "");
+}
+
+TEST_F(QueueStoriesTest, ReplacingTheAssetLeavesWhatPlaysAlone) {
+    mirror({"a"});
+    tell(setRate("player", 1));
+    song("a");
+    EXPECT_EQ(pass(10s), "push playerItem.notifyDidPlayToEndTime identifier=a\n"
+                         "push queuePlayer.setCurrentItem identifier=player\n"
+                         "push queuePlayer.setRate identifier=player rate=0\n");
+}
+
+TEST_F(QueueStoriesTest, SetRateComesBeforeEveryOtherCommandOfAMessage) {
+    mirror({"a"});
+    auto command = setRate("player", 1);
+    command->queuePlayer()->setDestroy(destroyPlayer("player")->queuePlayer()->destroy());
+    EXPECT_EQ(tell(command), "push queuePlayer.setRate identifier=player rate=1\n"
+                             "destroy: no answer\n");
+    EXPECT_NE(player(), nullptr);
+}
+
+TEST_F(QueueStoriesTest, WhatOnlyTheServiceSendsIsIgnored) {
+    auto message = std::make_shared<VLProtoAudioFileQueuePlayer>();
+    message->setSetStatus(std::make_shared<VLProtoAudioFilePlayerStatus>());
+    message->setSetCurrentItem(std::make_shared<VLProtoAudioFilePlayerUpdateContainedIdentifier>());
+    auto command = std::make_shared<VLProtoAudioFilePlayerMessage>();
+    command->setQueuePlayer(message);
+    EXPECT_EQ(tell(command), "setCurrentItem: no answer\n");
+    EXPECT_THAT(errors(), IsEmpty());
+}
+
+} // namespace
+} // namespace tarn

@@ -1,0 +1,92 @@
+#include <gtest/gtest.h>
+
+#include <optional>
+
+#include "platform/MediaQueuePlayer.h"
+#include "platform/core/RemoteTargets.h"
+#include "tests/support/ClientStory.h"
+
+namespace tarn {
+namespace {
+
+using namespace std::chrono_literals;
+using namespace commands;
+using Kind = RemoteCommandKind;
+using Result = RemoteCommandResult;
+
+class RemoteCommandTest : public ClientStory {
+protected:
+    RemoteCommandTest() { mirror({"a", "b"}); }
+
+    /// Delivers the command as the system does; none while it is not finished.
+    std::optional<Result> press(Kind kind) {
+        auto result = std::make_shared<std::optional<Result>>();
+        device.remoteCommands.press(kind, [result](Result delivered) { *result = delivered; });
+        seen = now();
+        return *result;
+    }
+
+    std::string seen;
+};
+
+TEST_F(RemoteCommandTest, PlayPauseAndToggleDoWhatTheySay) {
+    EXPECT_EQ(press(Kind::play), Result::success);
+    EXPECT_EQ(seen, "push queuePlayer.setRate identifier=player rate=1\n");
+    EXPECT_EQ(press(Kind::pause), Result::success);
+    EXPECT_EQ(seen, "push queuePlayer.setRate identifier=player rate=0\n");
+    EXPECT_EQ(press(Kind::togglePlayPause), Result::success);
+    EXPECT_EQ(seen, "push queuePlayer.setRate identifier=player rate=1\n");
+    tell(setRate("player", -1));
+    EXPECT_EQ(press(Kind::togglePlayPause), Result::success);
+    EXPECT_EQ(seen, "push queuePlayer.setRate identifier=player rate=0\n");
+}
+
+TEST_F(RemoteCommandTest, FailWhereThereIsNothingToPauseOrTheSessionFails) {
+    tell(removeAllItems("player"));
+    EXPECT_EQ(press(Kind::pause), Result::commandFailed);
+    device.audioSession.fail({"test", 1, {}});
+    EXPECT_EQ(press(Kind::play), Result::commandFailed);
+    EXPECT_EQ(press(Kind::togglePlayPause), Result::commandFailed);
+}
+
+TEST_F(RemoteCommandTest, NextTrackHasNoContentAtTheEndOfTheQueue) {
+    EXPECT_EQ(press(Kind::nextTrack), Result::success);
+    EXPECT_EQ(seen, "push queuePlayer.setCurrentItem containedIdentifier=b identifier=player\n");
+    EXPECT_EQ(press(Kind::nextTrack), Result::noSuchContent);
+    EXPECT_EQ(seen, "push queuePlayer.setCurrentItem identifier=player\n");
+}
+
+TEST_F(RemoteCommandTest, PreviousTrackIsDisabledForGood) {
+    EXPECT_EQ(press(Kind::previousTrack), Result::noSuchContent);
+    tell(destroyPlayer("player"));
+    EXPECT_FALSE(device.remoteCommands.offers(Kind::previousTrack));
+}
+
+TEST_F(RemoteCommandTest, WithSeveralPlayersPauseGoesToAllAndTheRestToTheNewest) {
+    tell(upsertPlayer("newer", {"b"}));
+    EXPECT_EQ(press(Kind::play), Result::success);
+    EXPECT_EQ(seen, "push queuePlayer.setRate identifier=newer rate=1\n");
+    tell(setRate("player", 1));
+    EXPECT_EQ(press(Kind::pause), Result::success);
+    EXPECT_EQ(seen, "push queuePlayer.setRate identifier=newer rate=0\n"
+                    "push queuePlayer.setRate identifier=player rate=0\n");
+    tell(destroyPlayer("newer"));
+    EXPECT_EQ(press(Kind::play), Result::success);
+    EXPECT_EQ(seen, "push queuePlayer.setRate identifier=player rate=1\n");
+    tell(destroyPlayer("player"));
+    EXPECT_EQ(press(Kind::play), Result::noSuchContent);
+}
+
+TEST_F(RemoteCommandTest, APlayThatWaitsForTheSessionHoldsUpNobodyElse) {
+    device.audioSession.answerAfter(20s);
+    EXPECT_EQ(press(Kind::play), std::nullopt);
+    EXPECT_EQ(tell(advanceToNextItem("player")),
+              "push queuePlayer.setCurrentItem containedIdentifier=b identifier=player\n"
+              "advanceToNextItem: no answer\n");
+    EXPECT_EQ(pass(17s), "");
+    EXPECT_EQ(errors().size(), 1u);
+    EXPECT_EQ(pass(3s), "push queuePlayer.setRate identifier=player rate=1\n");
+}
+
+} // namespace
+} // namespace tarn
