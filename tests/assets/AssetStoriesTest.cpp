@@ -5,6 +5,7 @@
 namespace tarn {
 namespace {
 
+using namespace std::chrono_literals;
 using commands::destroyAsset;
 using commands::upsertAsset;
 using commands::upsertItem;
@@ -15,8 +16,10 @@ using testing::IsEmpty;
 class AssetStoriesTest : public ClientStory {
 protected:
     AssetStoriesTest() {
-        file("file:///tagged.flac", 200, {{"title", "Song"}, {"albumName", "Album"}, {"artist", "Band"}});
-        file("file:///plain%20song.wav", 2.5, {});
+        device.media.addFile("file:///tagged.flac",
+                             {.title = "Song", .albumTitle = "Album", .artist = "Band", .duration = 200s});
+        device.media.addFile("file:///plain%20song.wav", {.duration = 2500ms});
+        device.media.addFile("file:///private.wav", {.duration = 3s, .token = "token"});
     }
 };
 
@@ -64,23 +67,18 @@ TEST_F(AssetStoriesTest, AnUpdateWithoutAURLChangesOnlyWhatItGives) {
     EXPECT_EQ(client->assets->assetWithIdentifier("unknown"), nullptr);
 }
 
-TEST_F(AssetStoriesTest, ATitleTagThatIsNotTextLeavesNoTitle) {
-    file("file:///odd.mp3", 1, {{"title", std::nullopt}});
-    EXPECT_EQ(tell(upsertAsset({.identifier = "a", .URL = "file:///odd.mp3"})),
-              "upsertWithMetaData: duration=1 identifier=a\n");
-}
-
 TEST_F(AssetStoriesTest, HoldsTheRightOfATokenOnlyWhileTheFileIsOpened) {
-    device.sandboxExtensions.grant("token", "file:///tagged.flac");
-    tell(upsertAsset({.identifier = "a", .URL = "file:///tagged.flac", .sandboxExtensionToken = "token"}));
-    EXPECT_EQ(device.sandboxExtensions.held(), 0);
+    device.sandboxExtensions.issue("token");
+    auto upsert = [this](const char* URL, const char* token) {
+        return tell(upsertAsset({.identifier = "a", .URL = URL, .sandboxExtensionToken = token}));
+    };
+    EXPECT_EQ(upsert("file:///private.wav", "token"),
+              "upsertWithMetaData: duration=3 identifier=a title=private.wav\n");
+    EXPECT_EQ(device.sandboxExtensions.held(), 0u);
+    upsert("file:///tagged.flac", "");
     EXPECT_THAT(errors(), IsEmpty());
 
-    tell(upsertAsset({.identifier = "a", .URL = "file:///tagged.flac", .sandboxExtensionToken = ""}));
-    EXPECT_THAT(errors(), IsEmpty());
-
-    EXPECT_EQ(tell(upsertAsset(
-                  {.identifier = "a", .URL = "file:///tagged.flac", .sandboxExtensionToken = "spent"})),
+    EXPECT_EQ(upsert("file:///tagged.flac", "token"),
               "upsertWithMetaData: albumTitle=Album artist=Band duration=200 identifier=a title=Song\n");
     EXPECT_THAT(errors(), ElementsAre("Failed to consume asset sandox extension (Path: <private>). Playback "
                                       "will fail."));
@@ -89,12 +87,12 @@ TEST_F(AssetStoriesTest, HoldsTheRightOfATokenOnlyWhileTheFileIsOpened) {
 TEST_F(AssetStoriesTest, AFileThatDoesNotOpenChangesNothing) {
     tell(upsertAsset({.identifier = "a", .URL = "file:///tagged.flac"}));
     auto before = client->assets->assetWithIdentifier("a");
-    device.sandboxExtensions.grant("token", "file:///gone.flac");
+    device.sandboxExtensions.issue("token");
     EXPECT_EQ(
         tell(upsertAsset({.identifier = "a", .URL = "file:///gone.flac", .sandboxExtensionToken = "token"})),
         "upsertWithMetaData: error 24\n");
     EXPECT_EQ(client->assets->assetWithIdentifier("a"), before);
-    EXPECT_EQ(device.sandboxExtensions.held(), 0);
+    EXPECT_EQ(device.sandboxExtensions.held(), 0u);
     EXPECT_THAT(errors(), ElementsAre(HasSubstr("Could not open audio file asset")));
 }
 

@@ -28,14 +28,15 @@ protected:
 TEST_F(ActivationTest, ARateThatCountsAsZeroPausesWithoutTheSession) {
     for (float rate : {0.0F, -0.0F, 1e-8F, -1e-8F, std::numeric_limits<float>::denorm_min()}) {
         tell(setRate("player", 2));
-        auto activations = device.audioSession.activations();
+        auto activations = device.audioSession.activationRequests();
         EXPECT_EQ(tell(setRate("player", rate)), "push queuePlayer.setRate identifier=player rate=0\n"
                                                  "setRate: no answer\n");
-        EXPECT_EQ(device.audioSession.activations(), activations);
+        EXPECT_EQ(device.audioSession.activationRequests(), activations);
     }
 }
 
 TEST_F(ActivationTest, AnyOtherRateIsAppliedExactlyOnceTheSessionIsActive) {
+    tell(setCurrentTime("a", 5));
     for (float rate : {1.0F, 2.0F, -1.0F, 1.1920929e-07F, 0.333F}) {
         tell(setRate("player", rate));
         EXPECT_EQ(this->rate(), rate);
@@ -49,23 +50,24 @@ TEST_F(ActivationTest, ARateThatIsNotFiniteActivatesAndIsRefusedByTheEngine) {
     tell(setRate("player", 2));
     for (float rate : {std::numeric_limits<float>::quiet_NaN(), std::numeric_limits<float>::infinity(),
                        -std::numeric_limits<float>::infinity()}) {
-        auto activations = device.audioSession.activations();
+        auto activations = device.audioSession.activationRequests();
         EXPECT_EQ(tell(setRate("player", rate)), "setRate: no answer\n");
-        EXPECT_EQ(device.audioSession.activations(), activations + 1);
+        EXPECT_EQ(device.audioSession.activationRequests(), activations + 1);
         EXPECT_EQ(this->rate(), 2);
     }
     EXPECT_EQ(errors().size(), 3u);
 }
 
 TEST_F(ActivationTest, AFailedActivationLeavesTheRateAndIsLogged) {
-    device.audioSession.fail({"test", 7, {}});
+    device.audioSession.willActivate({.error = Error{"test", 7, {}}});
     EXPECT_EQ(tell(setRate("player", 1)), "setRate: no answer\n");
     EXPECT_EQ(rate(), 0);
     EXPECT_THAT(errors(), ElementsAre("Could not set audio session active due to error: (test, code 7)."));
 }
 
 TEST_F(ActivationTest, LaterCommandsOfItsQueueWaitForTheSessionAndItemCommandsDoNot) {
-    device.audioSession.answerAfter(5s);
+    device.audioSession.willActivate({.after = 5s});
+    device.audioSession.willActivate({.after = 5s});
     client->send(setRate("player", 1));
     client->send(setRate("player", 2));
     EXPECT_EQ(tell(getCurrentTime("a")), "getCurrentTime: currentTime=0\n");
@@ -76,7 +78,7 @@ TEST_F(ActivationTest, LaterCommandsOfItsQueueWaitForTheSessionAndItemCommandsDo
 }
 
 TEST_F(ActivationTest, AnAnswerWithin17SecondsIsInTime) {
-    device.audioSession.answerAfter(16'999ms);
+    device.audioSession.willActivate({.after = 16'999ms});
     EXPECT_EQ(tell(setRate("player", 1)), "");
     EXPECT_EQ(pass(16'999ms), "push queuePlayer.setRate identifier=player rate=1\n"
                               "setRate: no answer\n");
@@ -84,7 +86,7 @@ TEST_F(ActivationTest, AnAnswerWithin17SecondsIsInTime) {
 }
 
 TEST_F(ActivationTest, After17SecondsTheQueueGoesOnAndALateSuccessIsStillApplied) {
-    device.audioSession.answerAfter(20s);
+    device.audioSession.willActivate({.after = 20s});
     tell(setRate("player", 1));
     EXPECT_EQ(pass(16'999ms), "");
     EXPECT_EQ(pass(1ms), "setRate: no answer\n");
@@ -96,8 +98,7 @@ TEST_F(ActivationTest, After17SecondsTheQueueGoesOnAndALateSuccessIsStillApplied
 }
 
 TEST_F(ActivationTest, ALateFailureIsLogged) {
-    device.audioSession.answerAfter(20s);
-    device.audioSession.fail({"test", 7, {}});
+    device.audioSession.willActivate({.after = 20s, .error = Error{"test", 7, {}}});
     tell(setRate("player", 1));
     pass(20s);
     EXPECT_EQ(rate(), 0);
@@ -105,7 +106,7 @@ TEST_F(ActivationTest, ALateFailureIsLogged) {
 }
 
 TEST_F(ActivationTest, APendingActivationKeepsAQueuePlayerAndNothingElseDoes) {
-    device.audioSession.answerAfter(30s);
+    device.audioSession.willActivate({.after = 30s});
     tell(setRate("player", 1));
     EXPECT_EQ(pass(17s), "setRate: no answer\n");
     tell(destroyPlayer("player"));

@@ -74,7 +74,7 @@ TEST_P(BadInputTest, AnEmptyOrVeryLongIdentifierIsOneLikeAnyOther) {
 }
 
 INSTANTIATE_TEST_SUITE_P(EveryCommand, BadInputTest, testing::ValuesIn(badInputs),
-                         [](const auto& info) { return std::string(info.param.name); });
+                         [](const auto& input) { return std::string(input.param.name); });
 
 } // namespace
 } // namespace tarn

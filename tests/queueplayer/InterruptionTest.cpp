@@ -14,24 +14,26 @@ class InterruptionTest : public ClientStory {
 protected:
     InterruptionTest() { mirror({"a", "b"}); }
 
-    /// Posts an interruption with this information as the session does.
-    std::string interrupt(std::map<std::string, std::uint64_t, std::less<>> info) {
-        device.audioSession.post(std::move(info));
+    Notification notification(std::map<std::string, std::uint64_t, std::less<>> info) {
+        return {AudioSession::interruptionNotification, static_cast<AudioSession*>(&device.audioSession),
+                std::move(info)};
+    }
+    std::string began() {
+        device.audioSession.beginInterruption();
         return now();
     }
-    std::string began() { return interrupt({{AudioSession::interruptionTypeKey, 1}}); }
-    std::string ended(std::uint64_t options) {
-        return interrupt(
-            {{AudioSession::interruptionTypeKey, 0}, {AudioSession::interruptionOptionsKey, options}});
+    std::string ended(std::optional<std::uint64_t> options) {
+        device.audioSession.endInterruption(options);
+        return now();
     }
 };
 
 TEST_F(InterruptionTest, PlaysOnAfterOneThatSaysSoWithoutActivatingAgain) {
     tell(setRate("player", 2));
-    auto activations = device.audioSession.activations();
+    auto activations = device.audioSession.activationRequests();
     EXPECT_EQ(began(), "push queuePlayer.setRate identifier=player rate=0\n");
     EXPECT_EQ(ended(AudioSession::optionShouldResume), "push queuePlayer.setRate identifier=player rate=2\n");
-    EXPECT_EQ(device.audioSession.activations(), activations);
+    EXPECT_EQ(device.audioSession.activationRequests(), activations);
 }
 
 TEST_F(InterruptionTest, StaysPausedAfterOneThatDoesNotSayExactlyThat) {
@@ -39,10 +41,14 @@ TEST_F(InterruptionTest, StaysPausedAfterOneThatDoesNotSayExactlyThat) {
     began();
     EXPECT_EQ(ended(0), "");
     EXPECT_EQ(ended(3), "");
-    EXPECT_EQ(interrupt({{AudioSession::interruptionTypeKey, 0}}), "");
-    EXPECT_EQ(interrupt({{AudioSession::interruptionOptionsKey, 1}}), "");
-    EXPECT_EQ(interrupt({{AudioSession::interruptionTypeKey, 7}, {AudioSession::interruptionOptionsKey, 1}}),
-              "");
+    EXPECT_EQ(ended(std::nullopt), "");
+
+    // Nor after a notification without a type, or of a type that is not known.
+    for (const Notification& odd :
+         {notification({{AudioSession::interruptionOptionsKey, 1}}),
+          notification({{AudioSession::interruptionTypeKey, 7}, {AudioSession::interruptionOptionsKey, 1}})})
+        device.notifications.post(odd);
+    EXPECT_EQ(now(), "");
 }
 
 TEST_F(InterruptionTest, EveryQueuePlayerIsToldToPlayAlsoOneThatWasPaused) {

@@ -2,7 +2,6 @@
 
 #include "platform/AudioSession.h"
 #include "platform/core/LiveObjects.h"
-#include "platform/core/RemoteTargets.h"
 #include "tests/support/ClientStory.h"
 
 namespace tarn {
@@ -22,14 +21,14 @@ protected:
 
     void destroyItemDuring(const std::string& report) {
         client->transcript().whenPushed(report, [this] {
-            client->itemQueue->sync([this] { client->items->destroyPlayerItemWithIdentifier("a"); });
+            client->itemQueue().sync([this] { client->items->destroyPlayerItemWithIdentifier("a"); });
             EXPECT_EQ(LiveObjects::counts()["player item"], 2);
         });
     }
 
     void destroyPlayerDuring(const std::string& report) {
         client->transcript().whenPushed(report, [this] {
-            client->playerQueue->sync(
+            client->playerQueue().sync(
                 [this] { client->players->destroyQueuePlayerWithIdentifier("player"); });
             EXPECT_EQ(LiveObjects::counts()["queue player"], 1);
         });
@@ -56,7 +55,7 @@ TEST_F(LastReferenceTest, AQueuePlayerDiesOnThePlayerThread) {
 
 TEST_F(LastReferenceTest, AQueuePlayerDiesOnTheThreadOfALateActivation) {
     tell(setRate("player", 0));
-    device.audioSession.answerAfter(20s);
+    device.audioSession.willActivate({.after = 20s});
     tell(setRate("player", 1));
     pass(17s);
     destroyPlayerDuring("queuePlayer.setRate identifier=player rate=1");
@@ -67,15 +66,14 @@ TEST_F(LastReferenceTest, AQueuePlayerDiesOnTheThreadOfALateActivation) {
 TEST_F(LastReferenceTest, AQueuePlayerDiesOnTheThreadOfAnInterruption) {
     tell(setRate("player", 0));
     destroyPlayerDuring("queuePlayer.setRate identifier=player rate=1");
-    device.audioSession.post({{AudioSession::interruptionTypeKey, AudioSession::interruptionEnded},
-                              {AudioSession::interruptionOptionsKey, AudioSession::optionShouldResume}});
+    device.audioSession.endInterruption(AudioSession::optionShouldResume);
     now();
     expectPlayerGone();
 }
 
 TEST_F(LastReferenceTest, AQueuePlayerDiesOnTheThreadOfRemoteCommands) {
     destroyPlayerDuring("queuePlayer.setRate identifier=player rate=0");
-    device.remoteCommands.press(RemoteCommandKind::pause, [](RemoteCommandResult) {});
+    device.remoteCommands.press(RemoteCommandKind::pause);
     now();
     expectPlayerGone();
 }

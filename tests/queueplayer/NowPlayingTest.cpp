@@ -11,13 +11,16 @@ using namespace commands;
 class NowPlayingTest : public ClientStory {
 protected:
     NowPlayingTest() {
-        device.applications.add("ostrel.watch.music", "ostrel.music");
-        file("file:///tagged.flac", 200, {{"title", "Song"}, {"albumName", "Album"}, {"artist", "Band"}});
+        device.applications.install("ostrel.watch.music", "ostrel.music");
+        device.media.addFile("file:///tagged.flac",
+                             {.title = "Song", .albumTitle = "Album", .artist = "Band", .duration = 200s});
+        device.media.addFile("file:///plain.wav", {.duration = 3s});
         tell(upsertAsset({.identifier = "a", .URL = "file:///tagged.flac"}));
         tell(upsertItem("i", "a"));
     }
 
-    NowPlayingInfo shown() { return device.nowPlaying.info(); }
+    NowPlayingInfo shown() { return device.nowPlaying.publications().back().info; }
+    std::size_t publications() { return device.nowPlaying.publications().size(); }
     std::optional<std::string> application() { return device.nowPlaying.parentApplication(); }
 
     static NowPlayingInfo info(const std::string& title, double duration, double elapsed, float rate) {
@@ -27,7 +30,7 @@ protected:
 
 TEST_F(NowPlayingTest, IsPublishedTwiceWhenAPlayerIsMadeAndAtEveryChangeOfRateOrItem) {
     tell(upsertPlayer("x,y,ostrel.watch.music", {"i"}));
-    EXPECT_EQ(device.nowPlaying.publications(), 2);
+    EXPECT_EQ(publications(), 2u);
     NowPlayingInfo expected = info("Song", 200, 0, 0);
     expected.artist = "Band";
     expected.albumTitle = "Album";
@@ -40,17 +43,16 @@ TEST_F(NowPlayingTest, IsPublishedTwiceWhenAPlayerIsMadeAndAtEveryChangeOfRateOr
     tell(setRate("x,y,ostrel.watch.music", 0));
     expected.elapsedTime = 100;
     EXPECT_EQ(shown(), expected);
-    EXPECT_EQ(device.nowPlaying.publications(), 4);
+    EXPECT_EQ(publications(), 4u);
 
     tell(removeAllItems("x,y,ostrel.watch.music"));
     EXPECT_TRUE(shown().empty());
-    EXPECT_EQ(device.nowPlaying.publications(), 5);
+    EXPECT_EQ(publications(), 5u);
     tell(destroyPlayer("x,y,ostrel.watch.music"));
-    EXPECT_EQ(device.nowPlaying.publications(), 5);
+    EXPECT_EQ(publications(), 5u);
 }
 
 TEST_F(NowPlayingTest, HasOnlyWhatTheRecordHas) {
-    file("file:///plain.wav", 3, {});
     tell(upsertAsset({.identifier = "a", .URL = "file:///plain.wav"}));
     tell(upsertItem("i", "a"));
     tell(upsertPlayer("p", {"i"}));

@@ -67,7 +67,8 @@ TEST_F(QueueStoriesTest, EditsTheQueueWhileItPlays) {
     EXPECT_EQ(tell(appendItem("player", "b")), "appendItem: no answer\n");
     EXPECT_EQ(tell(replaceCurrentItem("player", "c")),
               "push queuePlayer.setCurrentItem containedIdentifier=c identifier=player\n"
-              "replaceCurrentItem: no answer\n");
+              "replaceCurrentItem: no answer\n"
+              "push playerItem.setStatus identifier=c status=1\n");
     EXPECT_EQ(tell(advanceToNextItem("player")),
               "push queuePlayer.setCurrentItem containedIdentifier=b identifier=player\n"
               "advanceToNextItem: no answer\n");

@@ -3,7 +3,6 @@
 #include <optional>
 
 #include "platform/MediaQueuePlayer.h"
-#include "platform/core/RemoteTargets.h"
 #include "tests/support/ClientStory.h"
 
 namespace tarn {
@@ -20,10 +19,11 @@ protected:
 
     /// Delivers the command as the system does; none while it is not finished.
     std::optional<Result> press(Kind kind) {
-        auto result = std::make_shared<std::optional<Result>>();
-        device.remoteCommands.press(kind, [result](Result delivered) { *result = delivered; });
+        std::size_t before = device.remoteCommands.results().size();
+        device.remoteCommands.press(kind);
         seen = now();
-        return *result;
+        const auto& results = device.remoteCommands.results();
+        return results.size() > before ? std::optional(results.back()) : std::nullopt;
     }
 
     std::string seen;
@@ -36,6 +36,7 @@ TEST_F(RemoteCommandTest, PlayPauseAndToggleDoWhatTheySay) {
     EXPECT_EQ(seen, "push queuePlayer.setRate identifier=player rate=0\n");
     EXPECT_EQ(press(Kind::togglePlayPause), Result::success);
     EXPECT_EQ(seen, "push queuePlayer.setRate identifier=player rate=1\n");
+    tell(setCurrentTime("a", 5));
     tell(setRate("player", -1));
     EXPECT_EQ(press(Kind::togglePlayPause), Result::success);
     EXPECT_EQ(seen, "push queuePlayer.setRate identifier=player rate=0\n");
@@ -44,7 +45,8 @@ TEST_F(RemoteCommandTest, PlayPauseAndToggleDoWhatTheySay) {
 TEST_F(RemoteCommandTest, FailWhereThereIsNothingToPauseOrTheSessionFails) {
     tell(removeAllItems("player"));
     EXPECT_EQ(press(Kind::pause), Result::commandFailed);
-    device.audioSession.fail({"test", 1, {}});
+    for (int activation = 0; activation < 2; ++activation)
+        device.audioSession.willActivate({.error = Error{"test", 1, {}}});
     EXPECT_EQ(press(Kind::play), Result::commandFailed);
     EXPECT_EQ(press(Kind::togglePlayPause), Result::commandFailed);
 }
@@ -59,7 +61,7 @@ TEST_F(RemoteCommandTest, NextTrackHasNoContentAtTheEndOfTheQueue) {
 TEST_F(RemoteCommandTest, PreviousTrackIsDisabledForGood) {
     EXPECT_EQ(press(Kind::previousTrack), Result::noSuchContent);
     tell(destroyPlayer("player"));
-    EXPECT_FALSE(device.remoteCommands.offers(Kind::previousTrack));
+    EXPECT_FALSE(device.remoteCommands.center().offers(Kind::previousTrack));
 }
 
 TEST_F(RemoteCommandTest, WithSeveralPlayersPauseGoesToAllAndTheRestToTheNewest) {
@@ -78,7 +80,7 @@ TEST_F(RemoteCommandTest, WithSeveralPlayersPauseGoesToAllAndTheRestToTheNewest)
 }
 
 TEST_F(RemoteCommandTest, APlayThatWaitsForTheSessionHoldsUpNobodyElse) {
-    device.audioSession.answerAfter(20s);
+    device.audioSession.willActivate({.after = 20s});
     EXPECT_EQ(press(Kind::play), std::nullopt);
     EXPECT_EQ(tell(advanceToNextItem("player")),
               "push queuePlayer.setCurrentItem containedIdentifier=b identifier=player\n"

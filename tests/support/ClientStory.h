@@ -29,11 +29,14 @@ protected:
     std::string pass(std::chrono::nanoseconds time);
     std::string now() { return pass(std::chrono::nanoseconds(0)); }
 
+    /// A file of ten seconds, and an asset of it.
+    void song(const std::string& name);
+
     /// Makes an asset of a file, an item of each asset, and a queue player "player" of the items, all by the
     /// names given. Nobody looks at what the client saw meanwhile.
     void mirror(const std::vector<std::string>& names);
 
-    /// A log line without the method and line number that it begins with.
+    /// The error lines without the method and line number that they begin with.
     std::vector<std::string> errors() const;
 
     SimulatedPlatform device{1};
