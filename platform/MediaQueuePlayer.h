@@ -19,6 +19,12 @@ class AudioSession;
 /// call makes are reported on its thread before it returns, those of playing itself (an item ends or fails)
 /// on the player thread. Letting the last reference go, on any thread, silences the player without waiting
 /// for it.
+///
+/// An item that ends leaves the queue, and it is reported in this order: the item's status if it failed, its
+/// notification, "currentItem", and "rate" if the queue is empty then and the rate has become 0. Playing
+/// backwards ends at the start of the current item, which stays: only "rate" is reported. The rate stays
+/// through every edit, also when it empties the queue. An item that the player cannot open fails as soon as
+/// that is known, at the latest when it becomes current.
 class MediaQueuePlayer : public Observable {
 public:
     static constexpr char statusKeyPath[] = "status";

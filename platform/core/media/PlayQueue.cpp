@@ -165,11 +165,13 @@ std::optional<PlayQueue::Ending> PlayQueue::takeEnd() {
         return std::nullopt;
     std::int64_t now = heard();
     const Timeline::Span* span = timeline_.endOf(entries_.front().id);
-    if (!span || span->endFrame > now || entries_.front().moved) {
+    bool atStart = span && span->backwards && span->ending == Timeline::End::completed;
+    bool turned = atStart && rate_ > 0;
+    if (!span || span->endFrame > now || entries_.front().moved || turned) {
         timeline_.forgetBefore(now);
         return std::nullopt;
     }
-    if (span->backwards && span->ending == Timeline::End::completed) {
+    if (atStart) {
         setRate(0);
         Ending stop;
         stop.rateChanged = true;
