@@ -36,11 +36,17 @@ SimulatedClient::transcript(const std::function<std::string(const Data&)>& descr
     return lines;
 }
 
-std::string SimulatedClient::outcome(std::uint64_t call) const {
+std::vector<std::string> SimulatedClient::outcomes(std::uint64_t call) const {
+    std::vector<std::string> outcomes;
     for (const auto& delivery : connection_->deliveries())
         if (delivery.kind != Kind::event && delivery.call == call)
-            return outcomeOf(delivery, hex);
-    return {};
+            outcomes.push_back(outcomeOf(delivery, hex));
+    return outcomes;
+}
+
+std::string SimulatedClient::outcome(std::uint64_t call) const {
+    auto all = outcomes(call);
+    return all.size() == 1 ? all.front() : "";
 }
 
 std::string SimulatedClient::hex(const Data& data) {

@@ -28,12 +28,17 @@ public:
     void breakOff() { connection_->lose(Loss::interrupted); }
 
     SimulatedConnection& connection() { return *connection_; }
+    std::vector<SimulatedDelivery> deliveries() const { return connection_->deliveries(); }
 
     /// One line for everything that came, in order: "1: data 0a02", "2: error 25", "3: nothing",
     /// "4: released", "event 0a02". Data is shown by `describe`; as hexadecimal digits without one.
     std::vector<std::string> transcript(const std::function<std::string(const Data&)>& describe = hex) const;
 
-    /// How a call ended, as in the transcript without its number; empty while it has not.
+    /// How a call ended, as in the transcript without its number. Nothing while it has not; more than one
+    /// would be a fault of the service.
+    std::vector<std::string> outcomes(std::uint64_t call) const;
+
+    /// The only outcome of a call; empty when it has none, or more than one.
     std::string outcome(std::uint64_t call) const;
 
     static std::string hex(const Data& data);

@@ -123,6 +123,12 @@ void SimulatedConnection::read() {
     }
 }
 
+bool SimulatedConnection::hasUnread() const {
+    return resumed_ && !finished_ && state_.withLocked([](const State& state) {
+        return state.loss != Loss::interrupted && !state.arrived.empty();
+    });
+}
+
 void SimulatedConnection::finishLoss() {
     if (!resumed_ || !isLost() || std::exchange(finished_, true))
         return;

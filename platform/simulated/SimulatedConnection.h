@@ -68,6 +68,9 @@ public:
     /// Hands over a part of what arrived, as one read would, and comes back for the rest.
     void read();
 
+    /// Has something arrived that read() is still to hand over?
+    bool hasUnread() const;
+
     /// After a loss: hands over what still arrives, and runs the handler, once.
     void finishLoss();
 

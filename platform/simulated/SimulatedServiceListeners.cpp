@@ -1,5 +1,6 @@
 #include "platform/simulated/SimulatedServiceListeners.h"
 
+#include <algorithm>
 #include <cassert>
 #include <utility>
 
@@ -49,6 +50,15 @@ std::shared_ptr<SimulatedConnection> SimulatedServiceListeners::connect() {
         offerWaiting();
     });
     return connection;
+}
+
+void SimulatedServiceListeners::settle() {
+    bool hasUnread = true;
+    while (hasUnread)
+        io().sync([&] {
+            hasUnread = std::any_of(open_.begin(), open_.end(),
+                                    [](const auto& connection) { return connection->hasUnread(); });
+        });
 }
 
 void SimulatedServiceListeners::offerWaiting() {

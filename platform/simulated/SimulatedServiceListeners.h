@@ -21,6 +21,9 @@ public:
     /// by then are handled first.
     std::shared_ptr<SimulatedConnection> connect();
 
+    /// Returns when all that clients have sent and done so far has reached the service.
+    void settle();
+
     SerialQueue& io() { return *io_->queue; }
 
 private:
