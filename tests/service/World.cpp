@@ -1,0 +1,77 @@
+#include "tests/service/World.h"
+
+#include "platform/MediaEngine.h"
+#include "service/AudioFilePlayerServer.h"
+
+namespace tarn {
+
+SimulatedWorld::SimulatedWorld(std::uint64_t seed)
+    : platform_(seed), service_(std::make_shared<VLLongFormAudioServer>(platform_.roles())) {
+    service_->run();
+}
+
+SimulatedWorld::~SimulatedWorld() { settle(); }
+
+void SimulatedWorld::linger() {
+    if (random(2) == 0)
+        settle();
+}
+
+/// Knows no file.
+class ThreadedWorld::NoMedia final : public MediaEngine {
+public:
+    MediaAssetOutcome openAsset(const std::string& URL) override {
+        return {nullptr, {"test", 2, {{"URL", URL}}}};
+    }
+    std::shared_ptr<MediaItem> makeItem(std::shared_ptr<MediaAsset>) override { return nullptr; }
+    std::shared_ptr<MediaQueuePlayer> makeQueuePlayer(std::vector<std::shared_ptr<MediaItem>>) override {
+        return nullptr;
+    }
+};
+
+/// Is never asked, for want of a player.
+class ThreadedWorld::NoSession final : public AudioSession {
+public:
+    std::optional<Error> setCategory(Category, Mode, RouteSharingPolicy, std::uint64_t) override {
+        return {};
+    }
+    void activateWithOptions(std::uint64_t, ActivationCompletion completion) override {
+        completion(true, {});
+    }
+};
+
+ThreadedWorld::ThreadedWorld(std::uint64_t seed)
+    : random_(seed),
+      media_(std::make_unique<NoMedia>()),
+      audioSession_(std::make_unique<NoSession>()),
+      listeners_({queues_.create("I/O"), [this](std::size_t limit) { return random(limit); },
+                  [] { std::this_thread::yield(); }}),
+      service_(std::make_shared<VLLongFormAudioServer>(
+          Platform{clock_, queues_, listeners_, localization_, notifications_, *media_, *audioSession_,
+                   sandboxExtensions_, remoteCommands_, nowPlaying_, applications_})),
+      mainThread_([this] { service_->run(); }) {
+    queues_.main().sync([] {}); // from now on it listens
+}
+
+ThreadedWorld::~ThreadedWorld() {
+    settle();
+    queues_.main().end();
+    mainThread_.join();
+}
+
+void ThreadedWorld::linger() {
+    for (auto times = random(20); times > 0; --times)
+        std::this_thread::yield();
+}
+
+void ThreadedWorld::settle() {
+    listeners_.settle();
+    std::shared_ptr<VLTorviAudioFilePlayerServer> router;
+    service_->commandServiceQueue()->sync([&] { router = service_->audioFilePlayerServer(); });
+    if (router == nullptr)
+        return;
+    router->playerItemManagerQueue()->sync([] {});
+    router->queuePlayerManagerQueue()->sync([] {});
+}
+
+} // namespace tarn

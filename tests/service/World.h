@@ -1,0 +1,82 @@
+#pragma once
+
+#include <atomic>
+#include <functional>
+#include <memory>
+#include <optional>
+#include <thread>
+
+#include "platform/core/RemoteTargets.h"
+#include "platform/core/SteadyClock.h"
+#include "platform/core/WorkerQueues.h"
+#include "platform/simulated/SimulatedClient.h"
+#include "platform/simulated/SimulatedPlatform.h"
+#include "service/LongFormAudioServer.h"
+
+namespace tarn {
+
+/// The service on the scheduler: a seed is one interleaving.
+class SimulatedWorld {
+public:
+    static constexpr int rounds = 1000;
+
+    explicit SimulatedWorld(std::uint64_t seed);
+    ~SimulatedWorld();
+
+    VLLongFormAudioServer& service() { return *service_; }
+    SimulatedServiceListeners& listeners() { return platform_.listeners; }
+    SimulatedNowPlayingService& nowPlaying() { return platform_.nowPlaying; }
+    std::size_t random(std::size_t limit) { return platform_.scheduler.random(limit); }
+
+    std::shared_ptr<SerialQueue> createQueue(const std::string& label) {
+        return platform_.queues.create(label);
+    }
+
+    /// Lets part of what can happen now happen before the test goes on.
+    void linger();
+
+    /// Returns when all that was begun is done.
+    void settle() { platform_.scheduler.runReady(); }
+
+private:
+    SimulatedPlatform platform_;
+    std::shared_ptr<VLLongFormAudioServer> service_;
+};
+
+/// The service on real threads, with every role that it needs for commands that find no object.
+class ThreadedWorld {
+public:
+    static constexpr int rounds = 50;
+
+    explicit ThreadedWorld(std::uint64_t seed);
+    ~ThreadedWorld();
+
+    VLLongFormAudioServer& service() { return *service_; }
+    SimulatedServiceListeners& listeners() { return listeners_; }
+    SimulatedNowPlayingService& nowPlaying() { return nowPlaying_; }
+    std::size_t random(std::size_t limit) { return (random_ += 0x9e3779b97f4a7c15u) / 257 % limit; }
+    std::shared_ptr<SerialQueue> createQueue(const std::string& label) { return queues_.create(label); }
+    void linger();
+    void settle();
+
+private:
+    class NoMedia;
+    class NoSession;
+
+    std::atomic<std::uint64_t> random_;
+    SteadyClock clock_;
+    SimulatedLocalization localization_;
+    LocalNotificationCenter notifications_;
+    std::unique_ptr<MediaEngine> media_;
+    std::unique_ptr<AudioSession> audioSession_;
+    SimulatedSandboxExtension sandboxExtensions_;
+    RemoteTargets remoteCommands_;
+    SimulatedNowPlayingService nowPlaying_;
+    SimulatedApplicationRegistry applications_;
+    WorkerQueues queues_;
+    SimulatedServiceListeners listeners_;
+    std::shared_ptr<VLLongFormAudioServer> service_;
+    std::thread mainThread_;
+};
+
+} // namespace tarn
