@@ -85,7 +85,7 @@ private:
         text_.clear();
     }
 
-    const XML_Parser parser_;
+    XML_Parser parser_;
     int depth_ = 0;
     bool launchesDesktopEntry_ = false;
     std::string text_;
