@@ -7,8 +7,8 @@
 
 namespace tarn {
 
-/// The system journal, or standard error while there is none. `identifier` is the name of the program in the
-/// journal.
+/// Where the lines of a program go: to the journal when the service manager has started it so, and to
+/// standard error when it was started by hand. `identifier` is the program's name in the journal.
 std::shared_ptr<LogSink> systemSink(std::string identifier);
 
 } // namespace tarn
