@@ -1,9 +1,10 @@
 #include "client/libtarn/ErrorTexts.h"
 
 #include <algorithm>
-#include <array>
 #include <optional>
 #include <string_view>
+
+#include "platform/core/localization/TextEncoding.h"
 
 namespace tarn {
 
@@ -25,30 +26,13 @@ std::uint64_t bigEndian(BytesView bytes) {
     return value;
 }
 
-void appendUtf8(std::string& text, char32_t character) {
-    if (character < 0x80) {
-        text += static_cast<char>(character);
-        return;
-    }
-    const std::size_t continuations = character < 0x800 ? 1 : character < 0x10000 ? 2 : 3;
-    constexpr std::array<char32_t, 4> leads = {0, 0xC0, 0xE0, 0xF0}; // by number of continuations
-    text += static_cast<char>(leads[continuations] | character >> (6 * continuations));
-    for (std::size_t i = continuations; i > 0; --i)
-        text += static_cast<char>(0x80U | (character >> (6 * (i - 1)) & 0x3FU));
-}
-
-std::string utf8Of(BytesView utf16) {
+std::optional<std::string> utf8Of(BytesView utf16) {
+    Utf16Joiner joiner;
     std::string text;
-    for (std::size_t i = 0; i + 1 < utf16.size(); i += 2) {
-        auto character = static_cast<char32_t>(bigEndian(utf16.subspan(i, 2)));
-        if (character >= 0xD800 && character < 0xDC00 && i + 3 < utf16.size()) {
-            const auto low = static_cast<char32_t>(bigEndian(utf16.subspan(i + 2, 2)));
-            character = 0x10000 + ((character - 0xD800) << 10) + ((low - 0xDC00) & 0x3FFU);
-            i += 2;
-        }
-        appendUtf8(text, character);
-    }
-    return text;
+    for (std::size_t i = 0; i < utf16.size(); i += 2)
+        if (!joiner.add(static_cast<char16_t>(bigEndian(utf16.subspan(i, 2))), text))
+            return std::nullopt;
+    return joiner.isPending() ? std::nullopt : std::optional(text);
 }
 
 /// One object of the list: its type, its count, and everything from its content on.

@@ -1,0 +1,273 @@
+#include "client/tool/Play.h"
+
+#include <poll.h>
+#include <sys/signalfd.h>
+
+#include <algorithm>
+#include <array>
+#include <chrono>
+#include <cmath>
+#include <csignal>
+#include <iostream>
+#include <map>
+#include <optional>
+#include <set>
+
+#include "client/tool/EventInbox.h"
+#include "client/tool/LiveLine.h"
+#include "client/tool/Terminal.h"
+#include "client/tool/TimeText.h"
+
+namespace tarn::tool {
+
+namespace {
+
+using namespace std::chrono_literals;
+
+// The last component names the tool to the system's media controls.
+constexpr char playerIdentifier[] = "tarnctl,ostrel.tarnctl";
+constexpr double seekStep = 10;
+constexpr float rateStep = 0.25F;
+constexpr float slowestRate = 0.25F;
+constexpr float fastestRate = 4;
+constexpr std::chrono::milliseconds liveInterval = 250ms;
+constexpr std::chrono::milliseconds plainInterval = 1000ms;
+
+/// SIGINT and SIGTERM as something to wait for. To be made before any thread.
+FileDescriptor waitForSignals() {
+    sigset_t set;
+    sigemptyset(&set);
+    sigaddset(&set, SIGINT);
+    sigaddset(&set, SIGTERM);
+    pthread_sigmask(SIG_BLOCK, &set, nullptr);
+    return FileDescriptor(::signalfd(-1, &set, SFD_CLOEXEC | SFD_NONBLOCK));
+}
+
+template <class... Handlers>
+struct Overloaded : Handlers... {
+    using Handlers::operator()...;
+};
+
+class PlaySession {
+public:
+    explicit PlaySession(const PlayOptions& options) : options_(options), usualRate_(options.rate) {}
+
+    int run() {
+        tracks_ = openTracks(client_, options_.paths, options_.access,
+                             [&](const auto& path, const auto& reason) { fail(path + ": " + reason); });
+        if (!tracks_.empty() && makePlayer())
+            play();
+        return status_;
+    }
+
+private:
+    bool makePlayer() {
+        std::vector<std::string> items;
+        std::vector<std::future<client::Result<client::Status>>> made;
+        for (const auto& track : tracks_) {
+            items.push_back(track.identifier);
+            made.push_back(client_.upsertItem(track.identifier, track.identifier));
+        }
+        for (auto& item : made)
+            item.wait();
+        const auto player = client_.upsertQueuePlayer(playerIdentifier, items).get();
+        if (player.outcome != client::Outcome::answered)
+            return fail("cannot play: " + player.problem());
+        if (options_.from > 0)
+            client_.setCurrentTime(items.front(), options_.from).wait();
+        starting_ = client_.setRate(playerIdentifier, options_.rate);
+        return true;
+    }
+
+    void play() {
+        if (terminal_.hasKeys())
+            std::cout << "space pause   n next   left/right seek   [ ] rate   q quit\n";
+        while (!ended_) {
+            waitForSomething();
+            for (const auto& event : inbox_.takeAll())
+                handle(event);
+            checkStart();
+            takeSignals();
+            if (keysWait_)
+                for (const auto key : terminal_.readKeys())
+                    handle(key);
+            if (!ended_)
+                readPosition();
+            if (!ended_)
+                draw();
+        }
+        clearLine();
+        reportFailures();
+        if (!stopReason_.empty())
+            std::cout << stopReason_ << "\n";
+    }
+
+    void waitForSomething() {
+        std::array<pollfd, 3> sources = {{{inbox_.descriptor(), POLLIN, 0},
+                                          {signals_.get(), POLLIN, 0},
+                                          {terminal_.hasKeys() ? STDIN_FILENO : -1, POLLIN, 0}}};
+        const bool moves = rate_ != 0 || starting_.valid();
+        const auto interval = terminal_.isLive() ? liveInterval : plainInterval;
+        ::poll(sources.data(), sources.size(), moves ? static_cast<int>(interval.count()) : -1);
+        keysWait_ = sources[2].revents != 0;
+    }
+
+    void handle(const client::Event& event) {
+        std::visit(Overloaded{[&](const client::ItemStatusChanged& it) { takeStatus(it); },
+                              [&](const client::ItemFailedToPlayToEnd& it) { failed_.try_emplace(it.item); },
+                              [&](const client::PlayerRateChanged& it) { takeRate(it.rate); },
+                              [&](const client::CurrentItemChanged& it) { takeCurrentItem(it.item); },
+                              [&](const client::ConnectionLost&) {
+                                  stop("Stopped: the connection to the service was lost.", 1);
+                              },
+                              [](const auto&) {}},
+                   event);
+    }
+
+    void takeStatus(const client::ItemStatusChanged& event) {
+        if (event.status.value == client::Status::Value::failed)
+            failed_[event.item] = event.status.error;
+    }
+
+    void takeRate(float rate) {
+        if (!terminal_.isLive() && rate == 0 && rate_ != 0 && current_ != nullptr)
+            std::cout << "Paused at " << timeText(position_) << "." << std::endl;
+        rate_ = rate;
+        if (rate != 0)
+            usualRate_ = rate;
+    }
+
+    void takeCurrentItem(const std::optional<std::string>& item) {
+        const bool had = current_ != nullptr;
+        current_ = nullptr;
+        for (const auto& track : tracks_)
+            if (item == track.identifier)
+                current_ = &track;
+        if (had || current_ != nullptr)
+            reportFailures();
+        if (current_ == nullptr && had)
+            stop(status_ == 0 ? "Played everything." : "Stopped at the end.", status_);
+        else if (current_ != nullptr && !terminal_.isLive())
+            std::cout << "Playing " << current_->title() << " (" << timeText(current_->info.duration) << ")"
+                      << std::endl;
+        position_ = 0;
+    }
+
+    /// A rate that was asked for and did not come means that the sound output could not be had.
+    void checkStart() {
+        if (!starting_.valid() || starting_.wait_for(0ms) != std::future_status::ready)
+            return;
+        const auto completion = starting_.get();
+        for (const auto& event : inbox_.takeAll())
+            handle(event);
+        if (!completion.succeeded())
+            stop("Stopped: " + completion.problem(), 1);
+        else if (rate_ == 0 && options_.rate != 0 && current_ != nullptr)
+            stop("Stopped: the service could not start to play.", 1);
+    }
+
+    void takeSignals() {
+        signalfd_siginfo signal{};
+        if (::read(signals_.get(), &signal, sizeof(signal)) == static_cast<ssize_t>(sizeof(signal)))
+            stop("Stopped.", 128 + static_cast<int>(signal.ssi_signo));
+    }
+
+    void handle(Key key) {
+        const auto setRate = [&](float rate) { client_.setRate(playerIdentifier, rate); };
+        switch (key) {
+        case Key::pause:
+            return setRate(rate_ == 0 ? usualRate_ : 0);
+        case Key::next:
+            client_.advanceToNextItem(playerIdentifier);
+            return;
+        case Key::seekBack:
+            return seek(-seekStep);
+        case Key::seekForward:
+            return seek(seekStep);
+        case Key::slower:
+            return setRate(std::clamp(usualRate_ - rateStep, slowestRate, fastestRate));
+        case Key::faster:
+            return setRate(std::clamp(usualRate_ + rateStep, slowestRate, fastestRate));
+        case Key::quit:
+            return stop("Stopped.", status_);
+        }
+    }
+
+    void seek(double seconds) {
+        if (current_ != nullptr)
+            client_.setCurrentTime(current_->identifier, std::max(0.0, position_ + seconds)).wait();
+    }
+
+    void readPosition() {
+        if (current_ == nullptr)
+            return;
+        const auto time = client_.currentTime(current_->identifier).get();
+        if (time.outcome == client::Outcome::answered)
+            position_ = time.value;
+        else if (time.outcome == client::Outcome::failed)
+            stop("Stopped: another program has taken over the service.", 1);
+    }
+
+    void draw() const {
+        if (!terminal_.isLive() || current_ == nullptr)
+            return;
+        const LiveState state{current_->title(), current_->info.artist.value_or(""), position_,
+                              current_->info.duration, rate_};
+        std::cout << "\r\x1b[K" << liveLine(state, terminal_.columns(), terminal_.hasColor()) << std::flush;
+    }
+
+    void clearLine() const {
+        if (terminal_.isLive())
+            std::cout << "\r\x1b[K" << std::flush;
+    }
+
+    void reportFailures() {
+        for (const auto& [item, error] : failed_) {
+            if (!reported_.insert(item).second)
+                continue;
+            for (const auto& track : tracks_)
+                if (track.identifier == item)
+                    fail(track.path + ": " + (error ? error->summary() : "could not be played to its end"));
+        }
+    }
+
+    bool fail(const std::string& problem) {
+        clearLine();
+        std::cerr << "tarnctl: " << problem << "\n";
+        status_ = 1;
+        return false;
+    }
+
+    void stop(std::string reason, int status) {
+        if (ended_)
+            return;
+        ended_ = true;
+        stopReason_ = std::move(reason);
+        status_ = std::max(status_, status);
+    }
+
+    const PlayOptions& options_;
+    const FileDescriptor signals_ = waitForSignals(); // before the client's thread
+    EventInbox inbox_;
+    Terminal terminal_;
+    std::vector<Track> tracks_;
+    const Track* current_ = nullptr;
+    double position_ = 0;
+    float rate_ = 0;
+    float usualRate_; // what to go on at after a pause
+    std::future<client::Completion> starting_;
+    std::map<std::string, std::optional<client::Error>> failed_; // by item
+    std::set<std::string> reported_;
+    bool keysWait_ = false;
+    bool ended_ = false;
+    std::string stopReason_;
+    int status_ = 0;
+    client::Client client_{{.socketPath = options_.socketPath,
+                            .onEvent = [this](const client::Event& event) { inbox_.put(event); }}};
+};
+
+} // namespace
+
+int runPlay(const PlayOptions& options) { return PlaySession(options).run(); }
+
+} // namespace tarn::tool
