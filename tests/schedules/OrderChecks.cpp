@@ -24,10 +24,11 @@ struct Rule {
     std::set<std::int64_t> errors;
 };
 
-struct Command {
+/// What is known of a command beforehand.
+struct Expectation {
     const Rule* rule;
     bool onItemQueue = false;
-    commands::Identifier identifier;
+    std::string identifier;                      // one that is left out travels as an empty one
     std::vector<std::string_view> reportsBefore; // pushed before the data, in this order
 };
 
@@ -35,32 +36,32 @@ const Rule assetUpsert{"asset upsert", true, false, true, {playbackError, unknow
 const Rule objectUpsert{"upsert", true, false, false, {unknownIdentifier}};
 const Rule query{"query", true, false, false, {unknownIdentifier}};
 const Rule edit{"edit", false, true, false, {unknownIdentifier}};
-const Rule order{"order", false, true, false, {}};
+const Rule unanswered{"command without an answer", false, true, false, {}};
 
-Command commandOf(const VLProtoAudioFilePlayerItem& item) {
+Expectation expectationOf(const VLProtoAudioFilePlayerItem& item) {
     if (item.hasUpsertWithAsset())
-        return {&objectUpsert, true, item.upsertWithAsset()->identifier(), {"item status"}};
+        return {&objectUpsert, true, item.upsertWithAsset()->identifier().value_or(""), {"item status"}};
     if (item.hasGetCurrentTime())
         return {&query, true, {}, {}};
-    return {item.hasSetItemCurrentTime() ? &edit : &order, true, {}, {}};
+    return {item.hasSetItemCurrentTime() ? &edit : &unanswered, true, {}, {}};
 }
 
-Command commandOf(const VLProtoAudioFileQueuePlayer& player) {
+Expectation expectationOf(const VLProtoAudioFileQueuePlayer& player) {
     if (player.hasUpsertWithItems())
         return {&objectUpsert,
                 false,
-                player.upsertWithItems()->identifier(),
+                player.upsertWithItems()->identifier().value_or(""),
                 {"player status", "player rate", "player current item"}};
     bool namesItem = player.hasAppendItem() || player.hasRemoveItem() || player.hasReplaceCurrentItem();
-    return {namesItem ? &edit : &order, false, {}, {}};
+    return {namesItem ? &edit : &unanswered, false, {}, {}};
 }
 
-Command commandOf(const VLProtoAudioFilePlayerMessage& message) {
+Expectation expectationOf(const VLProtoAudioFilePlayerMessage& message) {
     if (message.hasQueuePlayer())
-        return commandOf(*message.queuePlayer());
+        return expectationOf(*message.queuePlayer());
     if (message.hasPlayerItem())
-        return commandOf(*message.playerItem());
-    return {message.asset()->hasUpsertWithMetaData() ? &assetUpsert : &order, false, {}, {}};
+        return expectationOf(*message.playerItem());
+    return {message.asset()->hasUpsertWithMetaData() ? &assetUpsert : &unanswered, false, {}, {}};
 }
 
 /// A pushed status, rate or current item, and of which object.
@@ -89,11 +90,6 @@ std::optional<Report> reportOf(const SimulatedDelivery& delivery) {
 
 } // namespace
 
-struct OrderChecks::Call {
-    Command command;
-    std::size_t deliveriesBefore;
-};
-
 /// One walk through the deliveries.
 class OrderChecks::Review {
 public:
@@ -120,16 +116,16 @@ private:
         std::string name = "call " + std::to_string(delivery.call);
         if (!require(found != checks_.calls_.end(), name + " was never sent"))
             return;
-        const Call& call = found->second;
-        name += " (" + std::string(call.command.rule->name) + ')';
+        const Expectation expected = expectationOf(*found->second.command);
+        name += " (" + std::string(expected.rule->name) + ')';
         require(finished_.insert(delivery.call).second, name + " ended twice");
         bool isCancelled = delivery.error && delivery.error->code == connectionLost;
         if (isCancelled)
             require(place_ >= checks_.replacedFrom_, name + " was cancelled on a current connection");
         else
-            require(isAllowed(*call.command.rule, delivery), name + " has an outcome that it cannot have");
+            require(isAllowed(*expected.rule, delivery), name + " has an outcome that it cannot have");
         if (delivery.kind == SimulatedDelivery::Kind::answer && !isCancelled)
-            reviewAnswer(name, delivery, call);
+            reviewAnswer(name, delivery, expected, found->second.deliveriesBefore);
     }
 
     static bool isAllowed(const Rule& rule, const SimulatedDelivery& delivery) {
@@ -140,25 +136,26 @@ private:
         return delivery.data ? rule.data : rule.nothing;
     }
 
-    void reviewAnswer(const std::string& name, const SimulatedDelivery& delivery, const Call& call) {
-        std::uint64_t& last = lastAnswered_[call.command.onItemQueue];
+    void reviewAnswer(const std::string& name, const SimulatedDelivery& delivery, const Expectation& expected,
+                      std::size_t deliveriesBefore) {
+        std::uint64_t& last = lastAnswered_[expected.onItemQueue];
         require(delivery.call > last, name + " was answered after call " + std::to_string(last));
         last = std::max(last, delivery.call);
         if (delivery.data && place_ < checks_.replacedFrom_)
-            require(reportsCameBefore(call), name + " was answered before its reports");
+            require(reportsCame(expected, deliveriesBefore), name + " was answered before its reports");
     }
 
-    bool reportsCameBefore(const Call& call) const {
-        auto awaited = call.command.reportsBefore.begin();
-        for (std::size_t place = call.deliveriesBefore;
-             place < place_ && awaited != call.command.reportsBefore.end(); ++place) {
+    bool reportsCame(const Expectation& expected, std::size_t deliveriesBefore) const {
+        auto awaited = expected.reportsBefore.begin();
+        for (std::size_t place = deliveriesBefore; place < place_ && awaited != expected.reportsBefore.end();
+             ++place) {
             if (deliveries_[place].kind != SimulatedDelivery::Kind::event)
                 continue;
             auto report = reportOf(deliveries_[place]);
-            if (report && report->kind == *awaited && report->identifier == call.command.identifier)
+            if (report && report->kind == *awaited && report->identifier == expected.identifier)
                 ++awaited;
         }
-        return awaited == call.command.reportsBefore.end();
+        return awaited == expected.reportsBefore.end();
     }
 
     bool require(bool holds, const std::string& otherwise) {
@@ -176,7 +173,7 @@ private:
 };
 
 void OrderChecks::sent(std::uint64_t call, const commands::Command& command, std::size_t deliveriesBefore) {
-    calls_.emplace(call, Call{commandOf(*command), deliveriesBefore});
+    calls_.emplace(call, Call{command, deliveriesBefore});
 }
 
 void OrderChecks::mayBeReplacedFrom(std::size_t delivery) {

@@ -28,8 +28,12 @@ public:
     std::vector<std::string> violations(const std::vector<SimulatedDelivery>& deliveries) const;
 
 private:
-    struct Call;
     class Review;
+
+    struct Call {
+        commands::Command command;
+        std::size_t deliveriesBefore;
+    };
 
     std::map<std::uint64_t, Call> calls_;
     std::size_t replacedFrom_ = std::numeric_limits<std::size_t>::max();
