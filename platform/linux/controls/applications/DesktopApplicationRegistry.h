@@ -1,6 +1,8 @@
 #pragma once
 
 #include <filesystem>
+#include <memory>
+#include <string>
 #include <vector>
 
 #include "platform/ApplicationRegistry.h"
@@ -45,5 +47,8 @@ private:
     const std::vector<std::string> languages_;
     MutexProtected<ApplicationIndex> index_;
 };
+
+/// The registry of the running user: the data folders of the environment, names in `languages`.
+std::unique_ptr<DesktopApplicationRegistry> systemApplicationRegistry(std::vector<std::string> languages);
 
 } // namespace tarn
