@@ -50,7 +50,9 @@ BusConnection::~BusConnection() = default;
 void BusConnection::open() {
     if (std::exchange(opened_, true))
         return;
-    if (const int result = connect(); result < 0)
+    if (address_.empty())
+        reportLoss(EDESTADDRREQ); // for good: the environment of a process does not change
+    else if (const int result = connect(); result < 0)
         waitForBus(-result);
 }
 
@@ -114,24 +116,29 @@ void BusConnection::waitForBus(int reason) {
     tryAgainAfter(delay_);
 }
 
+/// Watches for the socket, or for the first folder on the way to it that is missing.
 void BusConnection::watchFolder() {
-    const auto path = busSocketPath(address_);
-    if (folder_ || !path)
+    const auto socket = busSocketPath(address_);
+    if (folder_ || !socket)
         return;
-    const std::filesystem::path file(*path);
-    socketName_ = file.filename();
-    sd_event_source* source = nullptr;
     const std::uint32_t events = IN_CREATE | IN_MOVED_TO | IN_ATTRIB | IN_ONLYDIR;
-    if (sd_event_add_inotify(event_, &source, file.parent_path().c_str(), events, handleFolder, this) >= 0)
+    for (std::filesystem::path awaited = *socket; awaited.has_relative_path();
+         awaited = awaited.parent_path()) {
+        const std::string folder = awaited.parent_path();
+        sd_event_source* source = nullptr;
+        if (sd_event_add_inotify(event_, &source, folder.c_str(), events, handleFolder, this) < 0)
+            continue;
         folder_.reset(source);
+        awaitedName_ = awaited.filename();
+        return;
+    }
 }
 
 int BusConnection::handleFolder(sd_event_source*, const inotify_event* event, void* connection) {
     auto& self = *static_cast<BusConnection*>(connection);
     const bool folderGone = (event->mask & IN_IGNORED) != 0;
-    if (folderGone)
-        self.folder_.reset();
-    if (folderGone || (event->len > 0 && event->name == self.socketName_)) {
+    if (folderGone || (event->len > 0 && event->name == self.awaitedName_)) {
+        self.folder_.reset(); // the next try looks anew what is missing
         self.delay_ = {};
         self.tryAgainAfter(microseconds::zero());
     }

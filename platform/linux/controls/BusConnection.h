@@ -23,8 +23,9 @@ public:
 /// A connection to one bus that is made once it is wanted, and made again whenever it is lost. On the bus
 /// thread.
 ///
-/// While there is no bus, it tries again at growing distances, and at once when something happens beside the
-/// bus's socket; with a bus it wakes up for nothing.
+/// While there is no bus, it tries again a few times and then once a minute, and at once when the bus's
+/// socket appears (an address that names no file is tried every second instead); with a bus it wakes up for
+/// nothing.
 class BusConnection final {
 public:
     enum class Report { outages, nothing };
@@ -68,7 +69,7 @@ private:
     std::chrono::microseconds delay_{0}; // between the last two tries; zero before the second one
     EventSourceHandle timer_;
     EventSourceHandle folder_; // set while there is no bus
-    std::string socketName_;
+    std::string awaitedName_;
 };
 
 } // namespace tarn

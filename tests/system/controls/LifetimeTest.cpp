@@ -77,8 +77,6 @@ TEST_F(LifetimeTest, ThePlayerComesBackWithTheBus) {
     EXPECT_THAT(log.messages(), SizeIs(2 * rounds)); // one line for each end and each return
 }
 
-class LateBusTest : public testing::Test {};
-
 TEST(LateBusTest, TheServiceGoesOnWithoutABusAndFindsItWhenItComes) {
     const CapturedLog log;
     PrivateBus bus(PrivateBus::State::notYetStarted);

@@ -1,5 +1,6 @@
 #include "tests/system/controls/PrivateBus.h"
 
+#include <filesystem>
 #include <stdexcept>
 
 namespace tarn {
@@ -19,7 +20,7 @@ constexpr char configuration[] = R"(<busconfig>
 
 } // namespace
 
-PrivateBus::PrivateBus(State state) : address_("unix:path=" + (folder_ / "bus").string()) {
+PrivateBus::PrivateBus(State state) : address_("unix:path=" + (folder_ / "run/bus").string()) {
     std::string text = configuration;
     const std::string placeholder = "ADDRESS";
     text.replace(text.find(placeholder), placeholder.size(), address_);
@@ -29,6 +30,7 @@ PrivateBus::PrivateBus(State state) : address_("unix:path=" + (folder_ / "bus").
 }
 
 void PrivateBus::start() {
+    std::filesystem::create_directories(folder_ / "run");
     const std::vector<std::string> command = {"dbus-daemon", "--nofork", "--print-address",
                                               "--config-file=" + (folder_ / "bus.conf").string()};
     daemon_ = std::make_unique<ChildProcess>(command, std::vector<std::string>{},
