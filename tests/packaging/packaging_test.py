@@ -1,0 +1,177 @@
+"""Makes the Debian package, installs it into an empty root, and tries what is in there."""
+import contextlib
+import os
+import pathlib
+import re
+import shutil
+import signal
+import socket
+import subprocess
+import sys
+import tempfile
+import unittest
+import wave
+
+SOURCE, BUILD = (pathlib.Path(argument) for argument in sys.argv[1:3])
+DEADLINE = 20  # seconds
+
+
+def run(*command, **options):
+    """Runs to success and returns what was printed."""
+    done = subprocess.run([str(word) for word in command], text=True, stdout=subprocess.PIPE,
+                          stderr=subprocess.STDOUT, timeout=120, check=False, **options)
+    if done.returncode != 0:
+        raise AssertionError(f"{command} ended with {done.returncode}:\n{done.stdout}")
+    return done.stdout
+
+
+def make_package(folder):
+    run("cpack", "-G", "DEB", "--config", BUILD / "CPackConfig.cmake", "-B", folder)
+    return next(folder.glob("*.deb"))
+
+
+def install(package, root):
+    """The dependencies are those of the machine that runs the test."""
+    database = root / "var/lib/dpkg"
+    for name in ("info", "updates"):
+        (database / name).mkdir(parents=True)
+    (database / "status").touch()
+    run("dpkg", f"--root={root}", f"--log={root}/log", "--force-depends", "--force-not-root",
+        "--force-script-chrootless", "--install", package,
+        env={**os.environ, "PATH": os.environ["PATH"] + ":/usr/local/sbin:/usr/sbin:/sbin"})
+
+
+def make_song(path):
+    with wave.open(str(path), "wb") as song:
+        song.setnchannels(1)
+        song.setsampwidth(2)
+        song.setframerate(8000)
+        song.writeframes(bytes(2 * 8000 // 4))
+
+
+class AnInstalledPackage(unittest.TestCase):
+    @classmethod
+    def setUpClass(cls):
+        cls.folder = pathlib.Path(cls.enterClassContext(tempfile.TemporaryDirectory()))
+        cls.root = cls.folder / "root"
+        cls.package = make_package(cls.folder)
+        install(cls.package, cls.root)
+        cls.prefix = cls.root / "usr"
+        cls.song = cls.folder / "song.wav"
+        make_song(cls.song)
+
+    def environment(self, **more):
+        kept = {name: os.environ[name] for name in ("PATH", "HOME") if name in os.environ}
+        return {**kept, "XDG_RUNTIME_DIR": str(self.folder), "LANG": "C.UTF-8", **more}
+
+    @contextlib.contextmanager
+    def service(self, **variables):
+        """The service as the service manager starts it: with its socket, until it says that it is ready."""
+        path = self.folder / "ostrel.tarnd"
+        with socket.socket(socket.AF_UNIX) as listener, \
+                socket.socket(socket.AF_UNIX, socket.SOCK_DGRAM) as readiness:
+            listener.bind(str(path))
+            listener.listen()
+            readiness.bind(str(self.folder / "notify"))
+            readiness.settimeout(DEADLINE)
+            process = subprocess.Popen(
+                ["sh", "-c", f'exec 3<&{listener.fileno()}; LISTEN_PID=$$ exec "$0"', self.prefix / "bin/tarnd"],
+                pass_fds=[listener.fileno()],
+                env=self.environment(LISTEN_FDS="1", LISTEN_FDNAMES="ostrel.tarnd",
+                                     NOTIFY_SOCKET=str(self.folder / "notify"), **variables))
+            try:
+                self.assertIn(b"READY=1", readiness.recv(4096))
+                yield process
+            finally:
+                process.send_signal(signal.SIGTERM)
+                status = process.wait(DEADLINE)
+                path.unlink(missing_ok=True)
+                (self.folder / "notify").unlink()
+        self.assertEqual(status, 0)
+
+    def tarnctl(self, *arguments):
+        return run(self.prefix / "bin/tarnctl", *arguments, env=self.environment())
+
+    def test_serves_from_the_socket_it_is_given(self):
+        with self.service():
+            self.assertIn("0:00", self.tarnctl("info", self.song))
+            self.assertIn("song.wav", self.tarnctl("play", self.song))
+
+    def test_speaks_the_users_language(self):
+        with self.service(LANG="de_DE.UTF-8"):
+            answer = subprocess.run([self.prefix / "bin/tarnctl", "send", "playerItem.getCurrentTime identifier=x"],
+                                    env=self.environment(), text=True, capture_output=True, timeout=DEADLINE,
+                                    check=False)
+        self.assertIn("Ein unbekannter Fehler ist aufgetreten.", answer.stdout + answer.stderr)
+
+    def test_lets_programs_be_built_with_its_library(self):
+        with self.subTest("find_package"):
+            build = self.folder / "example"
+            run("cmake", "-S", SOURCE / "examples/cpp", "-B", build, f"-DCMAKE_PREFIX_PATH={self.prefix}")
+            run("cmake", "--build", build)
+            with self.service():
+                self.assertIn("0.25 s", run(build / "play", self.song, env=self.environment()))
+        with self.subTest("pkg-config"):
+            flags = run("pkg-config", "--cflags", "--libs", "libtarn",
+                        env=self.environment(PKG_CONFIG_PATH=str(self.prefix / "lib/pkgconfig"),
+                                             PKG_CONFIG_ALLOW_SYSTEM_CFLAGS="1", PKG_CONFIG_ALLOW_SYSTEM_LIBS="1"))
+            self.assertIn(f"-I{self.prefix.resolve()}/include",
+                          " ".join(self.resolved(flag) for flag in flags.split()))
+            run("c++", "-std=c++20", SOURCE / "examples/cpp/play.cpp", "-o", self.folder / "play", *flags.split())
+
+    @staticmethod
+    def resolved(flag):
+        return flag[:2] + str(pathlib.Path(flag[2:]).resolve())
+
+    def test_lets_programs_be_built_from_its_messages(self):
+        protos = self.prefix / "share/tarn/proto"
+        run("protoc", f"--python_out={self.folder}", f"-I{protos}", "velmo.proto", "transport.proto")
+        with self.service():
+            run("/usr/bin/python3", SOURCE / "examples/python/play.py", self.song,
+                env=self.environment(PYTHONPATH=str(self.folder)))
+
+    def test_brings_units_that_are_hardened(self):
+        unit = self.prefix / "lib/systemd/user/tarnd.service"
+        self.assertIn("ExecStart=/usr/bin/tarnd\n", unit.read_text())
+        run("systemd-analyze", "security", "--offline=true", "--threshold=15", unit)
+
+    def test_brings_manual_pages_without_faults(self):
+        pages = sorted((self.prefix / "share/man").rglob("*.[178]"))
+        self.assertEqual([page.name for page in pages], ["tarnctl.1", "tarn-protocol.7", "tarnd.8"])
+        for page in pages:
+            complaints = subprocess.run(["man", "--warnings", "-E", "UTF-8", "-Tutf8", "-l", page], text=True,
+                                        stdout=subprocess.DEVNULL, stderr=subprocess.PIPE, check=True,
+                                        env={**os.environ, "MANWIDTH": "80"}).stderr
+            self.assertEqual(complaints, "", page.name)
+
+    def test_is_described_to_desktops(self):
+        run("desktop-file-validate", self.prefix / "share/applications/ostrel.tarnctl.desktop")
+        run("appstreamcli", "validate", "--no-net",
+            self.prefix / "share/metainfo/ostrel.pellion.tarnctl.metainfo.xml")
+
+    def test_completes_what_the_tool_offers(self):
+        verbs = re.findall(r"^  ([a-z]+) ", self.tarnctl("--help").split("Subcommands:")[1], re.MULTILINE)
+        self.assertGreaterEqual(len(verbs), 3)
+        options = {verb: set(re.findall(r"--[a-z]+", self.tarnctl(verb, "--help"))) for verb in verbs}
+        bash = self.prefix / "share/bash-completion/completions/tarnctl"
+
+        def complete(*words):
+            line = " ".join(f"'{word}'" for word in ("tarnctl", *words))
+            return set(run("bash", "-c", f"compopt() {{ :; }}; . {bash}; COMP_WORDS=({line}); "
+                           f"COMP_CWORD={len(words)}; _tarnctl; printf '%s\\n' \"${{COMPREPLY[@]}}\"",
+                           env=self.environment(PATH=f"{self.prefix}/bin:{os.environ['PATH']}")).split())
+
+        self.assertEqual(complete(""), set(verbs))
+        for verb in verbs:
+            self.assertEqual(complete(verb, "--"), options[verb], verb)
+        self.assertIn("asset.upsertWithMetaData", complete("send", "asset."))
+        for other in ("zsh/vendor-completions/_tarnctl", "fish/vendor_completions.d/tarnctl.fish"):
+            text = (self.prefix / "share" / other).read_text()
+            for word in {*verbs, *(option[2:] for verb in verbs for option in options[verb])} - {"help"}:
+                self.assertRegex(text, rf"\b{word}\b", other)
+
+
+if __name__ == "__main__":
+    if not shutil.which("dpkg-shlibdeps"):
+        sys.exit("dpkg-shlibdeps is missing: script/setup installs it")
+    unittest.main(argv=sys.argv[:1], verbosity=2)
