@@ -13,7 +13,7 @@
 namespace tarn {
 
 /// A command or event about a queue player: the field that is set names it. `setStatus` and `setCurrentItem`
-/// are events, which the service sends.
+/// are events, which the service sends; `setRate` is both a command and an event.
 class VLProtoAudioFileQueuePlayer final : public Message<VLProtoAudioFileQueuePlayer> {
 public:
     static constexpr std::string_view className = "VLProtoAudioFileQueuePlayer";

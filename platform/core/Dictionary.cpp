@@ -20,7 +20,8 @@ public:
         ++depth_;
         for (const auto& [key, value] : dictionary) {
             indent();
-            text_ += key + " = ";
+            text_ += key;
+            text_ += " = ";
             append(value);
             text_ += ";\n";
         }
@@ -47,7 +48,11 @@ private:
         text_ += ')';
     }
 
-    void append(const std::string& text) { text_ += '"' + text + '"'; }
+    void append(const std::string& text) {
+        text_ += '"';
+        text_ += text;
+        text_ += '"';
+    }
 
     void append(const Data& data) {
         static constexpr char digits[] = "0123456789abcdef";
