@@ -5,8 +5,6 @@
 #include <cstring>
 #include <limits>
 
-#include "platform/core/Utf8.h"
-
 namespace tarn {
 
 static_assert(std::endian::native == std::endian::little,
@@ -55,38 +53,6 @@ double ProtoReader::readDouble() noexcept { return readFixed<double>(); }
 
 float ProtoReader::readFloat() noexcept { return readFixed<float>(); }
 
-std::optional<std::span<const std::uint8_t>> ProtoReader::readData() noexcept {
-    const std::uint64_t count = readVarint();
-    const std::uint32_t start = position_;
-    if (!skipBytes(count))
-        return std::nullopt;
-    return std::span(bytes_ + start, count);
-}
-
-std::optional<std::string_view> ProtoReader::readString() noexcept {
-    const auto data = readData();
-    if (!data)
-        return std::nullopt;
-    const std::string_view text(reinterpret_cast<const char*>(data->data()), data->size());
-    if (!isValidUtf8(text))
-        return std::nullopt;
-    return text;
-}
-
-std::optional<std::uint32_t> ProtoReader::placeMark() noexcept {
-    const std::uint64_t count = readVarint();
-    if (error_ || count > length_ - position_)
-        return std::nullopt;
-    const std::uint32_t mark = length_;
-    length_ = position_ + static_cast<std::uint32_t>(count);
-    return mark;
-}
-
-void ProtoReader::recallMark(std::uint32_t mark) noexcept {
-    position_ = length_;
-    length_ = mark;
-}
-
 bool ProtoReader::skipValue(std::uint32_t fieldNumber, WireType wireType) noexcept {
     switch (wireType) {
     case WireType::varint:
@@ -104,15 +70,6 @@ bool ProtoReader::skipValue(std::uint32_t fieldNumber, WireType wireType) noexce
         break;
     }
     return false;
-}
-
-bool ProtoReader::skipBytes(std::uint64_t count) noexcept {
-    if (error_ || count > length_ - position_) {
-        error_ = true;
-        return false;
-    }
-    position_ += static_cast<std::uint32_t>(count);
-    return true;
 }
 
 /// Groups nest as deep as the sender likes, so what is open is kept here and not on the call stack.

@@ -5,6 +5,8 @@
 #include <span>
 #include <string_view>
 
+#include "platform/core/Utf8.h"
+
 namespace tarn {
 
 /// How a value is laid out on the wire: the low three bits of a field's key.
@@ -48,25 +50,56 @@ public:
     float readFloat() noexcept;
 
     /// A length-delimited value; none, and an error, when it runs past the end.
-    std::optional<std::span<const std::uint8_t>> readData() noexcept;
+    std::optional<std::span<const std::uint8_t>> readData() noexcept {
+        const std::uint64_t count = readVarint();
+        const std::uint32_t start = position_;
+        if (!skipBytes(count))
+            return std::nullopt;
+        return std::span(bytes_ + start, count);
+    }
 
     /// A length-delimited value; none when it is not UTF-8, which is no error, or runs past the end, which
     /// is.
-    std::optional<std::string_view> readString() noexcept;
+    std::optional<std::string_view> readString() noexcept {
+        const auto data = readData();
+        if (!data)
+            return std::nullopt;
+        const std::string_view text(reinterpret_cast<const char*>(data->data()), data->size());
+        if (!isValidUtf8(text))
+            return std::nullopt;
+        return text;
+    }
 
-    /// Reads the length prefix of an embedded message and narrows the end to it. Returns the end before, for
-    /// recallMark(); none when the message runs past the end.
-    std::optional<std::uint32_t> placeMark() noexcept;
+    /// Reads the length prefix of an embedded message and narrows the end to it; `mark` is for recallMark().
+    /// False when the message runs past the end.
+    bool placeMark(std::uint32_t& mark) noexcept {
+        const std::uint64_t count = readVarint();
+        if (error_ || count > length_ - position_)
+            return false;
+        mark = length_;
+        length_ = position_ + static_cast<std::uint32_t>(count);
+        return true;
+    }
 
     /// Leaves the embedded message, also when it was not read to its end.
-    void recallMark(std::uint32_t mark) noexcept;
+    void recallMark(std::uint32_t mark) noexcept {
+        position_ = length_;
+        length_ = mark;
+    }
 
     /// Moves behind a value whose key has been read; false when that cannot be done.
     bool skipValue(std::uint32_t fieldNumber, WireType wireType) noexcept;
 
 private:
     std::uint64_t readLongVarint() noexcept;
-    bool skipBytes(std::uint64_t count) noexcept;
+    bool skipBytes(std::uint64_t count) noexcept {
+        if (error_ || count > length_ - position_) {
+            error_ = true;
+            return false;
+        }
+        position_ += static_cast<std::uint32_t>(count);
+        return true;
+    }
     bool skipGroup(std::uint32_t fieldNumber) noexcept;
     template <class Number>
     Number readFixed() noexcept;

@@ -31,12 +31,27 @@ unsigned char byteAt(std::string_view text, std::size_t index) {
     return static_cast<unsigned char>(text[index]);
 }
 
-bool beginsWithEightAsciiCharacters(std::string_view text) {
-    std::uint64_t bytes = 0;
-    if (text.size() < sizeof bytes)
-        return false;
-    std::memcpy(&bytes, text.data(), sizeof bytes);
-    return (bytes & 0x8080808080808080U) == 0;
+constexpr std::size_t wordSize = sizeof(std::uint64_t);
+
+std::uint64_t wordAt(const char* text) {
+    std::uint64_t word = 0;
+    std::memcpy(&word, text, wordSize);
+    return word;
+}
+
+/// Looks at eight bytes at a time; the last eight may overlap those before.
+bool isAscii(std::string_view text) {
+    constexpr std::uint64_t highBits = 0x8080808080808080U;
+    std::uint64_t seen = 0;
+    if (text.size() < wordSize) {
+        for (const char character : text)
+            seen |= static_cast<unsigned char>(character);
+        return (seen & highBits) == 0;
+    }
+    const char* const lastWord = text.data() + text.size() - wordSize;
+    for (const char* position = text.data(); position < lastWord; position += wordSize)
+        seen |= wordAt(position);
+    return ((seen | wordAt(lastWord)) & highBits) == 0;
 }
 
 } // namespace
@@ -61,11 +76,9 @@ std::size_t utf8CharacterLength(std::string_view text) noexcept {
 }
 
 bool isValidUtf8(std::string_view text) noexcept {
+    if (isAscii(text)) // nearly every text is
+        return true;
     while (!text.empty()) {
-        if (beginsWithEightAsciiCharacters(text)) {
-            text.remove_prefix(8);
-            continue;
-        }
         const std::size_t length = utf8CharacterLength(text);
         if (length == 0)
             return false;
