@@ -2,6 +2,7 @@
 if(TARN_SANITIZE)
     add_compile_options(-fsanitize=${TARN_SANITIZE} -fno-sanitize-recover=all -fno-omit-frame-pointer)
     add_link_options(-fsanitize=${TARN_SANITIZE})
+    add_compile_definitions(TARN_SANITIZED)
 else()
     add_compile_options(-fstack-protector-strong -fstack-clash-protection -fcf-protection)
     add_compile_options($<$<CONFIG:Release>:-D_FORTIFY_SOURCE=2>)

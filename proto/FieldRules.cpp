@@ -1,5 +1,6 @@
 #include "proto/FieldRules.h"
 
+#include <algorithm>
 #include <cmath>
 #include <functional>
 #include <limits>
@@ -23,47 +24,19 @@ bool read(ProtoReader& reader, std::optional<Data>& value) {
     return true;
 }
 
+/// The texts of a list mostly have one length: the first one tells how many the rest may hold. Room is made
+/// for so many at once, up to a few pages, and not for what a single short one among long ones promises.
 bool read(ProtoReader& reader, WireList<std::string>& value) {
-    if (const auto text = reader.readString()) {
-        if (!value)
-            value.emplace();
-        value->emplace_back(*text);
+    constexpr std::size_t mostReserved = 1024;
+    const auto text = reader.readString();
+    if (!text)
+        return true;
+    if (!value) {
+        const std::size_t rest = reader.length() - reader.position();
+        value.emplace();
+        value->reserve(std::min(1 + rest / (text->size() + 2), mostReserved));
     }
-    return true;
-}
-
-bool read(ProtoReader& reader, bool& value) {
-    value = reader.readVarint() != 0;
-    return true;
-}
-
-bool read(ProtoReader& reader, std::int32_t& value) {
-    value = static_cast<std::int32_t>(reader.readVarint());
-    return true;
-}
-
-bool read(ProtoReader& reader, std::int64_t& value) {
-    value = static_cast<std::int64_t>(reader.readVarint());
-    return true;
-}
-
-bool read(ProtoReader& reader, std::uint32_t& value) {
-    value = static_cast<std::uint32_t>(reader.readVarint());
-    return true;
-}
-
-bool read(ProtoReader& reader, std::uint64_t& value) {
-    value = reader.readVarint();
-    return true;
-}
-
-bool read(ProtoReader& reader, float& value) {
-    value = reader.readFloat();
-    return true;
-}
-
-bool read(ProtoReader& reader, double& value) {
-    value = reader.readDouble();
+    value->emplace_back(*text);
     return true;
 }
 

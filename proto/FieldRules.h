@@ -8,6 +8,7 @@
 
 #include "platform/core/ProtoReader.h"
 #include "platform/core/ProtoWriter.h"
+#include "proto/BlockCache.h"
 #include "proto/FieldRow.h"
 
 /// What each operation of a message does to one field: one overload for each kind of value.
@@ -20,13 +21,22 @@ namespace tarn::fieldRules {
 bool read(ProtoReader& reader, std::optional<std::string>& value);
 bool read(ProtoReader& reader, std::optional<Data>& value);
 bool read(ProtoReader& reader, WireList<std::string>& value);
-bool read(ProtoReader& reader, bool& value);
-bool read(ProtoReader& reader, std::int32_t& value);
-bool read(ProtoReader& reader, std::int64_t& value);
-bool read(ProtoReader& reader, std::uint32_t& value);
-bool read(ProtoReader& reader, std::uint64_t& value);
-bool read(ProtoReader& reader, float& value);
-bool read(ProtoReader& reader, double& value);
+inline bool read(ProtoReader& reader, float& value) {
+    value = reader.readFloat();
+    return true;
+}
+
+inline bool read(ProtoReader& reader, double& value) {
+    value = reader.readDouble();
+    return true;
+}
+
+/// Numbers of 32 bits keep the low half of what was sent; a truth value is true unless that is zero.
+template <std::integral Number>
+bool read(ProtoReader& reader, Number& value) {
+    value = static_cast<Number>(reader.readVarint());
+    return true;
+}
 
 template <class Value>
 bool read(ProtoReader& reader, Boxed<Value>& value) {
@@ -38,11 +48,11 @@ bool read(ProtoReader& reader, Boxed<Value>& value) {
 
 template <std::derived_from<ProtoCodable> Embedded>
 bool read(ProtoReader& reader, std::shared_ptr<Embedded>& value) {
-    value = std::make_shared<Embedded>();
-    const auto mark = reader.placeMark();
-    if (!mark || !value->readFrom(reader))
+    value = newMessage<Embedded>();
+    std::uint32_t mark = 0;
+    if (!reader.placeMark(mark) || !value->readFrom(reader))
         return false;
-    reader.recallMark(*mark);
+    reader.recallMark(mark);
     return true;
 }
 

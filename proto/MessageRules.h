@@ -26,7 +26,7 @@ void forEachRow(Visitor visit) {
 
 template <class Class>
 std::shared_ptr<Class> Message<Class>::fromData(std::span<const std::uint8_t> data) {
-    auto message = std::make_shared<Class>();
+    auto message = newMessage<Class>();
     ProtoReader reader(data);
     return message->readFrom(reader) ? message : nullptr;
 }
@@ -101,7 +101,7 @@ void Message<Class>::copyTo(Class& other) const {
 
 template <class Class>
 std::shared_ptr<Class> Message<Class>::copyWithZone() const {
-    auto copy = std::make_shared<Class>();
+    auto copy = newMessage<Class>();
     forEachRow<Class>([&](const auto& row) {
         if (!isCarried(row))
             return;
