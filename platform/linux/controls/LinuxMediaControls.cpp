@@ -22,7 +22,8 @@ constexpr char serviceName[] = "tarnd";
 
 } // namespace
 
-/// The board and the targets are touched by any thread, the state and the bus by the bus thread only.
+/// The board and the targets are touched by any thread, the state and what hangs on the bus by the bus thread
+/// only.
 class LinuxMediaControls::Implementation {
 public:
     Implementation(ApplicationName applicationName, Addresses addresses)
@@ -31,7 +32,6 @@ public:
           session_(loop_.event(), std::move(addresses.sessionBus), "session bus",
                    BusConnection::Report::outages, mpris_),
           sleep_(loop_, commands_, std::move(addresses.systemBus)) {
-        state_.application = label(std::nullopt);
         loop_.start();
     }
 
@@ -41,9 +41,27 @@ public:
     }
 
     RemoteTargets& targets() { return targets_; }
-    PublicationBoard& board() { return *board_; }
+
+    /// The names are looked up here, on the caller's thread: the bus thread never waits for a disk.
+    void setApplication(const std::optional<std::string>& application) {
+        if (application)
+            board_->setApplication(label(*application).value_or(ownLabel()));
+        else
+            board_->replaceApplication(ownLabel());
+    }
+
+    void publish(const NowPlayingInfo& info) { board_->publish(info); }
 
 private:
+    static ApplicationLabel ownLabel() { return {serviceName, ""}; }
+
+    std::optional<ApplicationLabel> label(const std::string& application) const {
+        const auto name = applicationName_(application);
+        if (!name || name->empty())
+            return std::nullopt;
+        return ApplicationLabel{busText(*name), busText(application)};
+    }
+
     bool playerLives() const {
         for (const auto kind : {RemoteCommandKind::pause, RemoteCommandKind::play,
                                 RemoteCommandKind::togglePlayPause, RemoteCommandKind::nextTrack})
@@ -52,27 +70,12 @@ private:
         return true;
     }
 
-    ApplicationLabel label(const std::optional<std::string>& application) const {
-        const auto named = [this](const std::string& entry) -> std::optional<ApplicationLabel> {
-            const auto name = applicationName_(entry);
-            if (!name || name->empty())
-                return std::nullopt;
-            return ApplicationLabel{busText(*name), busText(entry)};
-        };
-        std::optional<ApplicationLabel> found;
-        if (application)
-            found = named(*application);
-        if (!found)
-            found = named(serviceName);
-        return found.value_or(ApplicationLabel{serviceName, ""});
-    }
-
     void refresh() {
         const PublicationBoard::Snapshot snapshot = board_->take();
         if (std::exchange(publicationSeen_, snapshot.number) != snapshot.number)
-            state_ = state_.next({snapshot.info, snapshot.time, label(snapshot.application)});
-        else if (!snapshot.application)
-            state_.application = label(std::nullopt);
+            state_ = state_.next({snapshot.info, snapshot.time, snapshot.application});
+        else
+            state_.application = snapshot.application;
         const bool alive = playerLives();
         if (alive)
             session_.open();
@@ -83,7 +86,7 @@ private:
     const ApplicationName applicationName_;
     BusLoop loop_;
     const std::shared_ptr<PublicationBoard> board_ =
-        std::make_shared<PublicationBoard>([this] { loop_.post([this] { refresh(); }); });
+        std::make_shared<PublicationBoard>(ownLabel(), [this] { loop_.post([this] { refresh(); }); });
     RemoteTargets targets_{[board = board_] { board->touch(); }};
     RemoteCommandThread commands_{targets_};
     MprisState state_;
@@ -106,13 +109,13 @@ RemoteCommandCenter& LinuxMediaControls::remoteCommands() { return implementatio
 
 void LinuxMediaControls::setParentApplication(Origin,
                                               const std::optional<std::string>& applicationIdentifier) {
-    implementation_->board().setApplication(applicationIdentifier);
+    implementation_->setApplication(applicationIdentifier);
 }
 
 void LinuxMediaControls::setNowPlayingInfo(Origin, const NowPlayingInfo& info,
                                            [[maybe_unused]] int mergePolicy) {
     assert(mergePolicy == mergePolicyReplace);
-    implementation_->board().publish(info);
+    implementation_->publish(info);
 }
 
 } // namespace tarn

@@ -19,7 +19,7 @@ namespace tarn {
 class LinuxMediaControls final : public NowPlayingService {
 public:
     /// The name of an installed application for a person, by the name of its desktop entry; none when there
-    /// is no such entry. Called on the bus thread; must answer from memory.
+    /// is no such entry. Called on the threads that publish.
     using ApplicationName = std::function<std::optional<std::string>(const std::string& desktopEntry)>;
 
     struct Addresses {

@@ -1,13 +1,25 @@
 #include "platform/linux/controls/PublicationBoard.h"
 
+#include <utility>
+
 namespace tarn {
 
-void PublicationBoard::setApplication(std::optional<std::string> application) {
+PublicationBoard::PublicationBoard(ApplicationLabel application, std::function<void()> wake)
+    : wake_(std::move(wake)), application_(std::move(application)) {
+    current_.application = application_;
+}
+
+void PublicationBoard::setApplication(ApplicationLabel application) {
     const std::lock_guard lock(mutex_);
     application_ = std::move(application);
-    if (application_ || !current_.application)
+}
+
+void PublicationBoard::replaceApplication(ApplicationLabel application) {
+    const std::lock_guard lock(mutex_);
+    application_ = std::move(application);
+    if (current_.application == application_)
         return;
-    current_.application.reset();
+    current_.application = application_;
     wake();
 }
 

@@ -4,10 +4,9 @@
 #include <cstdint>
 #include <functional>
 #include <mutex>
-#include <optional>
-#include <string>
 
 #include "platform/NowPlayingService.h"
+#include "platform/linux/controls/MprisState.h"
 
 namespace tarn {
 
@@ -18,16 +17,20 @@ public:
     struct Snapshot {
         NowPlayingInfo info;
         std::chrono::steady_clock::time_point time; // of the publication
-        std::optional<std::string> application;
+        ApplicationLabel application;
         std::uint64_t number = 0; // 0 before the first publication; else it grows with each
     };
 
     /// `wake` is to lead to a call of take(); it runs on the threads that publish, with no call of it
     /// running.
-    explicit PublicationBoard(std::function<void()> wake) : wake_(std::move(wake)) {}
+    PublicationBoard(ApplicationLabel application, std::function<void()> wake);
 
-    /// Counts for the next publication, so that both are seen together; none counts at once.
-    void setApplication(std::optional<std::string> application);
+    /// Holds for the publications that follow, and is seen together with the next one.
+    void setApplication(ApplicationLabel application);
+
+    /// Holds at once, also for what was published before.
+    void replaceApplication(ApplicationLabel application);
+
     void publish(const NowPlayingInfo& info);
 
     /// Something else has changed that the bus thread must look at.
@@ -44,7 +47,7 @@ private:
 
     std::mutex mutex_;
     std::function<void()> wake_;
-    std::optional<std::string> application_; // for the next publication
+    ApplicationLabel application_; // for the next publication
     Snapshot current_;
     bool woken_ = false;
 };
