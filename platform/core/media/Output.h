@@ -66,7 +66,8 @@ public:
     virtual std::int64_t firstReplaceable() const = 0;
 
     /// Takes back everything from `index` (at least firstReplaceable(), at most writeIndex()) on; writing
-    /// goes on there. `join` is about the frames that are written next.
+    /// goes on there, and so does the clock in case that the ear has been quicker. `join` is about the frames
+    /// that are written next.
     virtual void rewind(std::int64_t index, Join join) = 0;
 
     /// Any thread: the frame that is heard now (all before it were heard), output latency taken off, at most

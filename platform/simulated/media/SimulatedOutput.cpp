@@ -130,9 +130,13 @@ void SimulatedOutput::write(const PcmBuffer& buffer) {
 void SimulatedOutput::rewind(std::int64_t index, Join) {
     {
         std::lock_guard lock(mutex_);
-        assert(index >= heard() && index <= writeIndex_);
+        assert(index <= writeIndex_);
         settleHeard();
         takeBack(index);
+        if (index < baseFrame_) { // the ear has been quicker
+            baseFrame_ = index;
+            baseTime_ = loop_.now();
+        }
     }
     setWritableTimer();
 }
