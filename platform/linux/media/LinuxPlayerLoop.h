@@ -1,0 +1,60 @@
+#pragma once
+
+#include <map>
+#include <memory>
+#include <mutex>
+#include <thread>
+#include <vector>
+
+#include "platform/core/media/PlayerLoop.h"
+#include "platform/linux/FileDescriptor.h"
+
+struct pa_mainloop;
+struct pa_mainloop_api;
+
+namespace tarn {
+
+/// The player thread of this machine. It also talks to the sound server: what the server asks for is rendered
+/// where it is asked for, with no hand-off between threads and no lock. Without work, a timer that is due or
+/// word from the server it sleeps.
+class LinuxPlayerLoop final : public PlayerLoop {
+public:
+    LinuxPlayerLoop();
+
+    ~LinuxPlayerLoop() override;
+
+    /// Ends the thread and waits for it. Work that has not begun is dropped, with all that it owns; so what
+    /// belongs to the thread can be destroyed in peace. Not on the player thread; nothing may be posted
+    /// after.
+    void stop();
+
+    void post(std::function<void()> work) override;
+    [[nodiscard]] RegistrationHandle at(std::chrono::nanoseconds time, std::function<void()> work) override;
+    bool isCurrent() const override;
+    std::chrono::nanoseconds now() const override;
+
+    /// For the sound server's library; player thread only.
+    pa_mainloop_api& api() const;
+
+private:
+    class Timers;
+    struct MainLoopDelete {
+        void operator()(pa_mainloop* loop) const;
+    };
+
+    void run();
+    void runPosted();
+    void wake();
+
+    const std::unique_ptr<pa_mainloop, MainLoopDelete> mainLoop_;
+    const FileDescriptor wakeUp_;
+    const std::shared_ptr<Timers> timers_;
+
+    std::mutex mutex_;
+    std::vector<std::function<void()>> posted_; // under the mutex
+    bool ending_ = false;                       // under the mutex
+
+    std::thread thread_;
+};
+
+} // namespace tarn
