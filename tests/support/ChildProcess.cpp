@@ -65,6 +65,8 @@ ChildProcess::~ChildProcess() {
         signal(SIGKILL);
         wait();
     }
+    if (discarding_.joinable())
+        discarding_.join();
 }
 
 void ChildProcess::signal(int number) const {
@@ -90,6 +92,14 @@ bool ChildProcess::readUntil(std::string_view text, std::chrono::milliseconds li
         if (line->find(text) != std::string::npos)
             return true;
     return false;
+}
+
+void ChildProcess::discardOutput() {
+    discarding_ = std::thread([this] {
+        std::array<char, 4096> bytes{};
+        while (::read(output_.get(), bytes.data(), bytes.size()) > 0) {
+        }
+    });
 }
 
 std::string ChildProcess::readAll(std::chrono::milliseconds limit) {

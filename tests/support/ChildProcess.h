@@ -5,6 +5,7 @@
 #include <optional>
 #include <string>
 #include <string_view>
+#include <thread>
 #include <vector>
 
 #include <sys/types.h>
@@ -39,6 +40,10 @@ public:
     [[nodiscard]] bool readUntil(std::string_view text,
                                  std::chrono::milliseconds limit = std::chrono::seconds(10));
 
+    /// Reads and forgets all further output, so that a program that prints more than anyone reads is never
+    /// held up.
+    void discardOutput();
+
     /// What is left of the output, up to its end.
     std::string readAll(std::chrono::milliseconds limit = std::chrono::seconds(30));
 
@@ -52,6 +57,7 @@ private:
     FileDescriptor output_;
     std::string unread_;
     std::optional<int> status_;
+    std::thread discarding_;
 };
 
 struct CommandResult {

@@ -37,6 +37,7 @@ void PrivateBus::start() {
                                              ChildProcess::ErrorOutput::withOutput);
     if (!daemon_->readUntil(address_))
         throw std::runtime_error("dbus-daemon does not start");
+    daemon_->discardOutput();
 }
 
 void PrivateBus::kill() { daemon_.reset(); }
