@@ -1,7 +1,6 @@
 #pragma once
 
 #include <filesystem>
-#include <memory>
 #include <string>
 #include <vector>
 
@@ -47,8 +46,5 @@ private:
     const std::vector<std::string> languages_;
     MutexProtected<ApplicationIndex> index_;
 };
-
-/// The registry of the running user: the data folders of the environment, names in `languages`.
-std::unique_ptr<DesktopApplicationRegistry> systemApplicationRegistry(std::vector<std::string> languages);
 
 } // namespace tarn
