@@ -52,7 +52,8 @@ def make_song(path):
 class AnInstalledPackage(unittest.TestCase):
     @classmethod
     def setUpClass(cls):
-        cls.folder = pathlib.Path(cls.enterClassContext(tempfile.TemporaryDirectory()))
+        # Not in /tmp, which the unit's service has for itself.
+        cls.folder = pathlib.Path(cls.enterClassContext(tempfile.TemporaryDirectory(dir=BUILD)))
         cls.root = cls.folder / "root"
         cls.package = make_package(cls.folder)
         install(cls.package, cls.root)
@@ -65,8 +66,8 @@ class AnInstalledPackage(unittest.TestCase):
         return {**kept, "XDG_RUNTIME_DIR": str(self.folder), "LANG": "C.UTF-8", **more}
 
     @contextlib.contextmanager
-    def service(self, **variables):
-        """The service as the service manager starts it: with its socket, until it says that it is ready."""
+    def service(self, wrapper=(), **variables):
+        """The service as the service manager starts it: with its socket, from when it says that it is ready."""
         path = self.folder / "ostrel.tarnd"
         with socket.socket(socket.AF_UNIX) as listener, \
                 socket.socket(socket.AF_UNIX, socket.SOCK_DGRAM) as readiness:
@@ -75,7 +76,8 @@ class AnInstalledPackage(unittest.TestCase):
             readiness.bind(str(self.folder / "notify"))
             readiness.settimeout(DEADLINE)
             process = subprocess.Popen(
-                ["sh", "-c", f'exec 3<&{listener.fileno()}; LISTEN_PID=$$ exec "$0"', self.prefix / "bin/tarnd"],
+                ["sh", "-c", f'exec 3<&{listener.fileno()}; LISTEN_PID=$$ exec "$@"', "sh", *wrapper,
+                 self.prefix / "bin/tarnd"],
                 pass_fds=[listener.fileno()],
                 env=self.environment(LISTEN_FDS="1", LISTEN_FDNAMES="ostrel.tarnd",
                                      NOTIFY_SOCKET=str(self.folder / "notify"), **variables))
@@ -95,6 +97,17 @@ class AnInstalledPackage(unittest.TestCase):
     def test_serves_from_the_socket_it_is_given(self):
         with self.service():
             self.assertIn("0:00", self.tarnctl("info", self.song))
+            self.assertIn("song.wav", self.tarnctl("play", self.song))
+
+    def test_plays_as_confined_as_its_unit_says(self):
+        namespaces = ("unshare", "--user", "--map-root-user", "--mount", "--net")
+        if subprocess.run([*namespaces, "true"], stderr=subprocess.DEVNULL, check=False).returncode != 0:
+            self.skipTest("this machine does not let us make namespaces")
+        unit = self.prefix / "lib/systemd/user/tarnd.service"
+        confined = pathlib.Path(__file__).with_name("confined.py")
+        with self.service((*namespaces, "/usr/bin/python3", confined, unit)) as process:
+            status = pathlib.Path(f"/proc/{process.pid}/status").read_text()
+            self.assertIn("\nSeccomp:\t2\n", status)
             self.assertIn("song.wav", self.tarnctl("play", self.song))
 
     def test_speaks_the_users_language(self):
