@@ -1,0 +1,35 @@
+#pragma once
+
+#include <chrono>
+#include <cstdint>
+#include <vector>
+
+#include "platform/linux/ipc/FrameReader.h"
+
+namespace tarn::bench {
+
+/// Sends the same call over and over and counts the frames that come back; one thread, blocking. The same for
+/// the service and for an echo, so that what differs is the other side.
+class FrameClient {
+public:
+    /// Closes the socket. `sender`: who makes the frames that come back.
+    FrameClient(FileDescriptor socket, Data call, FrameReader::Sender sender);
+
+    /// How long each of `count` round trips took, one after the other.
+    std::vector<std::chrono::nanoseconds> roundTrips(int count);
+
+    /// Round trips in a second with `ahead` calls on the way at all times.
+    double rate(int count, int ahead);
+
+private:
+    void send(int calls);
+    int receive();
+
+    FileDescriptor socket_;
+    Data call_;
+    FrameReader::Sender sender_;
+    FrameReader reader_;
+    std::vector<std::uint8_t> buffer_;
+};
+
+} // namespace tarn::bench
