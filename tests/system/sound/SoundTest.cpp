@@ -112,5 +112,126 @@ TEST_F(SoundTest, ItemsOfEveryLosslessFormatJoinWithoutAGap) {
     EXPECT_TRUE(find(whole.samples, recorder.samples()));
 }
 
+/// How far the position that a player tells is from what the recorder hears at the same moment, in seconds.
+/// `recording` begins at frame 0 of its item, which plays at rate 1.
+double positionError(const MediaQueuePlayer& player, const Recorder& recorder, const Recording& recording) {
+    constexpr std::size_t window = 400;
+    recorder.waitFrames(1);
+    const double told = player.currentTime().seconds();
+    const std::vector<std::int16_t> recorded = recorder.samples();
+    const std::vector<std::int16_t> last(recorded.end() - 2 * window, recorded.end());
+    const auto found =
+        std::search(recording.samples.begin(), recording.samples.end(), last.begin(), last.end());
+    if (found == recording.samples.end())
+        return 1'000;
+    const auto heard = static_cast<double>(found - recording.samples.begin()) / 2 + window;
+    return told - heard / recording.rate;
+}
+
+TEST_F(SoundTest, TellsThePositionThatIsHeard) {
+    const Recording recording = makeSweep(6 * 44'100, 44100, 2);
+    const auto player = makePlayer({makeItem(recording)});
+    const Recorder recorder;
+    player->setRate(1);
+    recorder.waitFrames(22'050);
+    double before = 0;
+    for (int i = 0; i < 40; ++i) {
+        recorder.waitFrames(4'410);
+        const double now = player->currentTime().seconds();
+        EXPECT_GT(now, before);
+        before = now;
+        // The recorder itself is behind by up to a block of the sink, 50 ms, and its own fragment.
+        const double error = positionError(*player, recorder, recording);
+        EXPECT_GT(error, -0.02);
+        EXPECT_LT(error, 0.08);
+    }
+}
+
+TEST_F(SoundTest, PausesAndGoesOnWithoutLosingASample) {
+    const Recording recording = makeSweep(4 * 44'100, 44100, 2);
+    const auto player = makePlayer({makeItem(recording)});
+    const Recorder recorder;
+    player->setRate(1);
+    recorder.waitFrames(44'100);
+    player->pause();
+    const double paused = player->currentTime().seconds();
+    recorder.waitFrames(22'050);
+    EXPECT_EQ(player->currentTime().seconds(), paused);
+    const auto silent = recorder.samples();
+    EXPECT_TRUE(
+        std::all_of(silent.end() - 2 * 8'820, silent.end(), [](std::int16_t sample) { return sample == 0; }));
+    player->play();
+    ASSERT_TRUE(events.wait(MediaItem::didPlayToEndTime));
+    recorder.waitFrames(8'820);
+
+    std::vector<std::int16_t> heard;
+    const auto all = recorder.samples();
+    std::copy_if(all.begin(), all.end(), std::back_inserter(heard),
+                 [](std::int16_t sample) { return sample != 0; });
+    std::vector<std::int16_t> expected;
+    std::copy_if(recording.samples.begin(), recording.samples.end(), std::back_inserter(expected),
+                 [](std::int16_t sample) { return sample != 0; });
+    EXPECT_EQ(heard.size(), expected.size());
+    EXPECT_TRUE(heard == expected);
+}
+
+TEST_F(SoundTest, SeeksToTheSampleWhilePlaying) {
+    const Recording recording = makeSweep(8 * 44'100, 44100, 2);
+    const auto item = makeItem(recording, "a.flac");
+    const auto player = makePlayer({item});
+    const Recorder recorder;
+    player->setRate(1);
+    for (const double target : {5.5, 1.25, 7.0}) {
+        recorder.waitFrames(30'000);
+        item->seekToTime(MediaTime::fromSeconds(target, 44100));
+        recorder.waitFrames(30'000);
+        const auto frame = static_cast<std::size_t>(target * 44100);
+        // A few milliseconds are blended with what was heard before.
+        EXPECT_TRUE(find(recording.part(frame + 300, frame + 10'000).samples, recorder.samples())) << target;
+    }
+}
+
+TEST_F(SoundTest, IsSilentAtOnceWhenItsLastOwnerLetsGo) {
+    auto player = makePlayer({makeItem(makeSweep(6 * 44'100, 44100, 2))});
+    const Recorder recorder;
+    player->setRate(1);
+    recorder.waitFrames(44'100);
+    player.reset();
+    const std::size_t then = recorder.frames();
+    recorder.waitFrames(22'050);
+    const auto samples = recorder.samples();
+    std::size_t last = samples.size();
+    while (last > 0 && samples[last - 1] == 0)
+        --last;
+    // 50 ms of the sink's own block were on their way, and as much may not have come to the recorder.
+    EXPECT_LT(last / 2, then + 2 * 2'205 + 882);
+}
+
+TEST_F(SoundTest, GoesOnInSilenceWithoutAServerAndSoundsAgainWhereItIs) {
+    CapturedLog log;
+    const Recording recording = makeSweep(12 * 44'100, 44100, 2);
+    const auto player = makePlayer({makeItem(recording)});
+    {
+        const Recorder recorder;
+        player->setRate(1);
+        recorder.waitFrames(44'100);
+    }
+    const double before = player->currentTime().seconds();
+    server.kill();
+    ASSERT_TRUE(log.waitFor("No sound server"));
+    const auto killed = std::chrono::steady_clock::now();
+    while (player->currentTime().seconds() < before + 1)
+        ASSERT_LT(std::chrono::steady_clock::now() - killed, 5s) << "time stands still";
+    server.start();
+    ASSERT_TRUE(log.waitFor("The sound server is back", 2s));
+    const Recorder recorder;
+    recorder.waitFrames(44'100);
+    const double elapsed = std::chrono::duration<double>(std::chrono::steady_clock::now() - killed).count();
+    EXPECT_NEAR(player->currentTime().seconds(), before + elapsed, 0.7);
+    EXPECT_NEAR(positionError(*player, recorder, recording), 0.03, 0.05);
+    EXPECT_EQ(player->rate(), 1);
+    EXPECT_EQ(log.errors().size(), 1u);
+}
+
 } // namespace
 } // namespace tarn
