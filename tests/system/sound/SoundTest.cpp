@@ -1,5 +1,6 @@
 #include <condition_variable>
 #include <deque>
+#include <numbers>
 
 #include "platform/core/LocalNotificationCenter.h"
 #include "platform/linux/media/LinuxMediaEngine.h"
@@ -77,7 +78,16 @@ struct SoundTest : testing::Test {
         return static_cast<std::size_t>(found - recorded.begin()) / 2;
     }
 
-    SoundServerProcess server;
+    /// Frames from the first to the last that is not silent.
+    static std::size_t soundingFrames(const std::vector<std::int16_t>& samples) {
+        const auto sounds = [](std::int16_t sample) { return sample != 0; };
+        const auto first = std::find_if(samples.begin(), samples.end(), sounds);
+        const auto last = std::find_if(samples.rbegin(), samples.rend(), sounds).base();
+        return first < last ? static_cast<std::size_t>(last - first + 1) / 2 : 0;
+    }
+
+    SoundServerProcess server{
+        {"module-null-sink sink_name=other norewinds=1", "module-rescue-streams", "module-role-cork"}};
     TemporaryFolder folder;
     Events events;
     LocalNotificationCenter notifications;
@@ -231,6 +241,162 @@ TEST_F(SoundTest, GoesOnInSilenceWithoutAServerAndSoundsAgainWhereItIs) {
     EXPECT_NEAR(positionError(*player, recorder, recording), 0.03, 0.05);
     EXPECT_EQ(player->rate(), 1);
     EXPECT_EQ(log.errors().size(), 1u);
+}
+
+TEST_F(SoundTest, StepsAsideForACallAndComesBack) {
+    const auto item = makeItem(makeSweep(20 * 44'100, 44100, 2));
+    const auto other = makeItem(makeSweep(20 * 44'100, 44100, 2), "b.wav");
+    const auto playing = makePlayer({item});
+    const auto paused = makePlayer({other});
+    registrations.push_back(notifications.addObserver(
+        AudioSession::interruptionNotification, static_cast<AudioSession*>(&session),
+        [this](const Notification& notification) {
+            const bool ended =
+                notification.info.at(AudioSession::interruptionTypeKey) == AudioSession::interruptionEnded;
+            const bool resume = notification.info.contains(AudioSession::interruptionOptionsKey);
+            events.add(ended ? (resume ? "ended, resume" : "ended") : "began");
+        }));
+    const Recorder recorder;
+    paused->setRate(1);
+    playing->setRate(1);
+    recorder.waitFrames(22'050);
+    paused->pause();
+    recorder.waitFrames(22'050);
+    for (int call = 0; call < 2; ++call) {
+        {
+            ChildProcess phone({"pacat", "--property=media.role=phone", "--raw", "--device=out", "/dev/zero"},
+                               server.environment());
+            ASSERT_TRUE(events.wait("began"));
+            recorder.waitFrames(8'820);
+            EXPECT_EQ(playing->rate(), 0);
+        }
+        ASSERT_TRUE(events.wait("ended, resume"));
+        playing->play();
+        recorder.waitFrames(8'820);
+        EXPECT_EQ(playing->rate(), 1);
+        EXPECT_EQ(paused->rate(), 0);
+    }
+}
+
+TEST_F(SoundTest, PausesWhenItsDeviceGoesAndGoesOnWhenItIsMoved) {
+    CapturedLog log;
+    const auto player = makePlayer({makeItem(makeSweep(20 * 44'100, 44100, 2))});
+    const auto rate =
+        player->observe(MediaQueuePlayer::rateKeyPath, [this](Observable&, const ChangeDescription& change) {
+            events.add("rate " + std::to_string(static_cast<int>(std::get<float>(change.at("new")))));
+        });
+    const Recorder recorder;
+    player->setRate(1);
+    recorder.waitFrames(22'050);
+    std::string input = server.control({"list", "short", "sink-inputs"});
+    input = input.substr(0, input.find('\t'));
+    server.control({"move-sink-input", input, "other"});
+    recorder.waitFrames(22'050);
+    EXPECT_EQ(player->rate(), 1);
+
+    const std::string modules = server.control({"list", "short", "modules"});
+    const std::size_t name = modules.find("sink_name=other");
+    const std::size_t line = modules.rfind('\n', name) + 1;
+    server.control({"unload-module", modules.substr(line, modules.find('\t', line) - line)});
+    ASSERT_TRUE(events.wait("rate 0", 5s));
+    EXPECT_TRUE(log.waitFor("the device that played is gone"));
+    const double stopped = player->currentTime().seconds();
+    recorder.waitFrames(8'820);
+    EXPECT_EQ(player->currentTime().seconds(), stopped);
+    player->play();
+    recorder.waitFrames(22'050);
+    EXPECT_NEAR(player->currentTime().seconds(), stopped + 0.5, 0.2) << "on the device that is left";
+}
+
+TEST_F(SoundTest, AChangeOfRateDropsNothingAndMakesNoClick) {
+    Recording tone{44100, 2, {}};
+    for (int i = 0; i < 8 * 44'100; ++i)
+        for (int channel = 0; channel < 2; ++channel)
+            tone.samples.push_back(
+                static_cast<std::int16_t>(8'000 * std::sin(2 * std::numbers::pi * 220 * i / 44'100)));
+    const auto player = makePlayer({makeItem(tone)});
+    const Recorder recorder;
+    player->setRate(1);
+    for (const float rate : {1.5F, 2.0F, 0.5F, 1.0F}) {
+        recorder.waitFrames(22'050);
+        const double before = player->currentTime().seconds();
+        player->setRate(rate);
+        EXPECT_NEAR(player->currentTime().seconds(), before, 0.02);
+    }
+    ASSERT_TRUE(events.wait(MediaItem::didPlayToEndTime));
+    recorder.waitFrames(8'820);
+    const auto samples = recorder.samples();
+    std::size_t first = 0;
+    while (samples[first] == 0)
+        ++first;
+    const std::size_t frames = soundingFrames(samples);
+    int steepest = 0;
+    for (std::size_t i = first; i + 4 < first + 2 * frames; i += 2)
+        steepest = std::max(steepest, std::abs(samples[i + 2] - samples[i]));
+    EXPECT_LT(steepest, 600) << "the tone itself rises by at most 251 from frame to frame";
+}
+
+TEST_F(SoundTest, AChangeOfFormatBetweenItemsLeavesNoGap) {
+    const auto player = makePlayer({makeItem(makeSweep(44'100, 44100, 2), "1.wav"),
+                                    makeItem(makeSweep(48'000, 48000, 1), "2.wav"),
+                                    makeItem(makeSweep(22'050, 22050, 2), "3.wav")});
+    const Recorder recorder;
+    player->setRate(1);
+    for (int i = 0; i < 3; ++i)
+        ASSERT_TRUE(events.wait(MediaItem::didPlayToEndTime));
+    recorder.waitFrames(8'820);
+    EXPECT_NEAR(static_cast<double>(soundingFrames(recorder.samples())), 3 * 44'100, 20);
+}
+
+struct LossyJoin : SoundTest, testing::WithParamInterface<std::pair<const char*, const char*>> {};
+
+TEST_P(LossyJoin, LeavesNoGap) {
+    const Recording whole = makeSweep(4 * 44'100, 44100, 2);
+    const auto [extension, arguments] = GetParam();
+    const auto player =
+        makePlayer({makeItem(whole.part(0, 77'777), std::string("1.") + extension, arguments),
+                    makeItem(whole.part(77'777, whole.frames()), std::string("2.") + extension, arguments)});
+    const Recorder recorder;
+    player->setRate(1);
+    for (int i = 0; i < 2; ++i)
+        ASSERT_TRUE(events.wait(MediaItem::didPlayToEndTime));
+    recorder.waitFrames(8'820);
+    const auto samples = recorder.samples();
+    const std::vector<float> heard = toFloats({44100, 2, samples});
+    const std::vector<float> original = toFloats(whole);
+    const auto piece = [&](std::size_t frame) {
+        return std::vector<float>(original.begin() + static_cast<std::ptrdiff_t>(2 * frame),
+                                  original.begin() + static_cast<std::ptrdiff_t>(2 * (frame + 4'000)));
+    };
+    // Where the first half is, the second must be: 77,777 frames further, to the frame.
+    std::int64_t start = 0;
+    while (samples[static_cast<std::size_t>(2 * start)] == 0)
+        ++start;
+    const std::int64_t first = start + 40'000 + displacement(piece(40'000), heard, start + 40'000, 2, 1'500);
+    // Opus has 48,000 frames a second, the sink 44,100: each half ends between two of its frames.
+    const std::int64_t rounding = extension == std::string("opus") ? 1 : 0;
+    EXPECT_LE(std::abs(displacement(piece(120'000), heard, first + 80'000, 2, 1'500)), rounding);
+}
+
+INSTANTIATE_TEST_SUITE_P(Formats, LossyJoin,
+                         testing::Values(std::pair("mp3", "-c:a libmp3lame -q:a 2"),
+                                         std::pair("m4a", "-c:a aac -b:a 256k"),
+                                         std::pair("ogg", "-c:a libvorbis -q:a 7"),
+                                         std::pair("opus", "-c:a libopus -b:a 192k")),
+                         [](const auto& information) { return std::string(information.param.first); });
+
+TEST_F(SoundTest, AFileThatTurnsOutBadFailsAndTheQueueGoesOn) {
+    const auto bad = makeItem(makeSweep(3 * 44'100, 44100, 2), "bad.flac");
+    const auto good = makeItem(makeSweep(44'100, 44100, 2), "good.wav");
+    std::filesystem::resize_file(folder / "bad.flac", 100'000);
+    const auto player = makePlayer({bad, good});
+    player->setRate(1);
+    ASSERT_TRUE(events.wait(MediaItem::failedToPlayToEndTime));
+    EXPECT_EQ(bad->status(), MediaStatus::failed);
+    ASSERT_TRUE(bad->error());
+    EXPECT_EQ(bad->error()->domain, mediaErrorDomain);
+    ASSERT_TRUE(events.wait(MediaItem::didPlayToEndTime));
+    EXPECT_EQ(good->status(), MediaStatus::readyToPlay);
 }
 
 } // namespace
