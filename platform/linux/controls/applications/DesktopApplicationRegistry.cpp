@@ -1,6 +1,9 @@
 #include "platform/linux/controls/applications/DesktopApplicationRegistry.h"
 
+#include <cstdlib>
 #include <utility>
+
+#include "platform/linux/controls/applications/ApplicationFolders.h"
 
 namespace tarn {
 
@@ -59,6 +62,14 @@ std::optional<std::string> DesktopApplicationRegistry::applicationName(const std
         const DesktopEntry* entry = index.desktopEntry(application);
         return entry ? nameInLanguages(*entry, languages_) : std::nullopt;
     });
+}
+
+std::unique_ptr<DesktopApplicationRegistry> systemApplicationRegistry(std::vector<std::string> languages) {
+    auto folders = applicationFoldersFromEnvironment([](const char* name) {
+        const char* value = std::getenv(name);
+        return std::string(value ? value : "");
+    });
+    return std::make_unique<DesktopApplicationRegistry>(std::move(folders), std::move(languages));
 }
 
 } // namespace tarn

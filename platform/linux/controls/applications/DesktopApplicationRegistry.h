@@ -1,6 +1,7 @@
 #pragma once
 
 #include <filesystem>
+#include <memory>
 #include <string>
 #include <vector>
 
@@ -46,5 +47,8 @@ private:
     const std::vector<std::string> languages_;
     MutexProtected<ApplicationIndex> index_;
 };
+
+/// The registry of the running user: the data folders of the environment, names in `languages`.
+std::unique_ptr<DesktopApplicationRegistry> systemApplicationRegistry(std::vector<std::string> languages);
 
 } // namespace tarn
