@@ -36,6 +36,11 @@ RegistrationHandle ThreadLoop::at(std::chrono::nanoseconds time, std::function<v
     return std::make_unique<Timer>(std::move(shared));
 }
 
+void ThreadLoop::finishPosted() {
+    std::unique_lock lock(mutex_);
+    idle_.wait(lock, [this] { return posted_.empty() && !busy_; });
+}
+
 void ThreadLoop::finish() {
     if (!thread_.joinable())
         return;
@@ -64,10 +69,13 @@ void ThreadLoop::run() {
         if (!posted_.empty()) {
             Work work = std::move(posted_.front());
             posted_.pop_front();
+            busy_ = true;
             lock.unlock();
             work();
             work = nullptr;
             lock.lock();
+            busy_ = false;
+            idle_.notify_all();
         } else if (finishing_) {
             return;
         } else if (auto timer = dueTimer()) {

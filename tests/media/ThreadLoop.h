@@ -22,6 +22,9 @@ public:
     bool isCurrent() const override { return std::this_thread::get_id() == thread_.get_id(); }
     std::chrono::nanoseconds now() const override;
 
+    /// Waits until what has been posted, and what that posts, has run.
+    void finishPosted();
+
     /// Runs what has been posted and ends the thread.
     void finish();
 
@@ -33,8 +36,10 @@ private:
 
     std::mutex mutex_;
     std::condition_variable changed_;
+    std::condition_variable idle_;
     std::deque<Work> posted_;
     std::multimap<std::chrono::nanoseconds, std::weak_ptr<Work>> timers_;
+    bool busy_ = false;
     bool finishing_ = false;
     std::thread thread_;
 };

@@ -70,7 +70,7 @@ void CoreMediaItem::post(std::string_view notification) {
         {.name = notification, .sender = static_cast<MediaItem*>(this), .info = {}});
 }
 
-ObservedValue CoreMediaItem::read(std::string_view keyPath) const {
+ObservedValue CoreMediaItem::read([[maybe_unused]] std::string_view keyPath) const {
     assert(keyPath == statusKeyPath);
     return static_cast<std::int64_t>(status());
 }

@@ -15,7 +15,9 @@ struct PcmFormat {
     std::uint32_t rate = 44100;
     std::uint32_t channels = 2;
 
-    std::size_t bytesPerFrame() const { return channels * (sample == SampleFormat::s16 ? 2u : 4u); }
+    std::size_t bytesPerFrame() const {
+        return std::size_t{channels} * (sample == SampleFormat::s16 ? 2U : 4U);
+    }
     bool operator==(const PcmFormat&) const = default;
 };
 
