@@ -3,9 +3,7 @@
 #include <deque>
 #include <functional>
 #include <memory>
-#include <semaphore>
 #include <string>
-#include <thread>
 #include <vector>
 
 namespace tarn {
@@ -26,21 +24,21 @@ struct SimulatedLane {
     SimulatedActivity* holder = nullptr;
 };
 
-/// A stack that the scheduler can leave and come back to. Runs only while it has the baton, which is passed
-/// from one to the next.
+/// A stack that the scheduler can leave and come back to.
 class SimulatedActivity {
 public:
-    /// The stack of the calling thread, which has the baton.
-    SimulatedActivity() = default;
+    /// The stack of the caller.
+    SimulatedActivity();
 
-    /// A stack of its own, for the work of lanes.
+    /// A stack of its own, for the work of lanes. It begins when it is switched to.
     explicit SimulatedActivity(SimulatedScheduler& scheduler);
 
     /// It must not be inside any lane.
     ~SimulatedActivity();
 
-    void giveBaton() { baton_.release(); }
-    void awaitBaton() { baton_.acquire(); }
+    /// Goes on with `next` where that was left; returns when something switches back to this one, which is
+    /// the running one.
+    void switchTo(SimulatedActivity& next);
 
     /// The lanes whose work it is in, innermost last.
     std::vector<const SimulatedLane*> inside;
@@ -48,14 +46,17 @@ public:
     /// The lane for whose turn it waits.
     const SimulatedLane* waitsFor = nullptr;
 
-    /// For a spare activity: the lane to begin with; none ends it.
+    /// For a spare activity: the lane to begin with.
     std::shared_ptr<SimulatedLane> first;
 
 private:
-    void run(SimulatedScheduler& scheduler);
+    struct Stack;
 
-    std::binary_semaphore baton_{0};
-    std::thread thread_;
+    static void begin(unsigned high, unsigned low);
+    [[noreturn]] void run();
+
+    SimulatedScheduler* const scheduler_;
+    const std::unique_ptr<Stack> stack_;
 };
 
 } // namespace tarn

@@ -140,8 +140,7 @@ void SimulatedScheduler::leave() {
         next.activity->first = std::move(next.lane);
     }
     current_ = next.activity;
-    next.activity->giveBaton();
-    self.awaitBaton();
+    self.switchTo(*next.activity);
 }
 
 void SimulatedScheduler::wake(SimulatedActivity& activity) { ready_.push_back(&activity); }

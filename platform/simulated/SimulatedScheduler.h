@@ -25,8 +25,8 @@ struct SimulatedLane;
 /// is the same one again. Time stands still while anything can run, and then jumps to the next timer or
 /// deadline. Queues that wait for each other in a circle end the process with a report.
 ///
-/// Work that is left keeps its stack, which is a thread of its own; only one of them ever runs. Used by the
-/// thread that made it (the test) and by the work that it runs.
+/// Work that is left keeps a stack of its own. There is one thread, that of the test: nothing races, and a
+/// loaded machine does not slow it down.
 class SimulatedScheduler {
 public:
     using Time = std::chrono::nanoseconds;
