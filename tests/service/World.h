@@ -18,7 +18,7 @@ namespace tarn {
 /// The service on the scheduler: a seed is one interleaving.
 class SimulatedWorld {
 public:
-    static constexpr int rounds = 1000;
+    static constexpr int rounds = 1300; // of each of the eight stories
 
     explicit SimulatedWorld(std::uint64_t seed);
     ~SimulatedWorld();
