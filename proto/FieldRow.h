@@ -29,14 +29,18 @@ template <class Value>
 concept WireText =
     OneOf<Value, std::optional<std::string>, std::optional<Data>, Boxed<std::string>, Boxed<Data>>;
 
-/// How a message holds a repeated field: an emptied list differs from one that was never made.
-template <class Element>
-using WireList = std::optional<std::vector<Element>>;
-
 /// How a message holds an embedded message: shared, so that a payload can be stored in several.
 template <class Value>
 concept WireMessage = std::derived_from<typename Value::element_type, ProtoCodable> &&
     std::same_as<Value, std::shared_ptr<typename Value::element_type>>;
+
+/// What a repeated field consists of.
+template <class Value>
+concept WireElement = std::same_as<Value, std::string> || WireMessage<Value>;
+
+/// How a message holds a repeated field: an emptied list differs from one that was never made.
+template <WireElement Element>
+using WireList = std::optional<std::vector<Element>>;
 
 template <class Value>
 concept WireMessageList = WireMessage<typename Value::value_type::value_type> &&

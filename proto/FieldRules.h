@@ -119,7 +119,7 @@ bool carries(const Object& value) {
     return holds(value);
 }
 
-template <class Element>
+template <WireElement Element>
 bool carries(const WireList<Element>& value) {
     return value && !value->empty();
 }
@@ -160,7 +160,7 @@ void merge(std::shared_ptr<Embedded>& value, const std::shared_ptr<Embedded>& ot
         value = other;
 }
 
-template <class Element>
+template <WireElement Element>
 void merge(WireList<Element>& value, const WireList<Element>& other) {
     const std::vector<Element> added = *other; // the two may be one list
     if (!value)
