@@ -37,6 +37,7 @@ TEST_F(Edit, OfWhatComesNextLeavesWhatPlaysAlone) {
                             "10.000-20.000 x 0.000..10.000\n"
                             "20.000-30.000 c 0.000..10.000\n"
                             "30.000-40.000 b 0.000..10.000\n");
+    EXPECT_EQ(test.platform.media.speaker().blends(), 0U);
 }
 
 TEST_F(Edit, ThatComesTooLateIsHeardForAMoment) {
@@ -72,6 +73,7 @@ TEST_F(Edit, OfTheCurrentItemActsAtOnce) {
                             "3.100-5.100 b 0.000..2.000\n"
                             "5.100-7.100 c 0.000..2.000\n"
                             "7.100-8.000 x 0.000..0.900\n");
+    EXPECT_EQ(test.platform.media.speaker().blends(), 3U);
 }
 
 TEST_F(Edit, ThatEmptiesTheQueueKeepsTheRate) {

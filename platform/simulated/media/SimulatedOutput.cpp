@@ -127,7 +127,9 @@ void SimulatedOutput::write(const PcmBuffer& buffer) {
     setWritableTimer();
 }
 
-void SimulatedOutput::rewind(std::int64_t index, Join) {
+void SimulatedOutput::rewind(std::int64_t index, Join join) {
+    if (join == Join::blended)
+        ++speaker_.blends_;
     {
         std::lock_guard lock(mutex_);
         assert(index <= writeIndex_);

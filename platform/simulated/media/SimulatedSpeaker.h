@@ -44,6 +44,9 @@ public:
     /// Everything heard so far, adjoining stretches joined.
     std::vector<Heard> heard();
 
+    /// How often frames were taken back in the middle of something, so that a blend was asked for.
+    std::size_t blends() const { return blends_; }
+
     /// Every output breaks off and begins anew / loses its device.
     void reset();
     void loseDevice();
@@ -61,6 +64,7 @@ private:
     PlayerLoop& loop_;
     std::atomic<std::chrono::nanoseconds> latency_{std::chrono::nanoseconds(0)};
     std::atomic<bool> listening_ = false;
+    std::atomic<std::size_t> blends_ = 0;
     MutexProtected<std::vector<SimulatedOutput*>> outputs_;
     MutexProtected<std::vector<Heard>> heard_;
 };
