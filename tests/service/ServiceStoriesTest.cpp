@@ -122,6 +122,54 @@ TYPED_TEST(ServiceStory, ANewClientReplacesTheOldOneWhichIsLeftOpen) {
     });
 }
 
+TYPED_TEST(ServiceStory, CommandsThatWaitWhenTheirClientIsReplacedAreCancelled) {
+    this->inEveryWorld([this](auto& world) {
+        SimulatedClient first(world.listeners());
+        first.call(commands::getCurrentTime("unknown"));
+        world.settle();
+        auto gate = world.clock().makeSignal();
+        world.service().commandServiceQueue()->async(
+            [gate] { EXPECT_TRUE(gate->wait(std::chrono::seconds(60))); });
+        for (int i = 0; i < 3; ++i)
+            first.call(commands::getCurrentTime("unknown"));
+        world.listeners().settle();
+        SimulatedClient second(world.listeners());
+        second.call(commands::getCurrentTime("unknown"));
+        while (world.service()._connectionIsValid())
+            world.progress();
+        gate->signal();
+        world.settle();
+        EXPECT_THAT(this->outcomes(first, 4), ElementsAre("error 26", "error 25", "error 25", "error 25"));
+        EXPECT_EQ(second.outcome(1), "error 26");
+    });
+}
+
+TYPED_TEST(ServiceStory, ALateAnswerGoesToTheConnectionThatItsCallCameFrom) {
+    this->inEveryWorld([this](auto& world) {
+        auto& service = world.service();
+        SimulatedClient first(world.listeners());
+        first.call(commands::getCurrentTime("unknown"));
+        world.settle();
+        std::shared_ptr<SerialQueue> items;
+        service.commandServiceQueue()->sync(
+            [&] { items = service.audioFilePlayerServer()->playerItemManagerQueue(); });
+        auto gate = world.clock().makeSignal();
+        items->async([gate] { EXPECT_TRUE(gate->wait(std::chrono::seconds(60))); });
+        first.call(commands::getCurrentTime("unknown"));
+        world.listeners().settle();
+        service.commandServiceQueue()->sync([] {});
+        SimulatedClient second(world.listeners());
+        second.call(commands::getCurrentTime("unknown"));
+        while (second.outcome(1).empty())
+            world.progress(); // the replacement does not wait for the manager
+        EXPECT_EQ(first.outcome(2), "");
+        gate->signal();
+        items->sync([] {});
+        EXPECT_THAT(this->outcomes(first, 2), ElementsAre("error 26", "error 26"));
+        EXPECT_THAT(second.transcript(), ElementsAre("1: error 26"));
+    });
+}
+
 TYPED_TEST(ServiceStory, AClientThatIsBackAtOnceIsServed) {
     this->inEveryWorld([this](auto& world) {
         for (int round = 0; round < 3; ++round) {

@@ -18,7 +18,7 @@ namespace tarn {
 /// The service on the scheduler: a seed is one interleaving.
 class SimulatedWorld {
 public:
-    static constexpr int rounds = 1300; // of each of the eight stories
+    static constexpr int rounds = 1050; // of each of the ten stories
 
     explicit SimulatedWorld(std::uint64_t seed);
     ~SimulatedWorld();
@@ -31,6 +31,11 @@ public:
     std::shared_ptr<SerialQueue> createQueue(const std::string& label) {
         return platform_.queues.create(label);
     }
+
+    Clock& clock() { return platform_.clock; }
+
+    /// Lets something happen; to be called until what the test waits for has.
+    void progress() { settle(); }
 
     /// Lets part of what can happen now happen before the test goes on.
     void linger();
@@ -56,6 +61,8 @@ public:
     SimulatedNowPlayingService& nowPlaying() { return nowPlaying_; }
     std::size_t random(std::size_t limit) { return (random_ += 0x9e3779b97f4a7c15u) / 257 % limit; }
     std::shared_ptr<SerialQueue> createQueue(const std::string& label) { return queues_.create(label); }
+    Clock& clock() { return clock_; }
+    void progress() { std::this_thread::yield(); }
     void linger();
     void settle();
 
