@@ -1,0 +1,136 @@
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <sys/wait.h>
+
+#include <thread>
+#include <variant>
+
+#include "tests/system/transport/ServiceUnderTest.h"
+
+namespace tarn {
+namespace {
+
+using client::Client;
+using client::Outcome;
+
+TEST(Clients, AreServedOneAfterTheOther) {
+    ServiceUnderTest service;
+    const auto song = service.song();
+    for (int i = 0; i < 3; ++i) {
+        Client client(service.options());
+        EXPECT_TRUE(isServed(client, song));
+    }
+    EXPECT_EQ(service.stop(), 0);
+}
+
+TEST(Clients, ANewOneFindsNothingOfTheOneBeforeWhichIsToldNothingMore) {
+    ServiceUnderTest service;
+    const auto song = service.song();
+    Client first(service.options());
+    ASSERT_TRUE(isServed(first, song));
+    Client second(service.options());
+    const auto position = second.currentTime("item").get();
+    EXPECT_EQ(position.outcome, Outcome::failed);
+    EXPECT_EQ(position.error.code, 26);
+    EXPECT_TRUE(isServed(second, song));
+
+    while (const auto event = first.nextEvent(std::chrono::milliseconds(0)))
+        EXPECT_FALSE(std::holds_alternative<client::ConnectionLost>(*event));
+    EXPECT_EQ(first.currentTime("none").get().outcome, Outcome::failed) << "it stays open and is answered";
+}
+
+TEST(Clients, EveryCommandSentAheadOfAReplacementEndsOnce) {
+    constexpr int commands = 500;
+    ServiceUnderTest service;
+    Client first(service.options());
+    std::vector<std::future<client::Completion>> ends;
+    for (int i = 0; i < commands; ++i)
+        ends.push_back(first.destroyAsset("none"));
+    Client second(service.options());
+    for (auto& end : ends) {
+        const auto completion = end.get();
+        if (completion.outcome == Outcome::failed)
+            EXPECT_EQ(completion.error.code, 25);
+        else
+            EXPECT_EQ(completion.outcome, Outcome::released);
+    }
+    EXPECT_TRUE(isServed(second, service.song()));
+}
+
+TEST(Clients, OneThatDiesAndComesBackAtOnceIsServed) {
+    constexpr int lives = 30;
+    ServiceUnderTest service;
+    const auto path = service.socketPath();
+    for (int i = 0; i < lives; ++i) {
+        const pid_t child = ::fork();
+        if (child == 0) {
+            // As a client that is killed in the middle of its work.
+            const RawClient doomed(path);
+            for (int k = 0; k < 20; ++k)
+                doomed.send(FrameKind::call, 1);
+            ::kill(::getpid(), SIGKILL);
+        }
+        ASSERT_EQ(::waitpid(child, nullptr, 0), child);
+        Client client(service.options());
+        ASSERT_EQ(client.destroyAsset("none").get().outcome, Outcome::released) << i;
+    }
+}
+
+TEST(Clients, ReplacingEachOtherLeaveNothingBehind) {
+    constexpr int warmUp = 20; // what is made once, at the first need, stays
+    constexpr int replacements = 200;
+    ServiceUnderTest service;
+    const auto song = service.song();
+    Client client(service.options());
+    std::size_t files = 0;
+    std::size_t threads = 0;
+    for (int i = 0; i < replacements; ++i) {
+        ASSERT_TRUE(isServed(client, song));
+        ASSERT_EQ(client.upsertQueuePlayer("player", {"item"}).get().outcome, Outcome::answered);
+        client.reconnect();
+        ASSERT_EQ(client.destroyAsset("none").get().outcome, Outcome::released);
+        if (i == warmUp) {
+            files = service.openFiles();
+            threads = service.threads();
+        }
+    }
+    // One of each may come and go in the background.
+    EXPECT_LE(service.openFiles(), files + 2);
+    EXPECT_LE(service.threads(), threads + 2);
+}
+
+TEST(Clients, ALostServiceEndsEveryCallAndServesThemWhenItIsBack) {
+    ServiceUnderTest service;
+    const auto song = service.song();
+    Client client(service.options());
+    ASSERT_TRUE(isServed(client, song));
+    service.kill();
+    while (const auto event = client.nextEvent())
+        if (std::holds_alternative<client::ConnectionLost>(*event))
+            break;
+    EXPECT_EQ(client.currentTime("item").get().outcome, Outcome::connectionLost);
+    EXPECT_THROW(client.reconnect(), std::system_error);
+    service.start(); // over the socket file that the killed one left
+    client.reconnect();
+    EXPECT_TRUE(isServed(client, song));
+}
+
+TEST(Clients, ALentFileIsReadThroughItsTokenOnce) {
+    ServiceUnderTest service;
+    const auto song = service.song();
+    const auto path = (service.folder() / "song.wav").string();
+    Client client(service.options());
+    const auto token = client.grantFile(path);
+    // The service opens the path itself no more: only the lent file is left.
+    std::filesystem::rename(path, path + ".moved");
+    EXPECT_EQ(
+        client.upsertAsset({.identifier = "a", .URL = song, .sandboxExtensionToken = token}).get().outcome,
+        Outcome::answered);
+    EXPECT_EQ(
+        client.upsertAsset({.identifier = "a", .URL = song, .sandboxExtensionToken = token}).get().outcome,
+        Outcome::failed);
+}
+
+} // namespace
+} // namespace tarn

@@ -1,0 +1,53 @@
+#pragma once
+
+#include <memory>
+#include <string>
+
+#include <tarn/Client.h>
+
+#include "tests/ipc/RawClient.h"
+#include "tests/support/ChildProcess.h"
+#include "tests/support/TemporaryFolder.h"
+
+namespace tarn {
+
+/// A real tarnd on a socket of its own, without sound server and bus, and what tests do with it.
+class ServiceUnderTest {
+public:
+    ServiceUnderTest() { start(); }
+
+    /// Starts it, after stop() or kill() again, and waits until it is ready.
+    void start();
+
+    /// Asks for its end; its exit status.
+    int stop(int signal = SIGTERM);
+    void kill();
+
+    std::string socketPath() const { return (folder_ / "ostrel.tarnd").string(); }
+    ChildProcess& process() { return *process_; }
+    const TemporaryFolder& folder() const { return folder_; }
+
+    client::Client::Options options() const { return {.socketPath = socketPath()}; }
+    RawClient connectRaw() const { return RawClient(socketPath()); }
+
+    /// Waits for an error line; false when the deadline passes without one.
+    bool logs(const char* text) { return process_->readUntil(text); }
+
+    std::size_t openFiles() const;
+    std::size_t threads() const;
+
+    /// A second of silence, and its URL.
+    std::string song() const;
+
+private:
+    std::size_t entriesOf(const char* folder) const;
+
+    TemporaryFolder folder_;
+    std::unique_ptr<ChildProcess> process_;
+};
+
+/// Whether the service carries out commands of this client: makes an item of the song and asks for its
+/// position.
+bool isServed(client::Client& client, const std::string& songURL);
+
+} // namespace tarn
