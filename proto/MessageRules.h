@@ -46,10 +46,10 @@ bool Message<Class>::readFrom(ProtoReader& reader) {
 template <class Class>
 bool Message<Class>::readField(ProtoReader& reader, ProtoKey key) {
     bool goesOn = false;
-    const auto readIfIts = [&](const auto& row) {
+    const auto readIfIts = [&]<class Row>(const Row& row) {
         if (row.number != key.fieldNumber)
             return false;
-        if constexpr (row.hasPresenceFlag)
+        if constexpr (Row::hasPresenceFlag)
             presence_.set(row.number);
         goesOn = fieldRules::read(reader, self().*row.member);
         return true;
@@ -62,7 +62,7 @@ bool Message<Class>::readField(ProtoReader& reader, ProtoKey key) {
 template <class Class>
 template <class Row>
 bool Message<Class>::hasValue(const Row& row) const {
-    if constexpr (row.hasPresenceFlag)
+    if constexpr (Row::hasPresenceFlag)
         return presence_[row.number];
     else if constexpr (WireScalar<typename Row::Value>)
         return true;
@@ -82,7 +82,7 @@ bool Message<Class>::isCarried(const Row& row) const {
 
 template <class Class>
 void Message<Class>::writeTo(ProtoWriter& writer) const {
-    forEachRow<Class>([&](const auto& row) {
+    forEachRow<Class>([&]<class Row>(const Row& row) {
         if (row.isRequired || hasValue(row))
             fieldRules::write(writer, row.number, self().*row.member);
     });
@@ -90,11 +90,11 @@ void Message<Class>::writeTo(ProtoWriter& writer) const {
 
 template <class Class>
 void Message<Class>::copyTo(Class& other) const {
-    forEachRow<Class>([&](const auto& row) {
+    forEachRow<Class>([&]<class Row>(const Row& row) {
         if (!row.isRequired && !isCarried(row))
             return;
         other.*row.member = self().*row.member;
-        if constexpr (row.hasPresenceFlag)
+        if constexpr (Row::hasPresenceFlag)
             other.presence_.set(row.number);
     });
 }
@@ -102,11 +102,11 @@ void Message<Class>::copyTo(Class& other) const {
 template <class Class>
 std::shared_ptr<Class> Message<Class>::copyWithZone() const {
     auto copy = newMessage<Class>();
-    forEachRow<Class>([&](const auto& row) {
+    forEachRow<Class>([&]<class Row>(const Row& row) {
         if (!isCarried(row))
             return;
         (*copy).*row.member = fieldRules::deepCopy(self().*row.member);
-        if constexpr (row.hasPresenceFlag)
+        if constexpr (Row::hasPresenceFlag)
             copy->presence_.set(row.number);
     });
     return copy;
@@ -114,11 +114,11 @@ std::shared_ptr<Class> Message<Class>::copyWithZone() const {
 
 template <class Class>
 void Message<Class>::mergeFrom(const Class& other) {
-    forEachRow<Class>([&](const auto& row) {
+    forEachRow<Class>([&]<class Row>(const Row& row) {
         if (!other.isCarried(row))
             return;
         fieldRules::merge(self().*row.member, other.*row.member);
-        if constexpr (row.hasPresenceFlag)
+        if constexpr (Row::hasPresenceFlag)
             presence_.set(row.number);
     });
 }
@@ -126,7 +126,7 @@ void Message<Class>::mergeFrom(const Class& other) {
 template <class Class>
 template <class Row>
 bool Message<Class>::isEqualIn(const Row& row, const Class& other) const {
-    if constexpr (row.hasPresenceFlag) {
+    if constexpr (Row::hasPresenceFlag) {
         if (!hasValue(row) || !other.hasValue(row))
             return hasValue(row) == other.hasValue(row);
     }
@@ -144,7 +144,7 @@ bool Message<Class>::isEqual(const ProtoCodable& other) const {
 template <class Class>
 std::uint32_t Message<Class>::hash() const {
     std::uint32_t result = 0;
-    forEachRow<Class>([&](const auto& row) {
+    forEachRow<Class>([&]<class Row>(const Row& row) {
         if (hasValue(row))
             result ^= fieldRules::hash(self().*row.member);
     });
@@ -154,7 +154,7 @@ std::uint32_t Message<Class>::hash() const {
 template <class Class>
 Dictionary Message<Class>::dictionaryRepresentation() const {
     Dictionary dictionary;
-    forEachRow<Class>([&](const auto& row) {
+    forEachRow<Class>([&]<class Row>(const Row& row) {
         if (hasValue(row))
             fieldRules::put(dictionary, row.name, self().*row.member);
     });
