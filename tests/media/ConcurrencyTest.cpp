@@ -17,13 +17,17 @@ namespace {
 class Meddler {
 public:
     Meddler(std::uint64_t seed, std::vector<std::shared_ptr<MediaItem>> items, AudioSession& session,
-            NotificationCenter& notifications)
-        : engine_(seed), items_(std::move(items)), session_(session), notifications_(notifications) {}
+            NotificationCenter& notifications, SimulatedSpeaker& speaker)
+        : engine_(seed),
+          items_(std::move(items)),
+          session_(session),
+          notifications_(notifications),
+          speaker_(speaker) {}
 
     void meddle(MediaQueuePlayer& player) {
         static constexpr float rates[] = {0.0F, 1.0F, 1.0F, 2.0F, 0.5F, -1.0F, -0.25F, 30.0F};
         const auto& item = items_[pick(items_.size())];
-        switch (pick(12)) {
+        switch (pick(13)) {
         case 0:
             return player.setRate(rates[pick(std::size(rates))]);
         case 1:
@@ -42,6 +46,8 @@ public:
             return item->seekToTime({static_cast<std::int64_t>(pick(9000)), 1000});
         case 8:
             return interrupt();
+        case 9:
+            return speaker_.reset();
         default:
             return player.insertItem(item, items_[pick(items_.size())]);
         }
@@ -60,6 +66,7 @@ private:
     const std::vector<std::shared_ptr<MediaItem>> items_;
     AudioSession& session_;
     NotificationCenter& notifications_;
+    SimulatedSpeaker& speaker_;
 };
 
 class SeededPlayer : public testing::TestWithParam<int> {};
@@ -80,7 +87,7 @@ TEST_P(SeededPlayer, SaysWhatIsHeard) {
     items.push_back(test.item("short", 20ms));
     test.play({items[0], items[1]});
     Meddler meddler(scheduler.random(1U << 30), items, test.platform.audioSession,
-                    test.platform.notifications);
+                    test.platform.notifications, test.platform.media.speaker());
     std::vector<std::shared_ptr<SimulatedQueue>> threads;
     for (int i = 0; i < 3; ++i)
         threads.push_back(scheduler.createQueue("thread"));
@@ -127,7 +134,7 @@ TEST(Threads, ShareItemsAndPlayers) {
         for (int i = 0; i < 6; ++i)
             items.push_back(engine.makeItem(asset));
         auto meddle = [&](std::uint64_t seed) {
-            Meddler meddler(seed, items, session, notifications);
+            Meddler meddler(seed, items, session, notifications, engine.speaker());
             for (int life = 0; life < 20; ++life) {
                 auto player = engine.makeQueuePlayer(items);
                 player->setAudioSession(session);

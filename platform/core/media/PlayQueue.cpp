@@ -102,7 +102,10 @@ bool PlayQueue::interrupt() {
     return true;
 }
 
-std::optional<PlayQueue::Rewind> PlayQueue::reconcile(std::int64_t firstReplaceable) {
+std::optional<PlayQueue::Rewind> PlayQueue::reconcile(std::int64_t firstReplaceable,
+                                                      std::int64_t writeIndex) {
+    if (const auto& spans = timeline_.spans(); !spans.empty() && spans.back().endFrame > writeIndex)
+        timeline_.cut(writeIndex);
     std::optional<Rewind> rewind = dropDiverged(firstReplaceable);
     auto entry = entries_.begin();
     for (int reach = 0; reach < 2 && entry != entries_.end(); ++reach, ++entry)

@@ -60,17 +60,15 @@ public:
     /// Whose clock says what is heard; null before there is one.
     void setClock(const Output* output) { clock_ = output; }
 
-    /// What was written and not heard is lost; writing goes on at `writeIndex`.
-    void outputWasReset(std::int64_t writeIndex) { timeline_.cut(writeIndex); }
-
     struct Rewind {
         std::int64_t frame;
         Output::Join join;
     };
 
     /// Compares what is rendered with what is to be heard. The answer, if any, is what the output has to take
-    /// back; nothing before `firstReplaceable` is.
-    std::optional<Rewind> reconcile(std::int64_t firstReplaceable);
+    /// back; nothing before `firstReplaceable` is. What the output has lost by itself lies behind
+    /// `writeIndex`, where writing goes on.
+    std::optional<Rewind> reconcile(std::int64_t firstReplaceable, std::int64_t writeIndex);
 
     struct Head {
         EntryId entry;

@@ -83,12 +83,6 @@ void Playback::shutDown() {
     renderings_.keepOnly(0, 0);
 }
 
-void Playback::outputWasReset() {
-    EngineLock lock(environment_);
-    queue_.outputWasReset(output_->writeIndex());
-    schedule();
-}
-
 void Playback::outputDeviceVanished() {
     if (auto listener = listener_.lock())
         listener->deviceVanished();
@@ -173,7 +167,7 @@ bool Playback::prepareOutput() {
     EngineLock lock(environment_);
     if (!queue_.playing())
         return false;
-    auto rewind = queue_.reconcile(output_->firstReplaceable());
+    auto rewind = queue_.reconcile(output_->firstReplaceable(), output_->writeIndex());
     if (rewind && rewind->frame < output_->writeIndex())
         output_->rewind(rewind->frame, rewind->join);
     return true;

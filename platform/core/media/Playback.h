@@ -50,7 +50,7 @@ private:
     };
 
     void outputIsWritable() override { scheduleLocking(); }
-    void outputWasReset() override;
+    void outputWasReset() override { scheduleLocking(); }
     void outputDeviceVanished() override;
 
     void schedule();

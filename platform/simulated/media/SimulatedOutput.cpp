@@ -160,7 +160,7 @@ void SimulatedOutput::reset() {
         settleHeard();
         takeBack(heard());
     }
-    listener_.outputWasReset();
+    resetReport_ = loop_.at(loop_.now(), [this] { listener_.outputWasReset(); }); // as late as can be
 }
 
 void SimulatedOutput::setWritableTimer() {

@@ -64,6 +64,7 @@ private:
     std::deque<Sound> sounds_; // not heard yet
 
     RegistrationHandle writableTimer_;
+    RegistrationHandle resetReport_;
 };
 
 } // namespace tarn
