@@ -80,7 +80,7 @@ TEST(ObservationTest, TheBlockMayEndItsOwnRegistrationOrOutliveItsObject) {
 
 // A stale value reported last would stay with the client for ever.
 TEST(ObservationTest, TheLastReportIsTheLastValueHoweverRegistrationAndChangesMeet) {
-    constexpr int rounds = 20'000;
+    constexpr int rounds = 4'000;
     std::unique_ptr<Subject> subject;
     std::barrier barrier(3);
     auto change = [&](std::int64_t first) {
