@@ -1,0 +1,192 @@
+#include <gmock/gmock.h>
+
+#include <tarn/Client.h>
+
+#include "tests/support/AudioFixture.h"
+#include "tests/system/controls/BusListener.h"
+#include "tests/system/controls/PrivateBus.h"
+#include "tests/system/controls/RunningService.h"
+#include "tests/system/sound/SoundServerProcess.h"
+
+namespace tarn {
+namespace {
+
+using std::chrono::milliseconds;
+using std::chrono::seconds;
+using testing::Contains;
+using testing::IsEmpty;
+using testing::Not;
+
+constexpr char statusChanged[] = "Player: PlaybackStatus";
+constexpr char trackChanged[] = "Player: PlaybackStatus Metadata";
+
+/// The service as users have it: a sound server, a session bus, a client, and the desktop's tools.
+class ServiceTest : public testing::Test {
+protected:
+    std::vector<std::string> serviceEnvironment() const {
+        std::vector<std::string> environment = sound_.environment();
+        environment.push_back(bus_.environment());
+        return environment;
+    }
+
+    /// Two tracks of ten seconds in a queue player.
+    void mirrorAlbum(const std::string& player = "album,org.example.MusicBox") {
+        for (const std::string title : {"First", "Second"}) {
+            const auto path = service_.folder() / (title + ".wav");
+            writeWav(path, makeSweep(441'000, 44'100, 2));
+            const auto asset = client_.upsertAsset({.identifier = title,
+                                                    .URL = client::fileURL(path),
+                                                    .title = title,
+                                                    .albumTitle = "Songs",
+                                                    .artist = "Someone"});
+            ASSERT_TRUE(wait(asset));
+            ASSERT_TRUE(wait(client_.upsertItem(title, title)));
+        }
+        ASSERT_TRUE(wait(client_.upsertQueuePlayer(player, {"First", "Second"})));
+        ASSERT_TRUE(listener_.waitForPlayer());
+    }
+
+    template <class Future>
+    static bool wait(const Future& future) {
+        return future.wait_for(seconds(20)) == std::future_status::ready;
+    }
+
+    CommandResult playerctl(std::vector<std::string> arguments) const {
+        arguments.insert(arguments.begin(), {"playerctl", "--player=tarnd"});
+        return runCommand(arguments, {bus_.environment()});
+    }
+
+    std::string status() const { return playerctl({"status"}).output; }
+
+    void play() {
+        ASSERT_EQ(listener_.call("Play"), "");
+        ASSERT_EQ(listener_.next(), statusChanged);
+        ASSERT_EQ(status(), "Playing\n");
+    }
+
+    std::unique_ptr<ChildProcess> call() const {
+        return std::make_unique<ChildProcess>(std::vector<std::string>{"pacat", "--property=media.role=phone",
+                                                                       "--raw", "--device=out", "/dev/zero"},
+                                              sound_.environment());
+    }
+
+    SoundServerProcess sound_{{"module-role-cork"}};
+    PrivateBus bus_;
+    RunningService service_{serviceEnvironment()};
+    client::Client client_{{.socketPath = service_.socketPath()}};
+    BusListener listener_{bus_.address()};
+};
+
+TEST_F(ServiceTest, PlayerctlControlsAnAlbum) {
+    mirrorAlbum();
+    EXPECT_EQ(status(), "Paused\n");
+    EXPECT_EQ(playerctl({"metadata", "--format", "{{artist}}|{{album}}|{{title}}|{{mpris:length}}"}).output,
+              "Someone|Songs|First|10000000\n");
+
+    EXPECT_EQ(playerctl({"play"}).status, 0);
+    EXPECT_EQ(listener_.next(), statusChanged);
+    EXPECT_EQ(status(), "Playing\n");
+    EXPECT_EQ(playerctl({"play-pause"}).status, 0);
+    EXPECT_EQ(listener_.next(), statusChanged);
+    EXPECT_EQ(status(), "Paused\n");
+
+    EXPECT_EQ(playerctl({"next"}).status, 0);
+    EXPECT_EQ(listener_.next(), trackChanged);
+    EXPECT_EQ(playerctl({"metadata", "title"}).output, "Second\n");
+    EXPECT_EQ(status(), "Paused\n");
+    EXPECT_NE(playerctl({"previous"}).status, 0);
+
+    EXPECT_NE(playerctl({"next"}).status, 0); // there is nothing more
+    EXPECT_EQ(status(), "Stopped\n");
+    ASSERT_TRUE(wait(client_.destroyQueuePlayer("album,org.example.MusicBox")));
+    EXPECT_THAT(listener_.until("vanished"), Not(Contains(trackChanged)));
+}
+
+TEST_F(ServiceTest, EveryEventIsSignalledOnce) {
+    mirrorAlbum();
+    ASSERT_TRUE(wait(client_.setRate("album,org.example.MusicBox", 1)));
+    EXPECT_EQ(listener_.next(), statusChanged);
+    ASSERT_TRUE(wait(client_.setRate("album,org.example.MusicBox", 2)));
+    EXPECT_EQ(listener_.next(), "Player: Rate MaximumRate");
+    EXPECT_EQ(listener_.next(milliseconds(1000)), std::nullopt);
+    ASSERT_TRUE(wait(client_.advanceToNextItem("album,org.example.MusicBox")));
+    EXPECT_EQ(listener_.next(), trackChanged);
+    ASSERT_TRUE(wait(client_.setCurrentTime("Second", 5))); // is published with the next change only
+    ASSERT_TRUE(wait(client_.setRate("album,org.example.MusicBox", 0)));
+    EXPECT_EQ(listener_.next(), "Player: PlaybackStatus Rate MaximumRate");
+    const auto seeked = listener_.next();
+    ASSERT_TRUE(seeked && seeked->starts_with("Seeked 5")) << seeked.value_or("none");
+    ASSERT_TRUE(wait(client_.removeAllItems("album,org.example.MusicBox")));
+    EXPECT_EQ(listener_.next(), "Player: PlaybackStatus Metadata CanGoNext CanPlay CanPause");
+    ASSERT_TRUE(wait(client_.destroyQueuePlayer("album,org.example.MusicBox")));
+    EXPECT_EQ(listener_.next(), "vanished");
+}
+
+TEST_F(ServiceTest, TheContainingApplicationIsShown) {
+    mirrorAlbum("album,org.example.MusicBox.watch");
+    const auto identity =
+        runCommand({"busctl", "--address=" + bus_.address(), "get-property", BusListener::playerName,
+                    "/org/mpris/MediaPlayer2", "org.mpris.MediaPlayer2", "Identity"});
+    EXPECT_EQ(identity.output, "s \"Music Box\"\n");
+}
+
+TEST_F(ServiceTest, TheBusDiesAndComesBackWhileItPlays) {
+    mirrorAlbum();
+    play();
+    for (int round = 0; round < 20; ++round) {
+        bus_.kill();
+        bus_.start();
+        BusListener listener(bus_.address());
+        ASSERT_TRUE(listener.waitForPlayer(seconds(2))) << round;
+        EXPECT_EQ(listener.readAllProperties(), 20);
+    }
+    EXPECT_EQ(status(), "Playing\n");
+    EXPECT_EQ(playerctl({"pause"}).status, 0);
+    EXPECT_EQ(status(), "Paused\n");
+}
+
+TEST_F(ServiceTest, ACallInterruptsWhatPlays) {
+    mirrorAlbum();
+    play();
+    for (int round = 0; round < 2; ++round) {
+        auto phone = call();
+        EXPECT_EQ(listener_.next(), statusChanged);
+        EXPECT_EQ(status(), "Paused\n");
+        phone.reset();
+        EXPECT_EQ(listener_.next(), statusChanged);
+        EXPECT_EQ(status(), "Playing\n");
+    }
+}
+
+TEST_F(ServiceTest, ACallLeavesWhatIsPausedAlone) {
+    mirrorAlbum();
+    play();
+    ASSERT_EQ(listener_.call("Pause"), "");
+    ASSERT_EQ(listener_.next(), statusChanged);
+    call()->readLine(milliseconds(500)); // it never prints anything
+    EXPECT_EQ(listener_.next(milliseconds(500)), std::nullopt);
+    EXPECT_EQ(status(), "Paused\n");
+}
+
+TEST_F(ServiceTest, WhatIsPausedDuringACallStaysPaused) {
+    mirrorAlbum();
+    play();
+    auto phone = call();
+    ASSERT_EQ(listener_.next(), statusChanged);
+    EXPECT_EQ(listener_.call("Pause"), "");
+    phone.reset();
+    EXPECT_EQ(listener_.next(milliseconds(1000)), std::nullopt);
+    EXPECT_EQ(status(), "Paused\n");
+}
+
+TEST_F(ServiceTest, TheDeviceThatVanishesPauses) {
+    mirrorAlbum();
+    play();
+    sound_.control({"unload-module", "module-null-sink"});
+    EXPECT_EQ(listener_.next(), statusChanged);
+    EXPECT_EQ(status(), "Paused\n");
+    EXPECT_TRUE(service_.waitForLog("the device that played is gone"));
+}
+
+} // namespace
+} // namespace tarn
