@@ -41,7 +41,9 @@ public:
     virtual void setRate(float rate) = 0;
     virtual void pause() = 0;
 
-    /// Plays on: at the rate at which an interruption paused this player, else at 1.0.
+    /// Plays on: at the rate at which an interruption paused this player, else at 1.0. A player that was told
+    /// to pause after the interruption had paused it stays paused, once: whoever pauses during a call does
+    /// not want to hear it afterwards.
     virtual void play() = 0;
 
     /// None when the queue is empty.

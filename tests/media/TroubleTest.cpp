@@ -134,9 +134,11 @@ TEST(Interruption, PausesWhatSoundsAndPlayGoesOnAtItsRate) {
 
     test.platform.audioSession.beginInterruption();
     test.settle();
-    test.player->pause(); // by the listener: what was before does not count any more
+    test.player->pause(); // by the listener, who wants it to stay so
     test.player->play();
-    EXPECT_EQ(test.player->rate(), 1.0F);
+    EXPECT_EQ(test.player->rate(), 0.0F);
+    test.player->play();
+    EXPECT_EQ(test.player->rate(), 1.0F) << "what was before does not count any more";
 }
 
 TEST(TwoPlayers, TheNewestOneDrivesTheItemsTheyShare) {

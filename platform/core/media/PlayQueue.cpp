@@ -79,6 +79,7 @@ void PlayQueue::seek(const CoreMediaItem& item, std::chrono::nanoseconds positio
 }
 
 bool PlayQueue::setRate(float rate) {
+    staysPaused_ = rate == 0 && (staysPaused_ || interruptedRate_);
     interruptedRate_.reset();
     if (rate == rate_)
         return false;
@@ -91,13 +92,18 @@ bool PlayQueue::setRate(float rate) {
     return true;
 }
 
-bool PlayQueue::play() { return setRate(interruptedRate_.value_or(1.0F)); }
+bool PlayQueue::play() {
+    if (std::exchange(staysPaused_, false))
+        return false;
+    return setRate(interruptedRate_.value_or(1.0F));
+}
 
 bool PlayQueue::interrupt() {
     if (rate_ == 0)
         return false;
     float before = rate_;
     setRate(0);
+    staysPaused_ = false;
     interruptedRate_ = before;
     return true;
 }

@@ -114,6 +114,7 @@ private:
     EntryId lastId_ = 0;
     float rate_ = 0;
     std::optional<float> interruptedRate_;
+    bool staysPaused_ = false; ///< was told to pause after an interruption had paused it
     Timeline timeline_;
     float renderedRate_ = 0; ///< the rate of what is rendered, 0 before anything was
     const Output* clock_ = nullptr;
