@@ -28,10 +28,8 @@ void LinuxAudioSession::activateWithOptions(std::uint64_t, ActivationCompletion 
 }
 
 void LinuxAudioSession::streamInterrupted(const void* stream) {
-    const bool first = interrupted_.empty();
     interrupted_.insert(stream);
-    if (first)
-        notify(interruptionBegan, std::nullopt);
+    notify(interruptionBegan, std::nullopt); // also for one that begins to play during an interruption
 }
 
 void LinuxAudioSession::streamReleased(const void* stream) {

@@ -131,6 +131,7 @@ void SystemOutput::beginAnew(Mode mode) {
 
 void SystemOutput::loseStream() {
     stream_.reset();
+    toBeSilent_ = false;
     interruptions_.streamGone(this);
 }
 
@@ -165,12 +166,17 @@ void SystemOutput::streamMovedOffVanishedDevice() {
     later([](SystemOutput& self) { self.listener_.outputDeviceVanished(); });
 }
 
+// A stream that stands still is asked as well, and is kept mute until it is released.
 void SystemOutput::streamToBeInterrupted() {
+    toBeSilent_ = true;
     if (running_)
         interruptions_.streamInterrupted(this);
 }
 
-void SystemOutput::streamToBeReleased() { interruptions_.streamReleased(this); }
+void SystemOutput::streamToBeReleased() {
+    toBeSilent_ = false;
+    interruptions_.streamReleased(this);
+}
 
 void SystemOutput::setDescription(const std::string& title, const std::string& artist) {
     title_ = title;
@@ -203,6 +209,8 @@ void SystemOutput::start() {
         break;
     }
     armWritable();
+    if (toBeSilent_)
+        interruptions_.streamInterrupted(this);
 }
 
 void SystemOutput::stop() {

@@ -74,6 +74,7 @@ private:
     std::size_t capacity_ = 0; // frames
     Mode mode_ = Mode::idle;
     bool running_ = false;
+    bool toBeSilent_ = false; // the server has asked for silence and not taken it back
     std::int64_t writeIndex_ = 0;
     HeardClock clock_;
     FrameMemory memory_;
