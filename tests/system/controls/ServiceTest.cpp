@@ -1,3 +1,5 @@
+#include <algorithm>
+
 #include <gmock/gmock.h>
 
 #include <tarn/Client.h>
@@ -58,10 +60,21 @@ protected:
 
     std::string status() const { return playerctl({"status"}).output; }
 
+    /// Returns when it is heard.
     void play() {
+        const Recorder recorder;
         ASSERT_EQ(listener_.call("Play"), "");
         ASSERT_EQ(listener_.next(), statusChanged);
         ASSERT_EQ(status(), "Playing\n");
+        constexpr std::size_t tenth = 4410;
+        for (int tenths = 0; tenths < 100 && !isHeard(recorder); ++tenths)
+            recorder.waitFrames(tenth);
+        ASSERT_TRUE(isHeard(recorder));
+    }
+
+    static bool isHeard(const Recorder& recorder) {
+        const auto samples = recorder.samples();
+        return std::any_of(samples.begin(), samples.end(), [](std::int16_t sample) { return sample != 0; });
     }
 
     std::unique_ptr<ChildProcess> call() const {
