@@ -2,6 +2,7 @@
 import contextlib
 import os
 import pathlib
+import queue
 import re
 import shutil
 import signal
@@ -9,6 +10,7 @@ import socket
 import subprocess
 import sys
 import tempfile
+import threading
 import unittest
 import wave
 
@@ -47,6 +49,40 @@ def make_song(path):
         song.setsampwidth(2)
         song.setframerate(8000)
         song.writeframes(bytes(2 * 8000 // 4))
+
+
+class SoundServer:
+    """A sound server of our own, which throws away what it plays and tells of every stream."""
+
+    def __init__(self, folder):
+        self.environment = {"PULSE_SERVER": f"unix:{folder}/native", "PULSE_RUNTIME_PATH": str(folder),
+                            "PULSE_STATE_PATH": str(folder)}
+        self.process = subprocess.Popen(
+            ["pulseaudio", "-n", "--daemonize=no", "--use-pid-file=no", "--exit-idle-time=-1", "--log-target=stderr",
+             "--log-level=info", "-L", "module-null-sink", "-L",
+             f"module-native-protocol-unix auth-anonymous=1 socket={folder}/native"],
+            stderr=subprocess.PIPE, text=True, env={**os.environ, **self.environment})
+        self.lines = queue.SimpleQueue()
+        self.reader = threading.Thread(target=self.read)
+        self.reader.start()
+
+    def __enter__(self):
+        self.wait_for("Daemon startup complete")
+        return self
+
+    def __exit__(self, *_):
+        self.process.terminate()
+        self.process.wait(DEADLINE)
+        self.reader.join()
+        self.process.stderr.close()
+
+    def read(self):
+        for line in self.process.stderr:
+            self.lines.put(line)
+
+    def wait_for(self, text):
+        while text not in self.lines.get(timeout=DEADLINE):
+            pass
 
 
 class AnInstalledPackage(unittest.TestCase):
@@ -105,10 +141,12 @@ class AnInstalledPackage(unittest.TestCase):
             self.skipTest("this machine does not let us make namespaces")
         unit = self.prefix / "lib/systemd/user/tarnd.service"
         confined = pathlib.Path(__file__).with_name("confined.py")
-        with self.service((*namespaces, "/usr/bin/python3", confined, unit)) as process:
+        wrapper = (*namespaces, "/usr/bin/python3", confined, unit)
+        with SoundServer(self.folder) as sound, self.service(wrapper, **sound.environment) as process:
             status = pathlib.Path(f"/proc/{process.pid}/status").read_text()
             self.assertIn("\nSeccomp:\t2\n", status)
             self.assertIn("song.wav", self.tarnctl("play", self.song))
+            sound.wait_for("Created input")
 
     def test_speaks_the_users_language(self):
         with self.service(LANG="de_DE.UTF-8"):
@@ -187,4 +225,4 @@ class AnInstalledPackage(unittest.TestCase):
 if __name__ == "__main__":
     if not shutil.which("dpkg-shlibdeps"):
         sys.exit("dpkg-shlibdeps is missing: script/setup installs it")
-    unittest.main(argv=sys.argv[:1], verbosity=2)
+    unittest.main(argv=[sys.argv[0], *sys.argv[3:]], verbosity=2)
