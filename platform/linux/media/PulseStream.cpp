@@ -50,6 +50,14 @@ std::chrono::nanoseconds ageOf(const timeval& wallTime) {
 
 } // namespace
 
+/// What the server tells of all streams, on the way to the question whether a call holds ours back.
+struct PulseStream::CallSurvey {
+    std::weak_ptr<PulseStream*> stream;
+    std::uint32_t index;
+    bool muted = false;
+    bool call = false;
+};
+
 struct PulseStream::Callbacks {
     static PulseStream& self(void* data) { return *static_cast<PulseStream*>(data); }
 
@@ -59,6 +67,7 @@ struct PulseStream::Callbacks {
             self(data).ready_ = true;
             self(data).device_ = pa_stream_get_device_index(stream);
             self(data).listener_.streamReady();
+            self(data).askForCalls();
         } else if (!PA_STREAM_IS_GOOD(state) &&
                    PA_CONTEXT_IS_GOOD(pa_context_get_state(pa_stream_get_context(stream)))) {
             self(data).listener_.streamKilled();
@@ -82,6 +91,20 @@ struct PulseStream::Callbacks {
         delete weak;
         if (stream && end < 0) // the server knows no such device any more
             (*stream)->listener_.streamMovedOffVanishedDevice();
+    }
+
+    static void otherStream(pa_context*, const pa_sink_input_info* info, int end, void* data) {
+        auto* survey = static_cast<CallSurvey*>(data);
+        if (end == 0) {
+            const char* role = pa_proplist_gets(info->proplist, PA_PROP_MEDIA_ROLE);
+            survey->muted |= info->index == survey->index && info->mute != 0;
+            survey->call |= role != nullptr && std::strcmp(role, "phone") == 0;
+            return;
+        }
+        const auto stream = survey->stream.lock();
+        if (stream && survey->muted && survey->call)
+            (*stream)->listener_.streamToBeInterrupted();
+        delete survey;
     }
 
     static void timing(pa_stream*, int success, void* data) {
@@ -165,6 +188,17 @@ void PulseStream::checkOldDevice() {
                                                                 Callbacks::oldDevice, weak);
     if (operation == nullptr)
         delete weak;
+    letGo(operation);
+}
+
+/// A stream that is made during a call is muted at once, and the server's request comes before the stream can
+/// hear it: only the end of the call will be told.
+void PulseStream::askForCalls() {
+    auto* survey = new CallSurvey{self_, pa_stream_get_index(stream_.get())}; // otherStream() owns it
+    pa_operation* operation = pa_context_get_sink_input_info_list(pa_stream_get_context(stream_.get()),
+                                                                  Callbacks::otherStream, survey);
+    if (operation == nullptr)
+        delete survey;
     letGo(operation);
 }
 

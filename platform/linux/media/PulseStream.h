@@ -76,12 +76,14 @@ public:
 
 private:
     struct Callbacks;
+    struct CallSurvey;
     struct StreamDelete {
         void operator()(pa_stream* stream) const;
     };
 
     void write(const std::byte* data, std::size_t frames, std::int64_t offset, int seek);
     void checkOldDevice();
+    void askForCalls();
 
     const PcmFormat format_;
     PulseStreamListener& listener_;

@@ -77,10 +77,15 @@ protected:
         return std::any_of(samples.begin(), samples.end(), [](std::int16_t sample) { return sample != 0; });
     }
 
+    /// A call, which lasts as long as the result. Returns when the sound server knows of it.
     std::unique_ptr<ChildProcess> call() const {
-        return std::make_unique<ChildProcess>(std::vector<std::string>{"pacat", "--property=media.role=phone",
-                                                                       "--raw", "--device=out", "/dev/zero"},
-                                              sound_.environment());
+        const std::vector<std::string> command = {"pacat", "--verbose",    "--property=media.role=phone",
+                                                  "--raw", "--device=out", "/dev/zero"};
+        auto phone = std::make_unique<ChildProcess>(command, sound_.environment(),
+                                                    ChildProcess::ErrorOutput::withOutput);
+        EXPECT_TRUE(phone->readUntil("Stream successfully created"));
+        phone->discardOutput();
+        return phone;
     }
 
     SoundServerProcess sound_{{"module-role-cork"}};
@@ -171,13 +176,25 @@ TEST_F(ServiceTest, ACallInterruptsWhatPlays) {
     }
 }
 
+TEST_F(ServiceTest, WhatBeginsDuringACallWaitsForItsEnd) {
+    mirrorAlbum();
+    auto phone = call();
+    EXPECT_EQ(listener_.call("Play"), "");
+    EXPECT_EQ(listener_.next(), statusChanged);
+    EXPECT_EQ(listener_.next(), statusChanged);
+    EXPECT_EQ(status(), "Paused\n");
+    phone.reset();
+    EXPECT_EQ(listener_.next(), statusChanged);
+    EXPECT_EQ(status(), "Playing\n");
+}
+
 TEST_F(ServiceTest, ACallLeavesWhatIsPausedAlone) {
     mirrorAlbum();
     play();
     ASSERT_EQ(listener_.call("Pause"), "");
     ASSERT_EQ(listener_.next(), statusChanged);
-    call()->readLine(milliseconds(500)); // it never prints anything
-    EXPECT_EQ(listener_.next(milliseconds(500)), std::nullopt);
+    call();
+    EXPECT_EQ(listener_.next(milliseconds(1000)), std::nullopt);
     EXPECT_EQ(status(), "Paused\n");
 }
 
