@@ -121,6 +121,11 @@ void PulseStream::StreamDelete::operator()(pa_stream* stream) const {
     pa_stream_unref(stream);
 }
 
+void PulseStream::OperationDelete::operator()(pa_operation* operation) const {
+    pa_operation_cancel(operation);
+    pa_operation_unref(operation);
+}
+
 PulseStream::PulseStream(pa_context* context, const PcmFormat& format, std::size_t bufferFrames,
                          PulseStreamListener& listener)
     : format_(format), listener_(listener), self_(std::make_shared<PulseStream*>(this)) {
@@ -163,7 +168,7 @@ void PulseStream::writeSoon(std::size_t margin, const std::byte* data, std::size
 }
 
 void PulseStream::updateTiming() {
-    letGo(pa_stream_update_timing_info(stream_.get(), Callbacks::timing, this));
+    timingQuery_.reset(pa_stream_update_timing_info(stream_.get(), Callbacks::timing, this));
 }
 
 std::optional<PulseStream::Timing> PulseStream::timing() const {

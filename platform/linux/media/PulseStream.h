@@ -80,6 +80,9 @@ private:
     struct StreamDelete {
         void operator()(pa_stream* stream) const;
     };
+    struct OperationDelete {
+        void operator()(pa_operation* operation) const;
+    };
 
     void write(const std::byte* data, std::size_t frames, std::int64_t offset, int seek);
     void checkOldDevice();
@@ -88,6 +91,8 @@ private:
     const PcmFormat format_;
     PulseStreamListener& listener_;
     std::unique_ptr<pa_stream, StreamDelete> stream_;
+    std::unique_ptr<pa_operation, OperationDelete>
+        timingQuery_; // not answered any more when the stream is gone
     bool ready_ = false;
     std::uint32_t device_ = 0;
     std::shared_ptr<PulseStream*> self_; // for answers that come when the stream is gone
