@@ -57,6 +57,8 @@ void sendAll(int socket, const Bytes& bytes) {
 [[noreturn]] void serve(int socket, int handOffs) {
     std::vector<std::unique_ptr<Baton>> batons;
     std::vector<std::thread> threads;
+    batons.reserve(static_cast<std::size_t>(handOffs));
+    threads.reserve(static_cast<std::size_t>(handOffs));
     for (int i = 0; i < handOffs; ++i)
         batons.push_back(std::make_unique<Baton>());
     for (std::size_t i = 0; i < batons.size(); ++i)

@@ -27,7 +27,6 @@ private:
 
     FileDescriptor socket_;
     Data call_;
-    FrameReader::Sender sender_;
     FrameReader reader_;
     std::vector<std::uint8_t> buffer_;
 };

@@ -138,6 +138,7 @@ void benchRoundTrips() {
 
 void benchBeingThere() {
     std::vector<double> times;
+    times.reserve(starts);
     for (int i = 0; i < starts; ++i)
         times.push_back(Milliseconds(ServiceProcess().startTime()).count());
     std::sort(times.begin(), times.end());
