@@ -6,6 +6,7 @@
 #include <cerrno>
 #include <cstring>
 #include <mutex>
+#include <optional>
 #include <stdexcept>
 #include <system_error>
 #include <thread>
@@ -30,6 +31,11 @@ Answer answerOf(const Frame& frame) {
     if (reply->error)
         return {Outcome::failed, {}, {reply->error->domain, reply->error->code, reply->error->userInfo}};
     return {Outcome::answered, std::move(reply->data), {}};
+}
+
+void requireThatItFits(const Bytes& body) {
+    if (body.size() > FrameHeader::largestBody)
+        throw std::length_error("an envelope has at most 1 MiB");
 }
 
 /// Sends everything, with a file beside the first byte unless it is -1. False when the connection has ended.
@@ -80,24 +86,16 @@ public:
     }
 
     void call(const Bytes& envelope, AnswerHandler handler) {
-        std::uint64_t id = 0;
-        {
-            std::lock_guard lock(state_);
-            if (connected_) {
-                id = nextCallId_++;
-                pending_.emplace(id, std::move(handler));
-            }
-        }
+        requireThatItFits(envelope); // before anybody waits for its end
         // A call that is not written ends with the others when the thread sees the end of the connection.
-        if (id != 0)
-            write(FrameKind::call, id, envelope, -1);
+        if (const auto id = expectAnswer(handler))
+            write(FrameKind::call, *id, envelope, -1);
         else
             handler(Answer{});
     }
 
     bool write(FrameKind kind, std::uint64_t callId, const Bytes& body, int file) {
-        if (body.size() > FrameHeader::largestBody)
-            throw std::length_error("an envelope has at most 1 MiB");
+        requireThatItFits(body);
         Data bytes;
         appendFrame(bytes, kind, callId, body);
         std::lock_guard lock(writing_);
@@ -110,6 +108,15 @@ public:
     }
 
 private:
+    /// Takes the handler and gives the id of its call; leaves it alone when there is no connection.
+    std::optional<std::uint64_t> expectAnswer(AnswerHandler & handler) {
+        std::lock_guard lock(state_);
+        if (!connected_)
+            return std::nullopt;
+        pending_.emplace(nextCallId_, std::move(handler));
+        return nextCallId_++;
+    }
+
     void connect() {
         FileDescriptor socket(::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0));
         if (!socket || !address_.connect(socket.get()))

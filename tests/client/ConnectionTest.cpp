@@ -142,6 +142,7 @@ TEST(AConnection, SaysWhyItCannotBeMadeOrUsed) {
     const TestServer server(answerAsAsked);
     Connection connection({});
     EXPECT_THROW(connection.send(Data(1'048'577)), std::length_error);
+    EXPECT_THROW(connection.call(Data(1'048'577), [](const Answer&) { FAIL(); }), std::length_error);
     EXPECT_EQ(ask(connection, "answer").outcome, Outcome::answered);
 }
 

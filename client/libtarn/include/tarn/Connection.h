@@ -37,7 +37,9 @@ public:
     Connection(const Connection&) = delete;
     Connection& operator=(const Connection&) = delete;
 
-    /// Sends a command, at most 1 MiB, and calls `handler` once with how it ended. Waits only while the
+    // An envelope over 1 MiB throws std::length_error; nothing is sent then.
+
+    /// Sends a command and calls `handler` once with how it ended. Waits only while the
     /// service is behind with what was sent before. Without a connection `handler` is called at once.
     void call(const Bytes& envelope, AnswerHandler handler);
 
