@@ -57,7 +57,7 @@ const DecoderModule* DecoderLoader::load() {
                          path ? dlerror() : "not found");
         return nullptr;
     }
-    module_ = &reinterpret_cast<DecoderModuleFunction>(function)();
+    module_ = reinterpret_cast<DecoderModuleFunction>(function)();
     return module_;
 }
 

@@ -94,7 +94,7 @@ public:
 };
 
 /// What the module exports, under the name in decoderModuleSymbol.
-using DecoderModuleFunction = const DecoderModule& (*)();
+using DecoderModuleFunction = const DecoderModule* (*)();
 inline constexpr char decoderModuleSymbol[] = "tarnDecoderModule1";
 
 } // namespace tarn

@@ -90,7 +90,7 @@ private:
         const std::int64_t duration = container_.context().duration;
         const std::int64_t tail = duration - tailSeconds * AV_TIME_BASE;
         if (duration != AV_NOPTS_VALUE && tail > 0)
-            container_.seek(av_rescale_q(tail, AV_TIME_BASE_Q, container_.stream().time_base));
+            container_.seek(av_rescale_q(tail, AVRational{1, AV_TIME_BASE}, container_.stream().time_base));
         return endOfPackets();
     }
 

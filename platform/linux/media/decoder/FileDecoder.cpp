@@ -18,16 +18,16 @@ constexpr std::int64_t longestHoleSeconds = 10;
 std::int64_t prerollOf(const AVCodecParameters& parameters) {
     switch (parameters.codec_id) {
     case AV_CODEC_ID_MP3: // frames lend bytes to later ones, at low rates over a dozen of them
-        return 24 * 1152;
+        return 24L * 1152;
     case AV_CODEC_ID_MP2:
     case AV_CODEC_ID_MP1:
-        return 4 * 1152;
+        return 4L * 1152;
     case AV_CODEC_ID_AAC: // one frame overlaps; spectral replication takes longer to settle
-        return parameters.frame_size > 1024 ? 16 * 2048 : 4 * 1024;
+        return parameters.frame_size > 1024 ? 16L * 2048 : 4L * 1024;
     case AV_CODEC_ID_OPUS:
         return 48'000 / 2;
     case AV_CODEC_ID_VORBIS:
-        return 4 * 8192;
+        return 4L * 8192;
     default:
         return 0;
     }

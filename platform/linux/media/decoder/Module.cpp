@@ -32,9 +32,9 @@ public:
 
 } // namespace
 
-extern "C" [[gnu::visibility("default")]] const DecoderModule& tarnDecoderModule1() {
+extern "C" [[gnu::visibility("default")]] const DecoderModule* tarnDecoderModule1() {
     static const FfmpegDecoderModule module;
-    return module;
+    return &module;
 }
 
 } // namespace tarn

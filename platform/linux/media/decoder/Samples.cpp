@@ -27,7 +27,8 @@ void append(const AVFrame& frame, int first, int count, bool planar, PcmBuffer& 
         const auto* from = reinterpret_cast<const Sample*>(frame.extended_data[planar ? channel : 0]) +
                            static_cast<std::ptrdiff_t>(first) * stride + (planar ? 0 : channel);
         for (int i = 0; i < count; ++i)
-            into[i * channels + channel] = converted(from[i * stride]);
+            into[static_cast<std::ptrdiff_t>(i) * channels + channel] =
+                converted(from[static_cast<std::ptrdiff_t>(i) * stride]);
     }
 }
 
