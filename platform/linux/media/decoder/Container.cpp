@@ -11,6 +11,8 @@ namespace {
 constexpr int ioBufferSize = 32 * 1024;
 constexpr std::int64_t probeBytes = 1 << 20;
 constexpr std::int64_t probeMicroseconds = 5'000'000;
+constexpr std::int64_t farthestFrame = std::int64_t{1}
+                                       << 52; // so that sums of what a file claims cannot overflow
 constexpr int mostStreams = 32;
 constexpr int mostFruitlessReads = 10'000;
 constexpr int mostChannels = 8;
@@ -180,7 +182,8 @@ FfmpegPointer<AVCodecContext> Container::openCodec() {
 }
 
 std::int64_t Container::toFrames(std::int64_t time) const {
-    return av_rescale_q(time, stream_->time_base, {1, stream_->codecpar->sample_rate});
+    const std::int64_t frames = av_rescale_q(time, stream_->time_base, {1, stream_->codecpar->sample_rate});
+    return std::clamp(frames, -farthestFrame, farthestFrame);
 }
 
 std::int64_t Container::fromFrames(std::int64_t frames) const {

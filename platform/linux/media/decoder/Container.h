@@ -39,7 +39,7 @@ public:
     /// Opens the codec of the audio stream.
     FfmpegPointer<AVCodecContext> openCodec();
 
-    /// `time` of the stream in sample frames, rounded.
+    /// `time` of the stream in sample frames, rounded, and kept within 52 bits.
     std::int64_t toFrames(std::int64_t time) const;
     std::int64_t fromFrames(std::int64_t frames) const;
 

@@ -15,6 +15,7 @@ namespace tarn {
 namespace {
 
 constexpr std::int64_t tailSeconds = 5;
+constexpr std::int64_t longestSeconds = 365L * 24 * 3600; // whatever claims more does not know
 constexpr std::int64_t editListToleranceMilliseconds = 2;
 
 bool isMatroska(const AVFormatContext& context) {
@@ -88,9 +89,10 @@ private:
     // Only the last packets tell, to the frame, where it ends.
     std::optional<std::int64_t> endOfTail() {
         const std::int64_t duration = container_.context().duration;
-        const std::int64_t tail = duration - tailSeconds * AV_TIME_BASE;
-        if (duration != AV_NOPTS_VALUE && tail > 0)
-            container_.seek(av_rescale_q(tail, AVRational{1, AV_TIME_BASE}, container_.stream().time_base));
+        constexpr std::int64_t tail = tailSeconds * AV_TIME_BASE;
+        if (duration > tail)
+            container_.seek(
+                av_rescale_q(duration - tail, AVRational{1, AV_TIME_BASE}, container_.stream().time_base));
         return endOfPackets();
     }
 
@@ -110,7 +112,7 @@ std::int64_t unroundedEnd(std::int64_t end, ByteSource& source) {
     const AVPacket* first = whole.next();
     if (first == nullptr || first->pts == AV_NOPTS_VALUE || stream.duration == AV_NOPTS_VALUE)
         return end;
-    const std::int64_t mediaEnd = whole.toFrames(first->pts + stream.duration);
+    const std::int64_t mediaEnd = whole.toFrames(first->pts) + whole.toFrames(stream.duration);
     const std::int64_t tolerance = stream.codecpar->sample_rate * editListToleranceMilliseconds / 1000;
     return std::abs(mediaEnd - end) <= tolerance ? mediaEnd : end;
 }
@@ -148,7 +150,8 @@ DecoderModule::Examined examineFile(ByteSource& source) {
         end = end ? std::min(*end, info.firstFrame + *tag->recording) : info.firstFrame + *tag->recording;
     else if (tag && mp3 && end)
         end = *end - std::max<std::int64_t>(0, tag->padding - mp3DecoderDelay);
-    if (end && *end > info.firstFrame)
+    const std::int64_t most = longestSeconds * parameters.sample_rate;
+    if (end && *end > info.firstFrame && *end - info.firstFrame <= most)
         info.frames = *end - info.firstFrame;
     return {std::move(info), {}};
 }
