@@ -59,15 +59,16 @@ void Blend::mix(PcmBuffer& buffer, std::size_t frames) {
     const std::size_t channels = format_.channels;
     const auto* old = reinterpret_cast<const Sample*>(old_.bytes.data()) + done_ * channels;
     auto* samples = reinterpret_cast<Sample*>(buffer.bytes.data());
-    for (std::size_t i = 0; i < frames * channels; ++i) {
-        const double share =
-            static_cast<double>(done_ + i / channels + 1) / static_cast<double>(old_.frames + 1);
-        const double value =
-            static_cast<double>(old[i]) * (1 - share) + static_cast<double>(samples[i]) * share;
-        if constexpr (std::is_integral_v<Sample>)
-            samples[i] = static_cast<Sample>(std::lround(value));
-        else
-            samples[i] = static_cast<Sample>(value);
+    for (std::size_t frame = 0; frame < frames; ++frame) {
+        const double share = static_cast<double>(done_ + frame + 1) / static_cast<double>(old_.frames + 1);
+        for (std::size_t i = frame * channels; i < (frame + 1) * channels; ++i) {
+            const double value =
+                static_cast<double>(old[i]) * (1 - share) + static_cast<double>(samples[i]) * share;
+            if constexpr (std::is_integral_v<Sample>)
+                samples[i] = static_cast<Sample>(std::lround(value));
+            else
+                samples[i] = static_cast<Sample>(value);
+        }
     }
 }
 
