@@ -10,7 +10,8 @@ int main(int argc, char** argv) {
         return 2;
     }
     tarn::client::Client client;
-    const auto asset = client.upsertAsset({.identifier = "file", .URL = tarn::client::fileURL(argv[1])}).get();
+    const auto asset =
+        client.upsertAsset({.identifier = "file", .URL = tarn::client::fileURL(argv[1])}).get();
     if (!asset.succeeded()) {
         std::cerr << asset.problem() << "\n";
         return 1;

@@ -6,8 +6,8 @@ namespace tarn {
 
 /// What a service process sets up before anything else, on the main thread.
 ///
-/// From now on the signals that ask for an end (SIGTERM, SIGINT, SIGHUP) wait for endOnStopSignals(), in every
-/// thread that is made later, and SIGPIPE does nothing.
+/// From now on the signals that ask for an end (SIGTERM, SIGINT, SIGHUP) wait for endOnStopSignals(), in
+/// every thread that is made later, and SIGPIPE does nothing.
 void prepareSignals();
 
 /// Starts the thread on which a stop signal calls `beforeEnd` and ends the process with status 0, at once:

@@ -7,8 +7,8 @@
 
 namespace tarn {
 
-CallAnswer::CallAnswer(std::shared_ptr<ConnectionSocket> socket, std::uint64_t callId, std::size_t bytes) :
-    socket_(std::move(socket)), callId_(callId), bytes_(bytes) {
+CallAnswer::CallAnswer(std::shared_ptr<ConnectionSocket> socket, std::uint64_t callId, std::size_t bytes)
+    : socket_(std::move(socket)), callId_(callId), bytes_(bytes) {
     socket_->beginCall(bytes_);
 }
 
@@ -23,7 +23,8 @@ void CallAnswer::call(const std::optional<Data>& data, const std::optional<Error
         return;
     const auto reply = encodeReply(data, error);
     if (reply.size() > FrameHeader::largestBody) {
-        SystemLog::error(__func__, __LINE__, "%{public}s:%d: dropped an answer of %d bytes: too long", reply.size());
+        SystemLog::error(__func__, __LINE__, "%{public}s:%d: dropped an answer of %d bytes: too long",
+                         reply.size());
         return;
     }
     answered_ = true;

@@ -13,8 +13,8 @@ constexpr std::size_t enoughForOneWrite = 65'536;
 
 } // namespace
 
-ConnectionSocket::ConnectionSocket(FileDescriptor socket, Poller& poller, std::uint64_t key) :
-    socket_(std::move(socket)), poller_(poller), key_(key) {}
+ConnectionSocket::ConnectionSocket(FileDescriptor socket, Poller& poller, std::uint64_t key)
+    : socket_(std::move(socket)), poller_(poller), key_(key) {}
 
 void ConnectionSocket::send(FrameKind kind, std::uint64_t callId, std::span<const std::uint8_t> body) {
     {
@@ -85,7 +85,8 @@ void ConnectionSocket::limitReading() {
 }
 
 bool ConnectionSocket::isOverLimit(std::uint32_t divisor) const {
-    return unfinishedCalls_ >= mostUnfinishedCalls / divisor || unfinishedBytes_ >= mostUnfinishedBytes / divisor;
+    return unfinishedCalls_ >= mostUnfinishedCalls / divisor ||
+           unfinishedBytes_ >= mostUnfinishedBytes / divisor;
 }
 
 bool ConnectionSocket::watch() { return poller_.add(socket_.get(), key_, EPOLLRDHUP); }

@@ -33,7 +33,8 @@ FileDescriptor handedOver(const std::string& name) {
     for (int i = 0; i < count; ++i) {
         FileDescriptor socket(SD_LISTEN_FDS_START + i);
         const std::unique_ptr<char, decltype(&std::free)> itsName(names[i], &std::free);
-        if (!found && name == itsName.get() && sd_is_socket_unix(socket.get(), SOCK_STREAM, 1, nullptr, 0) > 0)
+        if (!found && name == itsName.get() &&
+            sd_is_socket_unix(socket.get(), SOCK_STREAM, 1, nullptr, 0) > 0)
             found = std::move(socket);
     }
     std::free(names); // NOLINT(bugprone-multi-level-implicit-pointer-conversion)

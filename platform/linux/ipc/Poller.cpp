@@ -25,9 +25,9 @@ FileDescriptor checked(int descriptor, const char* what) {
 
 } // namespace
 
-Poller::Poller() :
-    epoll_(checked(epoll_create1(EPOLL_CLOEXEC), "epoll_create1")),
-    wakeUp_(checked(eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK), "eventfd")) {
+Poller::Poller()
+    : epoll_(checked(epoll_create1(EPOLL_CLOEXEC), "epoll_create1")),
+      wakeUp_(checked(eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK), "eventfd")) {
     if (!add(wakeUp_.get(), wakeKey, EPOLLIN))
         throw std::system_error(errno, std::generic_category(), "epoll_ctl");
 }

@@ -12,8 +12,8 @@ namespace tarn {
 
 /// What the I/O thread waits on. wait() belongs to one thread; everything else may be called from any.
 ///
-/// Every watched descriptor has a key by which its events are known. Events are EPOLLIN and the like, reported
-/// again for as long as they last.
+/// Every watched descriptor has a key by which its events are known. Events are EPOLLIN and the like,
+/// reported again for as long as they last.
 class Poller {
 public:
     /// The key of wake(); no watched descriptor has it.

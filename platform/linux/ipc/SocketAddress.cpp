@@ -10,9 +10,7 @@ namespace tarn {
 
 namespace {
 
-const sockaddr* generic(const sockaddr_un& address) {
-    return reinterpret_cast<const sockaddr*>(&address);
-}
+const sockaddr* generic(const sockaddr_un& address) { return reinterpret_cast<const sockaddr*>(&address); }
 
 } // namespace
 
@@ -23,7 +21,9 @@ SocketAddress::SocketAddress(const std::string& path) {
     path.copy(address_.sun_path, path.size());
 }
 
-bool SocketAddress::bind(int socket) const { return ::bind(socket, generic(address_), sizeof(address_)) == 0; }
+bool SocketAddress::bind(int socket) const {
+    return ::bind(socket, generic(address_), sizeof(address_)) == 0;
+}
 
 bool SocketAddress::connect(int socket) const {
     return ::connect(socket, generic(address_), sizeof(address_)) == 0;

@@ -9,8 +9,8 @@
 namespace tarn {
 
 SocketConnection::SocketConnection(std::shared_ptr<ConnectionSocket> socket, std::uint64_t key,
-                                   TokenTable& tokens) :
-    socket_(std::move(socket)), key_(key), tokens_(tokens) {}
+                                   TokenTable& tokens)
+    : socket_(std::move(socket)), key_(key), tokens_(tokens) {}
 
 void SocketConnection::setExportedObject(std::shared_ptr<VLLongFormAudioServerProtocol> object) {
     exportedObject_ = std::move(object);
@@ -31,7 +31,8 @@ void SocketConnection::setInvalidationHandler(std::function<void()> handler) {
 
 void SocketConnection::receiveData(const Data& data) {
     if (data.size() > FrameHeader::largestBody) {
-        SystemLog::error(__func__, __LINE__, "%{public}s:%d: dropped an event of %d bytes: too long", data.size());
+        SystemLog::error(__func__, __LINE__, "%{public}s:%d: dropped an event of %d bytes: too long",
+                         data.size());
         return;
     }
     socket_->send(FrameKind::event, 0, data);
@@ -89,13 +90,14 @@ void SocketConnection::takeExtension(Frame frame) {
         return interrupt("an extension cannot be decoded");
     const auto refusal = tokens_.grant(key_, extension->token, extension->path, std::move(frame.file));
     if (!refusal.empty())
-        SystemLog::error(__func__, __LINE__, "%{public}s:%d: refused a file of client %d: %{public}s", key_, refusal);
+        SystemLog::error(__func__, __LINE__, "%{public}s:%d: refused a file of client %d: %{public}s", key_,
+                         refusal);
 }
 
 void SocketConnection::interrupt(std::string_view reason) {
     if (std::exchange(loss_, Loss::interruption) != Loss::interruption)
-        SystemLog::error(__func__, __LINE__, "%{public}s:%d: ended the connection of client %d: %{public}s", key_,
-                         reason);
+        SystemLog::error(__func__, __LINE__, "%{public}s:%d: ended the connection of client %d: %{public}s",
+                         key_, reason);
 }
 
 void SocketConnection::reportLoss() {

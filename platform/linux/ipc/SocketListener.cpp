@@ -21,8 +21,8 @@ FileDescriptor openSpare() { return FileDescriptor(::open("/dev/null", O_RDONLY 
 
 } // namespace
 
-SocketListener::SocketListener(FileDescriptor listeningSocket, TokenTable& tokens) :
-    listeningSocket_(std::move(listeningSocket)), spare_(openSpare()), tokens_(tokens) {}
+SocketListener::SocketListener(FileDescriptor listeningSocket, TokenTable& tokens)
+    : listeningSocket_(std::move(listeningSocket)), spare_(openSpare()), tokens_(tokens) {}
 
 SocketListener::~SocketListener() {
     thread_.request_stop();
