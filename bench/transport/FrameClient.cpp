@@ -20,7 +20,6 @@ using SteadyTime = std::chrono::steady_clock;
 FrameClient::FrameClient(FileDescriptor socket, Data call, FrameReader::Sender sender)
     : socket_(std::move(socket)),
       call_(std::move(call)),
-      sender_(sender),
       reader_(sender),
       buffer_(bufferSize) {}
 
