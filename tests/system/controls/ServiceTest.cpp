@@ -16,7 +16,6 @@ namespace {
 using std::chrono::milliseconds;
 using std::chrono::seconds;
 using testing::Contains;
-using testing::IsEmpty;
 using testing::Not;
 
 constexpr char statusChanged[] = "Player: PlaybackStatus";
