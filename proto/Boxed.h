@@ -17,7 +17,11 @@ public:
     }
     Boxed(const Boxed& other) : Boxed(other.get()) {}
     Boxed(Boxed&&) noexcept = default;
-    Boxed& operator=(const Boxed& other) { return *this = Boxed(other); }
+    Boxed& operator=(const Boxed& other) {
+        Boxed copy(other);
+        box_.swap(copy.box_);
+        return *this;
+    }
     Boxed& operator=(Boxed&&) noexcept = default;
     ~Boxed() = default;
 
