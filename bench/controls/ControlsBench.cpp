@@ -35,6 +35,7 @@ NowPlayingInfo track(int number, float rate) {
 
 std::vector<double> sorted(const std::function<Microseconds()>& measure, int count) {
     std::vector<double> times;
+    times.reserve(static_cast<std::size_t>(count));
     for (int sample = 0; sample < count; ++sample)
         times.push_back(measure().count());
     std::sort(times.begin(), times.end());
@@ -136,8 +137,10 @@ private:
     }
 
     int timeReturns() {
+        constexpr int rounds = 20;
         std::vector<double> times;
-        for (int round = 0; round < 20; ++round)
+        times.reserve(rounds);
+        for (int round = 0; round < rounds; ++round)
             times.push_back(timeReturn(std::chrono::seconds(0)));
         std::sort(times.begin(), times.end());
         std::printf(
