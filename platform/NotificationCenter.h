@@ -2,9 +2,11 @@
 
 #include <cstdint>
 #include <functional>
+#include <initializer_list>
 #include <map>
 #include <string>
 #include <string_view>
+#include <utility>
 
 #include "platform/Registration.h"
 
@@ -24,9 +26,14 @@ public:
 
     virtual ~NotificationCenter() = default;
 
-    /// `handler` runs on the posting thread, for notifications of that name from that sender only.
-    [[nodiscard]] virtual RegistrationHandle addObserver(std::string_view name, const void* sender,
-                                                         Handler handler) = 0;
+    /// `handler` runs on the posting thread, for notifications of these names from that sender only. The
+    /// names are literals, or outlive the registration otherwise.
+    [[nodiscard]] virtual RegistrationHandle addObserver(std::initializer_list<std::string_view> names,
+                                                         const void* sender, Handler handler) = 0;
+
+    [[nodiscard]] RegistrationHandle addObserver(std::string_view name, const void* sender, Handler handler) {
+        return addObserver({name}, sender, std::move(handler));
+    }
 
     /// Calls the handlers that are registered now, in order of registration, with no lock held.
     virtual void post(const Notification& notification) = 0;

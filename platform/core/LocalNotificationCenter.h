@@ -1,8 +1,7 @@
 #pragma once
 
+#include <map>
 #include <memory>
-#include <string>
-#include <utility>
 #include <vector>
 
 #include "platform/NotificationCenter.h"
@@ -15,14 +14,16 @@ class LocalNotificationCenter final : public NotificationCenter {
 public:
     LocalNotificationCenter();
 
-    RegistrationHandle addObserver(std::string_view name, const void* sender, Handler handler) override;
+    using NotificationCenter::addObserver;
+    RegistrationHandle addObserver(std::initializer_list<std::string_view> names, const void* sender,
+                                   Handler handler) override;
     void post(const Notification& notification) override;
 
 private:
     class Observer;
     class Membership;
-    using Key = std::pair<const void*, std::string>; // sender and name
-    using Observers = MutexProtected<std::map<Key, std::vector<std::shared_ptr<Observer>>>>;
+    /// By sender, in order of registration.
+    using Observers = MutexProtected<std::map<const void*, std::vector<std::shared_ptr<Observer>>>>;
 
     const std::shared_ptr<Observers> observers_;
 };
