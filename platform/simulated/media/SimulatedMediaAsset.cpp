@@ -6,19 +6,20 @@
 
 namespace tarn {
 
-SimulatedMediaAsset::SimulatedMediaAsset(std::string URL, MediaScript script)
+SimulatedMediaAsset::SimulatedMediaAsset(std::string URL, std::shared_ptr<const MediaScript> script)
     : URL_(std::move(URL)), script_(std::move(script)) {
+    metadata_.reserve(3);
     auto add = [this](std::string_view key, const std::optional<std::string>& text) {
         if (text)
             metadata_.emplace_back(std::string(key), std::string(MediaMetadataItem::commonKeySpace), text);
     };
-    add(MediaMetadataItem::commonKeyTitle, script_.title);
-    add(MediaMetadataItem::commonKeyAlbumName, script_.albumTitle);
-    add(MediaMetadataItem::commonKeyArtist, script_.artist);
+    add(MediaMetadataItem::commonKeyTitle, script_->title);
+    add(MediaMetadataItem::commonKeyAlbumName, script_->albumTitle);
+    add(MediaMetadataItem::commonKeyArtist, script_->artist);
 }
 
 MediaTime SimulatedMediaAsset::duration() const {
-    return script_.tellsDuration ? mediaTimeOf(script_.duration) : MediaTime();
+    return script_->tellsDuration ? mediaTimeOf(script_->duration) : MediaTime();
 }
 
 } // namespace tarn

@@ -1,7 +1,6 @@
 #include "platform/simulated/media/SimulatedMediaEngine.h"
 
 #include <memory>
-#include <optional>
 #include <utility>
 
 #include "platform/simulated/media/SimulatedMediaAsset.h"
@@ -16,13 +15,14 @@ SimulatedMediaEngine::SimulatedMediaEngine(PlayerLoop& loop, NotificationCenter&
       speaker_(loop) {}
 
 void SimulatedMediaEngine::addFile(const std::string& URL, MediaScript script) {
-    files_.withLocked([&](auto& files) { files.insert_or_assign(URL, std::move(script)); });
+    auto shared = std::make_shared<const MediaScript>(std::move(script));
+    files_.withLocked([&](auto& files) { files.insert_or_assign(URL, shared); });
 }
 
 MediaAssetOutcome SimulatedMediaEngine::openAsset(const std::string& URL) {
-    auto script = files_.withLocked([&](const auto& files) -> std::optional<MediaScript> {
+    auto script = files_.withLocked([&](const auto& files) -> std::shared_ptr<const MediaScript> {
         auto found = files.find(URL);
-        return found == files.end() ? std::nullopt : std::optional(found->second);
+        return found == files.end() ? nullptr : found->second;
     });
     auto refuse = [](std::int64_t code, const char* why) {
         return MediaAssetOutcome{nullptr, {"SimulatedMedia", code, {{localizedDescriptionKey, why}}}};
@@ -31,7 +31,7 @@ MediaAssetOutcome SimulatedMediaEngine::openAsset(const std::string& URL) {
         return refuse(2, "There is no such file.");
     if (script->token && !sandboxExtensions_.holds(*script->token))
         return refuse(13, "The file may not be read.");
-    return {std::make_shared<SimulatedMediaAsset>(URL, std::move(*script)), {}};
+    return {std::make_shared<SimulatedMediaAsset>(URL, std::move(script)), {}};
 }
 
 } // namespace tarn

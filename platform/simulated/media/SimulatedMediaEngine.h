@@ -1,6 +1,7 @@
 #pragma once
 
 #include <map>
+#include <memory>
 #include <string>
 
 #include "platform/core/MutexProtected.h"
@@ -31,7 +32,7 @@ public:
 
 private:
     SimulatedSandboxExtension& sandboxExtensions_;
-    MutexProtected<std::map<std::string, MediaScript>> files_;
+    MutexProtected<std::map<std::string, std::shared_ptr<const MediaScript>>> files_;
     SimulatedRenderingFactory renderings_;
     SimulatedSpeaker speaker_;
 };
