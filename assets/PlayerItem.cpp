@@ -34,22 +34,21 @@ void VLTorviAudioFilePlayerItem::startObserving(NotificationCenter& notification
             if (auto self = weakSelf.lock())
                 self->_reportStatus();
         });
-    didReachEnd_ = addObserver(notifications, MediaItem::didPlayToEndTime,
-                               &VLTorviAudioFilePlayerItem::_playerItemDidReachEnd);
-    failedToReachEnd_ = addObserver(notifications, MediaItem::failedToPlayToEndTime,
-                                    &VLTorviAudioFilePlayerItem::_playerItemFailedToReachEnd);
-    timeJumped_ =
-        addObserver(notifications, MediaItem::timeJumped, &VLTorviAudioFilePlayerItem::_playerItemTimeJumped);
+    notifications_ = notifications.addObserver(
+        {MediaItem::didPlayToEndTime, MediaItem::failedToPlayToEndTime, MediaItem::timeJumped},
+        playerItem_.get(), [weakSelf = weak_from_this()](const Notification& notification) {
+            if (auto self = weakSelf.lock())
+                self->handleNotification(notification.name);
+        });
 }
 
-RegistrationHandle VLTorviAudioFilePlayerItem::addObserver(NotificationCenter& notifications,
-                                                           std::string_view name,
-                                                           void (VLTorviAudioFilePlayerItem::*handler)()) {
-    return notifications.addObserver(name, playerItem_.get(),
-                                     [weakSelf = weak_from_this(), handler](const Notification&) {
-                                         if (auto self = weakSelf.lock())
-                                             (self.get()->*handler)();
-                                     });
+void VLTorviAudioFilePlayerItem::handleNotification(std::string_view name) {
+    if (name == MediaItem::didPlayToEndTime)
+        _playerItemDidReachEnd();
+    else if (name == MediaItem::failedToPlayToEndTime)
+        _playerItemFailedToReachEnd();
+    else
+        _playerItemTimeJumped();
 }
 
 void VLTorviAudioFilePlayerItem::_reportStatus() {

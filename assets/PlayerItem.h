@@ -40,9 +40,7 @@ private:
                                std::shared_ptr<EventSink> audioServer);
 
     void startObserving(NotificationCenter& notifications);
-    RegistrationHandle addObserver(NotificationCenter& notifications, std::string_view name,
-                                   void (VLTorviAudioFilePlayerItem::*handler)());
-
+    void handleNotification(std::string_view name);
     void _reportStatus();
     void _playerItemDidReachEnd();
     void _playerItemFailedToReachEnd();
@@ -55,9 +53,7 @@ private:
     std::unique_ptr<VLTorviKeyValueObserverHelper> statusObserver_;
     const std::shared_ptr<EventSink> audioServer_;
     const std::string identifier_;
-    RegistrationHandle didReachEnd_;
-    RegistrationHandle failedToReachEnd_;
-    RegistrationHandle timeJumped_;
+    RegistrationHandle notifications_;
     LiveObject<"player item"> live_;
 };
 

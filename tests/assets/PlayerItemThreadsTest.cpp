@@ -1,0 +1,85 @@
+#include <gtest/gtest.h>
+
+#include <atomic>
+#include <thread>
+
+#include "assets/PlayerItem.h"
+#include "platform/core/LocalNotificationCenter.h"
+#include "platform/core/ObserverList.h"
+
+namespace tarn {
+namespace {
+
+/// A media item whose status the test sets, on real threads.
+class ScriptedItem final : public MediaItem {
+public:
+    RegistrationHandle observe(std::string_view keyPath, Block block) override {
+        return observers_.observe(keyPath, std::move(block));
+    }
+    MediaStatus status() const override { return status_; }
+    std::optional<Error> error() const override { return std::nullopt; }
+    const std::shared_ptr<MediaAsset>& asset() const override { return asset_; }
+    MediaTime currentTime() const override { return MediaTime::zero(); }
+    void seekToTime(MediaTime) override {}
+
+    void setStatus(MediaStatus status) {
+        status_ = status;
+        observers_.changed(statusKeyPath);
+    }
+
+private:
+    std::atomic<MediaStatus> status_ = MediaStatus::unknown;
+    const std::shared_ptr<MediaAsset> asset_;
+    ObserverList observers_{
+        *this, [this](std::string_view) { return ObservedValue(static_cast<std::int64_t>(status_.load())); }};
+};
+
+class CountingSink final : public EventSink {
+public:
+    void sendData(const Data&) override { ++count; }
+    std::atomic<int> count = 0;
+};
+
+// Reports and the last reference meet on the threads that report.
+TEST(PlayerItemThreadsTest, ReportsWhileItIsMadeAndDestroyed) {
+    constexpr int rounds = 2000;
+    LocalNotificationCenter notifications;
+    auto media = std::make_shared<ScriptedItem>();
+    auto sink = std::make_shared<CountingSink>();
+    std::atomic<bool> finished = false;
+    std::jthread poster([&] {
+        while (!finished)
+            notifications.post({MediaItem::timeJumped, static_cast<MediaItem*>(media.get()), {}});
+    });
+    // One change a round: whoever reports goes on as long as there are changes.
+    std::atomic<int> round = 0;
+    std::jthread changer([&] {
+        for (int seen = 0; seen < rounds; ++seen) {
+            round.wait(seen);
+            media->setStatus(MediaStatus::readyToPlay);
+        }
+    });
+    std::weak_ptr<VLTorviAudioFilePlayerItem> last;
+    while (round < rounds) {
+        ++round;
+        round.notify_one();
+        last = VLTorviAudioFilePlayerItem::initWithPlayerItem(notifications, media, "item", sink);
+    }
+    finished = true;
+    poster.join();
+    changer.join();
+    EXPECT_TRUE(last.expired());
+    EXPECT_GE(sink->count, rounds); // at least the first status of each
+}
+
+TEST(PlayerItemThreadsTest, SaysNothingWithoutAServiceToSayItTo) {
+    LocalNotificationCenter notifications;
+    auto media = std::make_shared<ScriptedItem>();
+    auto item = VLTorviAudioFilePlayerItem::initWithPlayerItem(notifications, media, "item", nullptr);
+    media->setStatus(MediaStatus::failed);
+    notifications.post({MediaItem::didPlayToEndTime, static_cast<MediaItem*>(media.get()), {}});
+    EXPECT_EQ(item->playerItem(), media);
+}
+
+} // namespace
+} // namespace tarn
