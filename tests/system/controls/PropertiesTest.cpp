@@ -123,11 +123,10 @@ TEST_F(PropertiesTest, TheObjectDescribesItselfAndAnswersPings) {
 TEST_F(PropertiesTest, HostileTextsAreShownCleanAndCostNothing) {
     bringPlayer(track("First", 0, 0));
     ASSERT_TRUE(listener_.waitForPlayer());
-    for (const std::string& text : {std::string("nul\0inside", 10), std::string("\xff\xfe\x80"),
-                                    std::string("\xed\xa0\x80\xf4\x90\x80\x80"),
-                                    std::string("\xef\xbf\xbe\xef\xb7\x90"), std::string(1 << 20, '\n'),
-                                    std::string("\xe2\x80\xae"
-                                                "txt.exe")}) {
+    for (const std::string& text :
+         {std::string("nul\0inside", 10), std::string("\xff\xfe\x80"),
+          std::string("\xed\xa0\x80\xf4\x90\x80\x80"), std::string("\xef\xbf\xbe\xef\xb7\x90"),
+          std::string(1 << 20, '\n'), std::string("\xe2\x80\xaetxt.exe\xe2\x80\xac")}) {
         publish({.title = text,
                  .duration = 1e300,
                  .elapsedTime = -5.0,
