@@ -23,10 +23,10 @@ bool isFilled(const std::optional<std::string>& text) { return text && !text->em
 
 /// The value of the file's first tag of that key; `otherwise` when it has no such tag.
 std::optional<std::string> tagOfFile(const MediaAsset& asset, std::string_view key,
-                                     std::optional<std::string> otherwise) {
+                                     const std::optional<std::string>& otherwise) {
     auto tags = MediaMetadataItem::metadataItemsFromArray(asset.commonMetadata(), key,
                                                           MediaMetadataItem::commonKeySpace);
-    return tags.empty() ? std::move(otherwise) : tags.front().stringValue();
+    return tags.empty() ? otherwise : tags.front().stringValue();
 }
 
 MediaAssetOutcome openedAsset(MediaEngine& media, const std::string& URL) {
@@ -49,8 +49,8 @@ std::string reasonOf(const Error& error) {
 VLTorviAudioFilePlayerAssetManager::VLTorviAudioFilePlayerAssetManager(const Platform& platform)
     : VLTorviAudioFilePlayerObjectManager(platform, "VLTorviAudioFilePlayerAssetManager") {}
 
-void VLTorviAudioFilePlayerAssetManager::handleMessage(std::shared_ptr<VLProtoAudioFilePlayerAsset> message,
-                                                       Reply reply) {
+void VLTorviAudioFilePlayerAssetManager::handleMessage(
+    const std::shared_ptr<VLProtoAudioFilePlayerAsset>& message, Reply reply) {
     using Message = VLProtoAudioFilePlayerAsset;
     using Manager = VLTorviAudioFilePlayerAssetManager;
     static constexpr std::tuple commands{

@@ -22,7 +22,7 @@ public:
     explicit VLTorviAudioFilePlayerAssetManager(const Platform& platform);
 
     /// Serves the first command that the message holds.
-    void handleMessage(std::shared_ptr<VLProtoAudioFilePlayerAsset> message, Reply reply);
+    void handleMessage(const std::shared_ptr<VLProtoAudioFilePlayerAsset>& message, Reply reply);
 
     /// With a URL: opens the file with the right that the token gives, and stores a new record. Without:
     /// updates the texts of the record that is there.

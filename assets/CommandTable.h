@@ -23,6 +23,10 @@ struct Command {
     }
 };
 
+template <class Message, class Payload, class Manager>
+Command(const std::shared_ptr<Payload>& (Message::*)() const, void (Manager::*)(const Payload&, Reply))
+    -> Command<Message, Payload, Manager>;
+
 /// Serves the first command of `table` that the message holds; the rows behind it are not looked at. Without
 /// any, the reply is let go unanswered.
 template <class Manager, class Message, class... Rows>

@@ -23,7 +23,7 @@ std::string_view pathOfURL(std::string_view URL) {
 }
 
 std::optional<char> hexadecimalByte(std::string_view digits) {
-    unsigned value = 0;
+    std::size_t value = 0;
     for (char digit : digits) {
         std::size_t place = std::string_view("0123456789abcdef0123456789ABCDEF").find(digit);
         if (place == std::string_view::npos)

@@ -31,8 +31,8 @@ void VLTorviAudioFilePlayerItemManager::setAssetManager(
     assetManager_.withLocked([&](auto& current) { current.swap(assetManager); });
 }
 
-void VLTorviAudioFilePlayerItemManager::handleMessage(std::shared_ptr<VLProtoAudioFilePlayerItem> message,
-                                                      Reply reply) {
+void VLTorviAudioFilePlayerItemManager::handleMessage(
+    const std::shared_ptr<VLProtoAudioFilePlayerItem>& message, Reply reply) {
     using Message = VLProtoAudioFilePlayerItem;
     using Manager = VLTorviAudioFilePlayerItemManager;
     static constexpr std::tuple commands{

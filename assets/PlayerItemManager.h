@@ -26,7 +26,7 @@ public:
     void setAssetManager(std::shared_ptr<VLTorviAudioFilePlayerAssetManager> assetManager);
 
     /// Serves the first command that the message holds.
-    void handleMessage(std::shared_ptr<VLProtoAudioFilePlayerItem> message, Reply reply);
+    void handleMessage(const std::shared_ptr<VLProtoAudioFilePlayerItem>& message, Reply reply);
 
     /// The item's first status is pushed to the client before the reply. An item that had the identifier
     /// reports no more; a queue player that holds its media item keeps it.

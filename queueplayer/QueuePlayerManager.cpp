@@ -40,7 +40,7 @@ void VLTorviAudioFilePlayerQueuePlayerManager::setAssetManager(
 }
 
 void VLTorviAudioFilePlayerQueuePlayerManager::handleMessage(
-    std::shared_ptr<VLProtoAudioFileQueuePlayer> message, Reply reply) {
+    const std::shared_ptr<VLProtoAudioFileQueuePlayer>& message, Reply reply) {
     using Message = VLProtoAudioFileQueuePlayer;
     using Manager = VLTorviAudioFilePlayerQueuePlayerManager;
     static constexpr std::tuple commands{

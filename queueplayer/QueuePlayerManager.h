@@ -32,7 +32,7 @@ public:
     void setAssetManager(std::shared_ptr<VLTorviAudioFilePlayerAssetManager> assetManager);
 
     /// Serves the first command that the message holds, in the order of the table, not of the fields.
-    void handleMessage(std::shared_ptr<VLProtoAudioFileQueuePlayer> message, Reply reply);
+    void handleMessage(const std::shared_ptr<VLProtoAudioFileQueuePlayer>& message, Reply reply);
 
     /// The new player's status, rate and current item are pushed to the client before the reply. A player
     /// that had the identifier is let go, and with it its sound.

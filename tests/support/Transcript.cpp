@@ -109,12 +109,11 @@ std::function<void()> Transcript::actFor(const std::string& line) {
     return isAwaited ? std::exchange(act_, nullptr) : nullptr;
 }
 
-Reply Transcript::makeReply(std::string command, Decode decode) {
-    return Reply(
-        std::make_unique<TranscriptCallback>(shared_from_this(), std::move(command), std::move(decode)));
+Reply Transcript::makeReply(const std::string& command, Decode decode) {
+    return Reply(std::make_unique<TranscriptCallback>(shared_from_this(), command, std::move(decode)));
 }
 
-void Transcript::add(std::string line) {
+void Transcript::add(const std::string& line) {
     std::lock_guard lock(mutex_);
     lines_ += line + '\n';
 }

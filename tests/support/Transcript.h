@@ -26,8 +26,8 @@ public:
 
     /// A reply whose outcome becomes a line that begins with `command`; its data is read as a `Payload`.
     template <class Payload>
-    Reply reply(std::string command) {
-        return makeReply(std::move(command), [](const Data& data) -> std::shared_ptr<ProtoCodable> {
+    Reply reply(const std::string& command) {
+        return makeReply(command, [](const Data& data) -> std::shared_ptr<ProtoCodable> {
             return Payload::fromData(data);
         });
     }
@@ -35,7 +35,7 @@ public:
     /// Runs `act` once, inside the next push whose line holds `text`, on its thread.
     void whenPushed(std::string text, std::function<void()> act);
 
-    void add(std::string line);
+    void add(const std::string& line);
 
     /// The lines since the last call, each with a line end.
     std::string take();
@@ -43,7 +43,7 @@ public:
 private:
     using Decode = std::function<std::shared_ptr<ProtoCodable>(const Data&)>;
 
-    Reply makeReply(std::string command, Decode decode);
+    Reply makeReply(const std::string& command, Decode decode);
 
     std::function<void()> actFor(const std::string& line);
 
