@@ -17,6 +17,7 @@ using namespace std::chrono_literals;
 
 constexpr char restoreKey[] = "module-stream-restore.id";
 constexpr char restoreId[] = "sink-input-by-application-id:ostrel.tarnd";
+constexpr std::int64_t longestSilence = 60; // seconds; more is no count but "unknown"
 constexpr std::uint32_t whatever = static_cast<std::uint32_t>(-1);
 
 struct Properties {
@@ -181,7 +182,10 @@ std::optional<PulseStream::Timing> PulseStream::timing() const {
     timing.readIndex = info->read_index / size;
     timing.latency = std::chrono::microseconds(info->sink_usec);
     timing.time = std::chrono::steady_clock::now().time_since_epoch() - ageOf(info->timestamp);
-    timing.playing = info->playing != 0;
+    const bool ranDry = info->playing == 0 && info->read_index > 0 && info->read_index >= info->write_index;
+    timing.playing = info->playing != 0 || ranDry;
+    if (ranDry && info->since_underrun < longestSilence * format_.rate * size)
+        timing.silence = static_cast<std::int64_t>(info->since_underrun) / size;
     return timing;
 }
 

@@ -45,7 +45,8 @@ public:
         std::int64_t readIndex = 0;           ///< what has left for the device by then
         std::chrono::microseconds latency{0}; ///< from there to the ear
         std::chrono::nanoseconds time{0};     ///< by the steady clock
-        bool playing = false;
+        std::int64_t silence = 0;             ///< what has left behind it since the stream ran dry
+        bool playing = false;                 ///< some of it, or all, is on its way to the ear
     };
 
     /// A stream with a buffer of `bufferFrames`. `listener` outlives it.

@@ -16,6 +16,7 @@ constexpr auto blendLength = 5ms;
 constexpr auto serverPatience = 500ms;
 constexpr auto streamRetry = 1500ms;
 constexpr auto timingRetry = 40ms;
+constexpr nanoseconds slowTimingRetry = 1s; // for a device that takes its time to begin
 constexpr int mostTimingTries = 25;
 constexpr auto renderingMargin = 25ms; // for rendering a piece and taking it to the server
 
@@ -243,12 +244,12 @@ void SystemOutput::streamTimingUpdated() {
     }
     latency_ = std::max(latency_, timing->latency);
     if (timing->playing)
-        clock_.run(base_ + timing->readIndex - framesIn(timing->latency), timing->time);
+        clock_.run(base_ + timing->readIndex + timing->silence - framesIn(timing->latency), timing->time);
     armWritable();
     if (timing->playing && timing->readIndex > 0 && timingTries_ > 0)
         return;
-    if (++timingTries_ < mostTimingTries)
-        timingTimer_ = loop_.at(loop_.now() + timingRetry, [this] { stream_->updateTiming(); });
+    const nanoseconds pause = ++timingTries_ < mostTimingTries ? timingRetry : slowTimingRetry;
+    timingTimer_ = loop_.at(loop_.now() + pause, [this] { stream_->updateTiming(); });
 }
 
 // -- Writing.
