@@ -6,7 +6,7 @@
 
 namespace tarn {
 
-/// Encoded messages as a service sees them, in a fixed random order, 73 bytes each on average.
+/// Encoded messages as a service sees them, in a fixed random order, 56 bytes each on average.
 ///
 /// Of 1,000 messages: a client mirrors its library (asset and item upserts, appended items, destroyed
 /// objects), asks for the time twice as often as anything else happens, and now and then sets rate and
