@@ -88,8 +88,9 @@ class SoundServer:
 class AnInstalledPackage(unittest.TestCase):
     @classmethod
     def setUpClass(cls):
-        # Not in /tmp, which the unit's service has for itself.
-        cls.folder = pathlib.Path(cls.enterClassContext(tempfile.TemporaryDirectory(dir=BUILD)))
+        # Not in /tmp, which the confined service has for itself.
+        place = "/var/tmp" if BUILD.resolve().is_relative_to("/tmp") else BUILD
+        cls.folder = pathlib.Path(cls.enterClassContext(tempfile.TemporaryDirectory(dir=place)))
         cls.root = cls.folder / "root"
         cls.package = make_package(cls.folder)
         install(cls.package, cls.root)
