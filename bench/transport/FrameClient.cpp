@@ -18,10 +18,7 @@ using SteadyTime = std::chrono::steady_clock;
 } // namespace
 
 FrameClient::FrameClient(FileDescriptor socket, Data call, FrameReader::Sender sender)
-    : socket_(std::move(socket)),
-      call_(std::move(call)),
-      reader_(sender),
-      buffer_(bufferSize) {}
+    : socket_(std::move(socket)), call_(std::move(call)), reader_(sender), buffer_(bufferSize) {}
 
 void FrameClient::send(int calls) {
     Data bytes;
