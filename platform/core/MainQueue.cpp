@@ -8,10 +8,11 @@
 namespace tarn {
 
 void MainQueue::async(std::function<void()> work) {
-    std::lock_guard lock(mutex_);
-    line_.push_back(std::move(work));
-    if (line_.size() == 1)
-        changed_.notify_one();
+    {
+        std::lock_guard lock(mutex_);
+        line_.push_back(std::move(work));
+    }
+    changed_.notify_one(); // without the lock, which the main thread wants at once
 }
 
 void MainQueue::sync(const std::function<void()>& work) {

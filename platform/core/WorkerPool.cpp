@@ -14,10 +14,11 @@ WorkerPool::~WorkerPool() {
     assert(currentWorker_ == nullptr || &currentWorker_->pool != this);
     std::unique_lock lock(mutex_);
     stopping_ = true;
-    wake_.notify_all();
-    retired_.wait(lock, [this] { return threads_.empty(); });
-    for (auto& thread : finished_)
-        thread.join();
+    for (const auto& worker : idle_)
+        worker->wake.notify_one();
+    retired_.wait(lock, [this] { return workers_.empty(); });
+    for (const auto& worker : finished_)
+        worker->thread.join();
 }
 
 void WorkerPool::schedule(std::shared_ptr<Task> task) {
@@ -30,37 +31,56 @@ void WorkerPool::schedule(std::shared_ptr<Task> task) {
 
 std::size_t WorkerPool::threads() const {
     std::lock_guard lock(mutex_);
-    return threads_.size();
+    return workers_.size();
 }
 
+/// A worker that wakes up wants the lock, so it is woken without.
 void WorkerPool::makeReady(std::shared_ptr<Task> task) {
-    std::lock_guard lock(mutex_);
-    ready_.push_back(std::move(task));
-    wakeOrSpawnLocked();
+    std::shared_ptr<Worker> woken;
+    {
+        std::lock_guard lock(mutex_);
+        woken = giveLocked(std::move(task));
+    }
+    if (woken != nullptr)
+        woken->wake.notify_one();
 }
 
-/// Sees to it that a worker comes for the last ready task. Those before it have theirs on the way.
-void WorkerPool::wakeOrSpawnLocked() {
-    if (ready_.empty())
-        return;
-    if (idle_ >= ready_.size()) {
-        wake_.notify_one();
-        return;
+/// Gives the task to an idle worker and returns it, to be woken. Without one the task waits for a new worker,
+/// or for the next that is done.
+std::shared_ptr<WorkerPool::Worker> WorkerPool::giveLocked(std::shared_ptr<Task> task) {
+    if (idle_.empty()) {
+        ready_.push_back(std::move(task));
+        spawnLocked();
+        return nullptr;
     }
-    std::size_t running = threads_.size() - idle_ - blocked_;
-    if (running >= maxRunning || threads_.size() >= maxThreads)
-        return; // the next worker that is done takes it
-    auto self = threads_.emplace(threads_.end());
-    *self = std::thread([this, self] { work(self); });
+    auto worker = std::move(idle_.back());
+    idle_.pop_back();
+    worker->given = std::move(task);
+    return worker;
+}
+
+/// Makes a worker, unless enough of them run or live.
+void WorkerPool::spawnLocked() {
+    const std::size_t running = workers_.size() - idle_.size() - blocked_;
+    if (running >= maxRunning || workers_.size() >= maxThreads)
+        return;
+    const auto self = workers_.insert(workers_.end(), std::make_shared<Worker>(*this));
+    (*self)->thread = std::thread([this, self] { work(self); });
 }
 
 void WorkerPool::beginBlocking(Worker& worker) {
     worker.blocked = true;
-    std::lock_guard lock(mutex_);
-    if (worker.next != nullptr)
-        ready_.push_back(std::move(worker.next));
-    ++blocked_;
-    wakeOrSpawnLocked();
+    std::shared_ptr<Worker> woken;
+    {
+        std::lock_guard lock(mutex_);
+        ++blocked_;
+        if (worker.next != nullptr)
+            woken = giveLocked(std::move(worker.next));
+        else if (!ready_.empty())
+            spawnLocked();
+    }
+    if (woken != nullptr)
+        woken->wake.notify_one();
 }
 
 void WorkerPool::endBlocking(Worker& worker) {
@@ -69,12 +89,16 @@ void WorkerPool::endBlocking(Worker& worker) {
     --blocked_;
 }
 
-void WorkerPool::work(Threads::iterator self) {
-    Worker worker{*this, nullptr, false};
-    currentWorker_ = &worker;
+void WorkerPool::work(Workers::iterator self) {
+    Worker* worker = nullptr;
+    {
+        std::lock_guard lock(mutex_); // whoever made this worker may still be about it
+        worker = self->get();
+    }
+    currentWorker_ = worker;
     joinFinished();
     while (auto task = waitForTask(self))
-        runSlices(worker, std::move(task));
+        runSlices(*worker, std::move(task));
 }
 
 void WorkerPool::runSlices(Worker& worker, std::shared_ptr<Task> task) {
@@ -102,6 +126,10 @@ std::shared_ptr<WorkerPool::Task> WorkerPool::takeNext(Worker& worker) {
     if (worker.next != nullptr)
         return std::exchange(worker.next, nullptr);
     std::lock_guard lock(mutex_);
+    return takeReadyLocked();
+}
+
+std::shared_ptr<WorkerPool::Task> WorkerPool::takeReadyLocked() {
     if (ready_.empty())
         return nullptr;
     auto task = std::move(ready_.front());
@@ -110,37 +138,33 @@ std::shared_ptr<WorkerPool::Task> WorkerPool::takeNext(Worker& worker) {
 }
 
 /// Null when the thread shall end.
-std::shared_ptr<WorkerPool::Task> WorkerPool::waitForTask(Threads::iterator self) {
+std::shared_ptr<WorkerPool::Task> WorkerPool::waitForTask(Workers::iterator self) {
     std::unique_lock lock(mutex_);
-    if (ready_.empty() && !stopping_ && idle_ < maxIdle) {
-        ++idle_;
-        wake_.wait(lock, [this] { return !ready_.empty() || stopping_; });
-        --idle_;
+    Worker& worker = **self;
+    if (auto task = takeReadyLocked())
+        return task;
+    if (!stopping_ && idle_.size() < maxIdle) {
+        idle_.push_back(*self);
+        worker.wake.wait(lock, [&] { return worker.given != nullptr || stopping_; });
+        if (worker.given != nullptr)
+            return std::exchange(worker.given, nullptr);
+        std::erase(idle_, *self);
     }
-    if (ready_.empty()) {
-        retireLocked(self);
-        return nullptr;
-    }
-    auto task = std::move(ready_.front());
-    ready_.pop_front();
-    return task;
-}
-
-void WorkerPool::retireLocked(Threads::iterator self) {
-    finished_.splice(finished_.end(), threads_, self);
+    finished_.splice(finished_.end(), workers_, self);
     retired_.notify_all();
+    return nullptr;
 }
 
 void WorkerPool::joinFinished() {
-    Threads finished;
+    Workers finished;
     {
         std::lock_guard lock(mutex_);
         if (stopping_)
             return;
         finished.swap(finished_);
     }
-    for (auto& thread : finished)
-        thread.join();
+    for (const auto& worker : finished)
+        worker->thread.join();
 }
 
 BlockingSection::BlockingSection() : entered_(false) {

@@ -8,6 +8,7 @@
 #include <memory>
 #include <mutex>
 #include <thread>
+#include <vector>
 
 namespace tarn {
 
@@ -51,34 +52,41 @@ public:
 
 private:
     friend class BlockingSection;
-    using Threads = std::list<std::thread>;
 
     struct Worker {
+        explicit Worker(WorkerPool& owner) : pool(owner) {}
+
         WorkerPool& pool;
         std::shared_ptr<Task> next; // to be taken up by this worker when it is done with its own
-        bool blocked;               // in a BlockingSection
+        bool blocked = false;       // in a BlockingSection
+
+        // Under the pool's lock.
+        std::thread thread;
+        std::condition_variable wake;
+        std::shared_ptr<Task> given; // to an idle worker, which then wakes up
     };
+    using Workers = std::list<std::shared_ptr<Worker>>;
 
     void makeReady(std::shared_ptr<Task> task);
-    void wakeOrSpawnLocked();
+    std::shared_ptr<Worker> giveLocked(std::shared_ptr<Task> task);
+    void spawnLocked();
     void beginBlocking(Worker& worker);
     void endBlocking(Worker& worker);
-    void work(Threads::iterator self);
+    void work(Workers::iterator self);
     void runSlices(Worker& worker, std::shared_ptr<Task> task);
     std::shared_ptr<Task> takeNext(Worker& worker);
-    std::shared_ptr<Task> waitForTask(Threads::iterator self);
-    void retireLocked(Threads::iterator self);
+    std::shared_ptr<Task> takeReadyLocked();
+    std::shared_ptr<Task> waitForTask(Workers::iterator self);
     void joinFinished();
 
     static thread_local Worker* currentWorker_;
 
     mutable std::mutex mutex_;
-    std::condition_variable wake_;
     std::condition_variable retired_;
-    std::deque<std::shared_ptr<Task>> ready_;
-    Threads threads_;
-    Threads finished_; // left work() or are about to; to be joined
-    std::size_t idle_ = 0;
+    std::deque<std::shared_ptr<Task>> ready_; // empty while a worker is idle
+    Workers workers_;
+    Workers finished_;                          // left work() or are about to; to be joined
+    std::vector<std::shared_ptr<Worker>> idle_; // the last one worked last: its memory is the warmest
     std::size_t blocked_ = 0;
     bool stopping_ = false;
 };
