@@ -44,7 +44,7 @@ private:
 
 } // namespace
 
-RunningService::RunningService(std::vector<std::string> environment) {
+RunningService::RunningService(std::vector<std::string> environment, const std::string& program) {
     const std::string folder = folder_.path();
     const std::string readyPath = folder + "/ready";
     const ReadySocket ready(readyPath);
@@ -55,7 +55,7 @@ RunningService::RunningService(std::vector<std::string> environment) {
                        {"XDG_RUNTIME_DIR=" + folder, "HOME=" + folder, "XDG_DATA_HOME=" + folder + "/data",
                         "XDG_DATA_DIRS=" + folder + "/none", "NOTIFY_SOCKET=" + readyPath, "LANG=C",
                         "DBUS_SYSTEM_BUS_ADDRESS=unix:path=/nonexistent"});
-    process_ = std::make_unique<ChildProcess>(std::vector<std::string>{TARND}, environment,
+    process_ = std::make_unique<ChildProcess>(std::vector<std::string>{program}, environment,
                                               ChildProcess::ErrorOutput::withOutput);
     ready.waitForReady();
 }

@@ -14,8 +14,9 @@ namespace tarn {
 class RunningService final {
 public:
     /// Returns when the service is ready. `environment` says where the sound server and the session bus are.
-    explicit RunningService(std::vector<std::string> environment);
+    RunningService(std::vector<std::string> environment, const std::string& program);
 
+    pid_t pid() const { return process_->pid(); }
     std::string socketPath() const { return folder_ / "ostrel.tarnd"; }
     const TemporaryFolder& folder() const { return folder_; }
 

@@ -89,7 +89,7 @@ protected:
 
     SoundServerProcess sound_{{"module-role-cork"}};
     PrivateBus bus_;
-    RunningService service_{serviceEnvironment()};
+    RunningService service_{serviceEnvironment(), TARND};
     client::Client client_{{.socketPath = service_.socketPath()}};
     BusListener listener_{bus_.address()};
 };
