@@ -15,8 +15,8 @@ public:
 
     virtual ~RemoteCommand() = default;
 
-    /// `handler` runs on the thread that delivers remote commands, never two at a time; it may block for 17
-    /// seconds.
+    /// `handler` runs on the thread that delivers remote commands, one after the other, and may block for 17
+    /// seconds. Only the pause before the system sleeps does not wait for that: it comes on another thread.
     [[nodiscard]] virtual RegistrationHandle addTarget(Handler handler) = 0;
     virtual void setEnabled(bool enabled) = 0;
 };

@@ -17,7 +17,7 @@ enum class RemoteCommandKind : std::uint8_t { pause, play, togglePlayPause, next
 /// succeeds, and otherwise have the newest one's result.
 ///
 /// Every command center is one of these with something in front of it that calls deliver(). Any thread may
-/// call, except deliver(). Registrations may outlive it.
+/// call. Registrations may outlive it.
 class RemoteTargets final : public RemoteCommandCenter {
 public:
     /// `changed` runs after a command has gained its first target, lost its last one, or was enabled or
@@ -35,8 +35,9 @@ public:
     /// Is the command enabled and has it a target?
     bool offers(RemoteCommandKind kind) const;
 
-    /// Runs the handlers on the calling thread, which is always the same one: the thread that delivers remote
-    /// commands. A target that goes meanwhile is not asked any more. What is not offered has no such content.
+    /// Runs the handlers on the calling thread: the one that delivers remote commands, or, for an urgent
+    /// pause, another one beside it. A target that goes meanwhile is not asked any more. What is not offered
+    /// has no such content.
     RemoteCommandResult deliver(RemoteCommandKind kind);
 
 private:

@@ -31,7 +31,7 @@ public:
           mpris_(loop_, commands_, serviceName),
           session_(loop_.event(), std::move(addresses.sessionBus), "session bus",
                    BusConnection::Report::outages, mpris_),
-          sleep_(loop_, commands_, std::move(addresses.systemBus)) {
+          sleep_(loop_, targets_, commands_, std::move(addresses.systemBus)) {
         loop_.start();
     }
 

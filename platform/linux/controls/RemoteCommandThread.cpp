@@ -29,6 +29,11 @@ bool RemoteCommandThread::deliver(RemoteCommandKind kind, Completion completion)
     return true;
 }
 
+bool RemoteCommandThread::isBusy() {
+    const std::lock_guard lock(mutex_);
+    return delivering_ || !waiting_.empty();
+}
+
 void RemoteCommandThread::run() {
     pthread_setname_np(pthread_self(), "remote commands");
     std::unique_lock lock(mutex_);
@@ -38,9 +43,11 @@ void RemoteCommandThread::run() {
             return;
         const Delivery delivery = std::move(waiting_.front());
         waiting_.pop_front();
+        delivering_ = true;
         lock.unlock();
         delivery.completion(targets_.deliver(delivery.kind));
         lock.lock();
+        delivering_ = false;
     }
 }
 

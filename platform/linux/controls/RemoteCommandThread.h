@@ -32,6 +32,9 @@ public:
     /// Returns at once; false, and never a call of `completion`, when too many commands wait already.
     [[nodiscard]] bool deliver(RemoteCommandKind kind, Completion completion);
 
+    /// Is a command being delivered, or waiting to be?
+    bool isBusy();
+
 private:
     struct Delivery {
         RemoteCommandKind kind;
@@ -44,6 +47,7 @@ private:
     std::mutex mutex_;
     std::condition_variable changed_;
     std::deque<Delivery> waiting_;
+    bool delivering_ = false;
     bool ending_ = false;
     std::thread thread_;
 };

@@ -17,8 +17,10 @@ constexpr char loginInterface[] = "org.freedesktop.login1.Manager";
 
 } // namespace
 
-SleepGuard::SleepGuard(BusLoop& loop, RemoteCommandThread& commands, std::string systemBusAddress)
+SleepGuard::SleepGuard(BusLoop& loop, RemoteTargets& targets, RemoteCommandThread& commands,
+                       std::string systemBusAddress)
     : loop_(loop),
+      targets_(targets),
       commands_(commands),
       connection_(loop.event(), std::move(systemBusAddress), "system bus", BusConnection::Report::nothing,
                   *this) {}
@@ -87,16 +89,21 @@ int SleepGuard::handlePrepareForSleep(sd_bus_message* message, void* guard, sd_b
             self.takeLocks(); // something was told to play while the system fell asleep
         return 0;
     }
-    if (!self.playing_)
-        return 0;
-    SystemLog::message(method, __LINE__, "%{public}s:%d: Pausing before the system sleeps.");
-    const bool taken =
-        self.commands_.deliver(RemoteCommandKind::pause, [&loop = self.loop_, &self](RemoteCommandResult) {
-            loop.post([&self] { self.sleep_.release(); });
-        });
-    if (!taken)
-        self.sleep_.release();
+    if (self.playing_ || self.commands_.isBusy())
+        self.pause();
     return 0;
+}
+
+void SleepGuard::pause() {
+    SystemLog::message(method, __LINE__, "%{public}s:%d: Pausing before the system sleeps.");
+    if (!pauses_)
+        pauses_.emplace(targets_);
+    const bool taken = pauses_->deliver(
+        RemoteCommandKind::pause, [this](RemoteCommandResult) { loop_.post([this] { sleep_.release(); }); });
+    if (!taken)
+        sleep_.release();
+    if (commands_.isBusy()) // with too many waiting, this one is let go: nobody waits for it
+        static_cast<void>(commands_.deliver(RemoteCommandKind::pause, [](RemoteCommandResult) {}));
 }
 
 } // namespace tarn

@@ -31,10 +31,12 @@ public:
         result_ = result;
     }
 
-    /// From now on handlers wait for letGo(), like a play whose activation takes its time.
-    void hold() {
+    /// From now on handlers, or those of one command, wait for letGo(), like a play whose activation takes
+    /// its time.
+    void hold(const std::string& command = "") {
         const std::lock_guard lock(mutex_);
         held_ = true;
+        heldCommand_ = command;
     }
 
     void letGo() {
@@ -63,7 +65,7 @@ private:
         std::unique_lock lock(mutex_);
         commands_.emplace_back(name);
         changed_.notify_all();
-        changed_.wait(lock, [&] { return !held_; });
+        changed_.wait(lock, [&] { return !held_ || (!heldCommand_.empty() && heldCommand_ != name); });
         return result_;
     }
 
@@ -72,6 +74,7 @@ private:
     std::vector<std::string> commands_;
     RemoteCommandResult result_ = RemoteCommandResult::success;
     bool held_ = false;
+    std::string heldCommand_; // empty: every one
     std::vector<RegistrationHandle> registrations_;
 };
 

@@ -50,6 +50,49 @@ TEST_F(SleepTest, SleepWaitsForThePause) {
     EXPECT_THAT(player_->commands(), ElementsAre("pause")); // nothing resumed by itself
 }
 
+TEST_F(SleepTest, APlayThatTakesItsTimeDoesNotHoldUpThePause) {
+    controls_ = std::make_unique<LinuxMediaControls>(
+        applicationName, LinuxMediaControls::Addresses{bus_.address(), bus_.address()});
+    FakeLoginManager manager(bus_.address());
+    BusListener listener(bus_.address());
+    bringPlayer(track("First", 0, 1));
+    ASSERT_TRUE(listener.waitForPlayer());
+    ASSERT_TRUE(manager.waitForLocks({"idle:block", "sleep:delay"}));
+    player_->hold("play");
+    listener.begin("Play");
+    ASSERT_TRUE(player_->waitForCommands(1));
+
+    manager.prepareForSleep(true);
+    EXPECT_TRUE(manager.waitForLocks({"idle:block"}));
+    EXPECT_THAT(player_->commands(), ElementsAre("play", "pause"));
+    EXPECT_EQ(listener.answer(std::chrono::milliseconds(0)), std::nullopt);
+
+    player_->letGo();
+    EXPECT_EQ(listener.answer(std::chrono::seconds(10)), "");
+    ASSERT_TRUE(player_->waitForCommands(3));
+    EXPECT_THAT(player_->commands(), ElementsAre("play", "pause", "pause")); // it does not play on either
+}
+
+TEST_F(SleepTest, APlayUnderWayDoesNotBeginInTheMiddleOfTheSleep) {
+    controls_ = std::make_unique<LinuxMediaControls>(
+        applicationName, LinuxMediaControls::Addresses{bus_.address(), bus_.address()});
+    FakeLoginManager manager(bus_.address());
+    BusListener listener(bus_.address());
+    bringPlayer(track("First", 0, 1));
+    ASSERT_TRUE(manager.waitForLocks({"idle:block", "sleep:delay"}));
+    publish(track("First", 5, 0));
+    ASSERT_TRUE(manager.waitForLocks({}));
+    ASSERT_TRUE(listener.waitForPlayer());
+    player_->hold("play");
+    listener.begin("Play");
+    ASSERT_TRUE(player_->waitForCommands(1));
+    manager.prepareForSleep(true);
+    ASSERT_TRUE(player_->waitForCommands(2));
+    player_->letGo();
+    ASSERT_TRUE(player_->waitForCommands(3));
+    EXPECT_THAT(player_->commands(), ElementsAre("play", "pause", "pause"));
+}
+
 TEST_F(SleepTest, WithoutALoginManagerNothingHappens) {
     bringPlayer(track("First", 0, 1));
     ASSERT_TRUE(log_.waitFor("session bus"));
