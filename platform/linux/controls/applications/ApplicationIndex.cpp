@@ -1,7 +1,6 @@
 #include "platform/linux/controls/applications/ApplicationIndex.h"
 
 #include <algorithm>
-#include <chrono>
 #include <system_error>
 #include <utility>
 
@@ -15,9 +14,6 @@ namespace fs = std::filesystem;
 
 constexpr std::size_t sizeLimit = 1 << 20;
 constexpr int depthLimit = 4;
-
-/// Two changes of a folder may get the same time when they are as close as the file system's clock is coarse.
-constexpr std::chrono::seconds coarsestClock{2};
 
 std::optional<fs::file_time_type> timeOfChange(const fs::path& folder) {
     std::error_code error;
@@ -33,10 +29,6 @@ ApplicationIndex::ApplicationIndex(const std::vector<fs::path>& dataFolders) {
         readMetainfo(folder / "metainfo");
         readMetainfo(folder / "appdata");
     }
-    const auto now = fs::file_time_type::clock::now();
-    isSettled_ = std::ranges::none_of(times_, [&](const auto& stamp) {
-        return stamp.second && *stamp.second > now - coarsestClock && *stamp.second < now + coarsestClock;
-    });
 }
 
 const DesktopEntry* ApplicationIndex::desktopEntry(const std::string& name) const {
@@ -61,9 +53,9 @@ std::optional<std::string> ApplicationIndex::desktopEntryOfComponent(const std::
 }
 
 bool ApplicationIndex::isCurrent() const {
-    return isSettled_ && std::ranges::all_of(times_, [](const auto& stamp) {
-               return timeOfChange(stamp.first) == stamp.second;
-           });
+    return !watch_.sawChange() && std::ranges::all_of(times_, [](const auto& stamp) {
+        return timeOfChange(stamp.first) == stamp.second;
+    });
 }
 
 void ApplicationIndex::readEntries(const fs::path& folder, const std::string& prefix, int depth) {
@@ -88,13 +80,13 @@ void ApplicationIndex::readMetainfo(const fs::path& folder) {
 void ApplicationIndex::addEntry(const fs::path& file, const std::string& name) {
     if (entries_.contains(name))
         return;
-    const auto text = readRegularFile(file, sizeLimit);
+    const auto text = read(file);
     if (auto entry = text ? parseDesktopEntry(*text) : std::nullopt)
         entries_.emplace(name, std::move(*entry));
 }
 
 void ApplicationIndex::addMetainfo(const fs::path& file) {
-    const auto xml = readRegularFile(file, sizeLimit);
+    const auto xml = read(file);
     auto metainfo = xml ? parseMetainfo(*xml) : std::nullopt;
     if (!metainfo)
         return;
@@ -103,9 +95,17 @@ void ApplicationIndex::addMetainfo(const fs::path& file) {
     components.emplace(std::move(identifier), std::move(*metainfo));
 }
 
-/// In the order of their names, so that the outcome does not depend on the file system; notes the folder's
-/// time before it reads, so that a change meanwhile is seen the next time.
+std::optional<std::string> ApplicationIndex::read(const fs::path& file) {
+    std::error_code error;
+    if (fs::is_symlink(file, error))
+        watch_.add(file); // its folder does not tell of what it leads to
+    return readRegularFile(file, sizeLimit);
+}
+
+/// In the order of their names, so that the outcome does not depend on the file system. Watches before it
+/// reads, so that a change meanwhile is seen the next time.
 std::vector<fs::directory_entry> ApplicationIndex::list(const fs::path& folder) {
+    watch_.add(folder);
     times_.emplace(folder, timeOfChange(folder));
     std::vector<fs::directory_entry> entries;
     std::error_code error;

@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "platform/linux/controls/applications/DesktopEntry.h"
+#include "platform/linux/controls/applications/FileWatch.h"
 #include "platform/linux/controls/applications/Metainfo.h"
 
 namespace tarn {
@@ -18,7 +19,6 @@ namespace tarn {
 /// by the folders but by constants: files of up to 1 MiB, 20,000 of them, folders four deep.
 class ApplicationIndex {
 public:
-    ApplicationIndex() = default;
     explicit ApplicationIndex(const std::vector<std::filesystem::path>& dataFolders);
 
     /// Null when no such entry is installed.
@@ -31,8 +31,7 @@ public:
     /// when it is not installed.
     std::optional<std::string> desktopEntryOfComponent(const std::string& identifier) const;
 
-    /// True while the folders are as they were read, as far as their times of change tell. Does not read
-    /// them.
+    /// True while the folders and files are as they were read. Reads none of them.
     bool isCurrent() const;
 
 private:
@@ -42,14 +41,15 @@ private:
     void readMetainfo(const std::filesystem::path& folder);
     void addEntry(const std::filesystem::path& file, const std::string& name);
     void addMetainfo(const std::filesystem::path& file);
+    std::optional<std::string> read(const std::filesystem::path& file);
     std::vector<std::filesystem::directory_entry> list(const std::filesystem::path& folder);
 
     std::map<std::string, DesktopEntry> entries_;
     std::map<std::string, Metainfo> addons_;
     std::map<std::string, Metainfo> components_;
-    std::map<std::filesystem::path, std::optional<Time>> times_;
+    std::map<std::filesystem::path, std::optional<Time>> times_; // tell of folders that were not there yet
     std::size_t filesLeft_ = 20'000;
-    bool isSettled_ = false;
+    FileWatch watch_;
 };
 
 } // namespace tarn

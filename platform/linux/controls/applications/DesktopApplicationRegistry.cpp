@@ -42,10 +42,10 @@ DesktopApplicationRegistry::DesktopApplicationRegistry(std::vector<std::filesyst
 
 template <class Use>
 auto DesktopApplicationRegistry::withCurrentIndex(Use&& use) {
-    return index_.withLocked([&](ApplicationIndex& index) {
-        if (!index.isCurrent())
-            index = ApplicationIndex(dataFolders_);
-        return std::forward<Use>(use)(std::as_const(index));
+    return index_.withLocked([&](std::optional<ApplicationIndex>& index) {
+        if (!index || !index->isCurrent())
+            index.emplace(dataFolders_);
+        return std::forward<Use>(use)(std::as_const(*index));
     });
 }
 

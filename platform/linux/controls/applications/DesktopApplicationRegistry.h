@@ -2,6 +2,7 @@
 
 #include <filesystem>
 #include <memory>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -12,21 +13,17 @@
 namespace tarn {
 
 /// The applications that are installed in data folders. An application is called by its desktop entry,
-/// without
-/// ".desktop".
+/// without ".desktop".
 ///
 /// An extension belongs to the first of these that is there:
 /// 1. what the AppStream metadata of the add-on with its identifier extends, if that is installed: the first
-/// with a
-///    desktop entry, else the first that it names;
+///    with a desktop entry, else the first that it names;
 /// 2. the application that is called like the extension itself;
 /// 3. the application that is called like the extension without its last parts, the longest first, of two
-/// parts at
-///    least: "org.example.Player.Watch" belongs to "org.example.Player".
+///    parts at least: "org.example.Player.Watch" belongs to "org.example.Player".
 ///
-/// The folders are read at the first lookup, and again at the first one after they have changed; a lookup in
-/// between costs a few stat calls. A file that is written over in place is noticed with the next change of
-/// its folder.
+/// The folders are read at the first lookup, and again at the first one after something in them has changed,
+/// even within a file; a lookup in between costs a few system calls.
 class DesktopApplicationRegistry final : public ApplicationRegistry {
 public:
     /// Earlier folders have precedence. `languages` are the user's, for the names of applications.
@@ -45,7 +42,7 @@ private:
 
     const std::vector<std::filesystem::path> dataFolders_;
     const std::vector<std::string> languages_;
-    MutexProtected<ApplicationIndex> index_;
+    MutexProtected<std::optional<ApplicationIndex>> index_; // none before the first lookup
 };
 
 /// The registry of the running user: the data folders of the environment, names in `languages`.
