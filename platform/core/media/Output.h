@@ -86,6 +86,10 @@ class OutputFactory {
 public:
     virtual ~OutputFactory() = default;
 
+    /// An item is ready, so an output will soon be asked for: what takes its time can be done now. May come
+    /// as often as one likes.
+    virtual void prepare() {}
+
     /// Never fails: without a sound server the output is silent and keeps time. `listener` outlives the
     /// output.
     virtual std::unique_ptr<Output> create(OutputListener& listener) = 0;

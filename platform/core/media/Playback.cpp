@@ -140,6 +140,8 @@ bool Playback::openPlace(std::size_t index) {
         error = renderings_.open(place.entry, place.item->asset());
     if (!error) {
         place.item->becomeReady();
+        if (!output_)
+            environment_.outputs.prepare();
         return true;
     }
     std::optional<PlayQueue::Ending> ending;

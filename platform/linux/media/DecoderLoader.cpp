@@ -1,63 +1,14 @@
 #include "platform/linux/media/DecoderLoader.h"
 
-#include <dlfcn.h>
-
-#include <filesystem>
-#include <optional>
-#include <string>
-#include <vector>
-
-#include "platform/SystemLog.h"
+#include "platform/linux/media/ModuleFile.h"
 
 namespace tarn {
 
-namespace {
-
-constexpr char moduleFile[] = "libtarn-decoder.so";
-
-// The folders in which the program itself looks for its libraries: those of its build tree, or of its
-// installation. Asked for explicitly because sanitizers call dlopen() from a library of their own.
-std::vector<std::string> programLibraryFolders() {
-    std::vector<std::string> folders;
-    void* program = dlopen(nullptr, RTLD_LAZY);
-    Dl_serinfo sizes{};
-    if (program == nullptr || dlinfo(program, RTLD_DI_SERINFOSIZE, &sizes) != 0)
-        return folders;
-    std::vector<std::max_align_t> storage(sizes.dls_size / sizeof(std::max_align_t) + 1);
-    auto* info = reinterpret_cast<Dl_serinfo*>(storage.data());
-    *info = sizes;
-    if (dlinfo(program, RTLD_DI_SERINFO, info) == 0)
-        for (unsigned i = 0; i < info->dls_cnt; ++i)
-            folders.emplace_back(info->dls_serpath[i].dls_name);
-    return folders;
-}
-
-std::optional<std::string> findModule() {
-    for (const std::string& folder : programLibraryFolders()) {
-        const auto path = std::filesystem::path(folder) / moduleFile;
-        std::error_code ignored;
-        if (path.is_absolute() && std::filesystem::exists(path, ignored))
-            return path.string();
-    }
-    return std::nullopt;
-}
-
-} // namespace
-
 const DecoderModule* DecoderLoader::load() {
     std::lock_guard lock(mutex_);
-    if (module_ != nullptr)
-        return module_;
-    const auto path = findModule();
-    void* library = path ? dlopen(path->c_str(), RTLD_NOW | RTLD_LOCAL) : nullptr;
-    void* function = library != nullptr ? dlsym(library, decoderModuleSymbol) : nullptr;
-    if (function == nullptr) {
-        SystemLog::error("-[DecoderLoader load]", __LINE__,
-                         "%{public}s:%d: Could not load %{public}s: %{public}s", moduleFile,
-                         path ? dlerror() : "not found");
-        return nullptr;
-    }
-    module_ = reinterpret_cast<DecoderModuleFunction>(function)();
+    if (module_ == nullptr)
+        if (void* function = loadFromModule(decoderModuleFile, decoderModuleSymbol))
+            module_ = reinterpret_cast<DecoderModuleFunction>(function)();
     return module_;
 }
 

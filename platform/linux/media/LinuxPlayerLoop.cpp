@@ -1,7 +1,6 @@
 #include "platform/linux/media/LinuxPlayerLoop.h"
 
 #include <pthread.h>
-#include <pulse/mainloop.h>
 #include <sys/eventfd.h>
 #include <sys/timerfd.h>
 
@@ -114,27 +113,18 @@ private:
     std::uint64_t lastNumber_ = 0;
 };
 
-void LinuxPlayerLoop::MainLoopDelete::operator()(pa_mainloop* loop) const { pa_mainloop_free(loop); }
-
 LinuxPlayerLoop::LinuxPlayerLoop()
-    : mainLoop_(pa_mainloop_new()),
-      wakeUp_(checked(eventfd(0, EFD_NONBLOCK | EFD_CLOEXEC), "eventfd")),
+    : wakeUp_(checked(eventfd(0, EFD_NONBLOCK | EFD_CLOEXEC), "eventfd")),
       timers_(std::make_shared<Timers>()) {
-    pa_mainloop_api& events = api();
-    events.io_new(
-        &events, wakeUp_.get(), PA_IO_EVENT_INPUT,
-        [](pa_mainloop_api*, pa_io_event*, int descriptor, pa_io_event_flags_t, void*) {
-            takeCount(descriptor);
-        },
-        nullptr);
-    events.io_new(
-        &events, timers_->descriptor(), PA_IO_EVENT_INPUT,
-        [](pa_mainloop_api*, pa_io_event*, int, pa_io_event_flags_t, void* timers) {
-            static_cast<Timers*>(timers)->runDue();
-        },
-        timers_.get());
+    sleepIn(firstWait_);
     thread_ = std::thread([this] { run(); });
     pthread_setname_np(thread_.native_handle(), "player");
+}
+
+void LinuxPlayerLoop::sleepIn(EventWait& wait) {
+    wait.watch(wakeUp_.get(), [this] { takeCount(wakeUp_.get()); });
+    wait.watch(timers_->descriptor(), [this] { timers_->runDue(); });
+    wait_ = &wait;
 }
 
 LinuxPlayerLoop::~LinuxPlayerLoop() { stop(); }
@@ -153,8 +143,6 @@ void LinuxPlayerLoop::stop() {
     for (std::vector<std::function<void()>> dropped; !posted_.empty(); dropped.clear())
         dropped.swap(posted_); // what is dropped may post its farewell
 }
-
-pa_mainloop_api& LinuxPlayerLoop::api() const { return *pa_mainloop_get_api(mainLoop_.get()); }
 
 bool LinuxPlayerLoop::isCurrent() const { return std::this_thread::get_id() == thread_.get_id(); }
 
@@ -189,8 +177,7 @@ void LinuxPlayerLoop::run() {
                 return;
             idle = posted_.empty();
         }
-        if (pa_mainloop_prepare(mainLoop_.get(), idle ? -1 : 0) < 0 ||
-            pa_mainloop_poll(mainLoop_.get()) < 0 || pa_mainloop_dispatch(mainLoop_.get()) < 0)
+        if (!wait_->wait(idle))
             return;
         runPosted();
     }

@@ -8,15 +8,14 @@
 
 #include "platform/core/media/PlayerLoop.h"
 #include "platform/linux/FileDescriptor.h"
-
-struct pa_mainloop;
-struct pa_mainloop_api;
+#include "platform/linux/media/PollWait.h"
 
 namespace tarn {
 
 /// The player thread of this machine. It also talks to the sound server: what the server asks for is rendered
 /// where it is asked for, with no hand-off between threads and no lock. Without work, a timer that is due or
-/// word from the server it sleeps.
+/// word from the server it sleeps: in poll(2) first, and in the library of the sound server once that is
+/// loaded.
 class LinuxPlayerLoop final : public PlayerLoop {
 public:
     LinuxPlayerLoop();
@@ -33,22 +32,19 @@ public:
     bool isCurrent() const override;
     std::chrono::nanoseconds now() const override;
 
-    /// For the sound server's library; player thread only.
-    pa_mainloop_api& api() const;
+    /// From its next turn on the thread sleeps in `wait`, which lives until stop(). Player thread.
+    void sleepIn(EventWait& wait);
 
 private:
     class Timers;
-    struct MainLoopDelete {
-        void operator()(pa_mainloop* loop) const;
-    };
-
     void run();
     void runPosted();
     void wake();
 
-    const std::unique_ptr<pa_mainloop, MainLoopDelete> mainLoop_;
     const FileDescriptor wakeUp_;
     const std::shared_ptr<Timers> timers_;
+    PollWait firstWait_;
+    EventWait* wait_ = nullptr; // player thread
 
     std::mutex mutex_;
     std::vector<std::function<void()>> posted_; // under the mutex

@@ -1,11 +1,9 @@
 #include "platform/linux/media/SoundServer.h"
 
-#include <pulse/pulseaudio.h>
-
 #include <algorithm>
 
 #include "platform/SystemLog.h"
-#include "platform/linux/media/PulseFormat.h"
+#include "platform/linux/media/ModuleFile.h"
 
 namespace tarn {
 
@@ -16,29 +14,6 @@ constexpr auto firstDelay = 200ms;
 constexpr auto longestDelay = 1500ms;
 
 } // namespace
-
-struct SoundServer::FormatQuery {
-    std::weak_ptr<SoundServer*> server;
-    std::function<void()> done;
-
-    static void answered(pa_context*, const pa_sink_info* sink, int end, void* data) {
-        auto* query = static_cast<FormatQuery*>(data);
-        const auto server = query->server.lock();
-        if (server && sink != nullptr)
-            (*server)->format_ = formatOf(sink->sample_spec);
-        if (end == 0)
-            return;
-        const std::unique_ptr<FormatQuery> owned(query);
-        if (server && (*server)->ready())
-            owned->done();
-    }
-};
-
-void SoundServer::ContextDelete::operator()(pa_context* context) const {
-    pa_context_set_state_callback(context, nullptr, nullptr);
-    pa_context_disconnect(context);
-    pa_context_unref(context);
-}
 
 SoundServer::SoundServer(LinuxPlayerLoop& loop)
     : loop_(loop), delay_(firstDelay), self_(std::make_shared<SoundServer*>(this)) {}
@@ -52,41 +27,38 @@ void SoundServer::remove(SoundServerListener& listener) {
 
 void SoundServer::want(SoundServerListener& listener) {
     wanting_.insert(&listener);
-    if (!context_) {
+    if (!connection_) {
         delay_ = firstDelay;
         connect();
     }
 }
 
+SoundLibrary* SoundServer::library() {
+    if (std::exchange(librarySought_, true))
+        return library_.get();
+    void* function = loadFromModule(soundModuleFile, soundModuleSymbol);
+    if (function == nullptr)
+        return nullptr;
+    library_.reset(reinterpret_cast<SoundModuleFunction>(function)());
+    loop_.sleepIn(*library_);
+    return library_.get();
+}
+
 void SoundServer::connect() {
     retry_.reset();
-    pa_proplist* properties = pa_proplist_new();
-    pa_proplist_sets(properties, PA_PROP_APPLICATION_NAME, "tarnd");
-    pa_proplist_sets(properties, PA_PROP_APPLICATION_ID, applicationId);
-    pa_proplist_sets(properties, PA_PROP_APPLICATION_ICON_NAME, "audio-x-generic");
-    context_.reset(pa_context_new_with_proplist(&loop_.api(), "tarnd", properties));
-    pa_proplist_free(properties);
-    pa_context_set_state_callback(
-        context_.get(), [](pa_context*, void* self) { static_cast<SoundServer*>(self)->stateChanged(); },
-        this);
-    // A failure is told through the state, at once or later.
-    pa_context_connect(context_.get(), nullptr, PA_CONTEXT_NOAUTOSPAWN, nullptr);
+    ++attempt_;
+    if (SoundLibrary* sound = library())
+        connection_ = sound->connect(*this);
+    else
+        connectionLost();
 }
 
 // The library is in the middle of something: what follows is done from the loop.
-void SoundServer::stateChanged() {
-    const pa_context_state_t state = pa_context_get_state(context_.get());
-    std::weak_ptr<SoundServer*> weak = self_;
-    const auto later = [&](void (SoundServer::*what)()) {
-        loop_.post([weak, what, context = context_.get()] {
-            if (const auto server = weak.lock(); server && (*server)->context_.get() == context)
-                ((*server)->*what)();
-        });
-    };
-    if (state == PA_CONTEXT_READY)
-        later(&SoundServer::found);
-    else if (!PA_CONTEXT_IS_GOOD(state))
-        later(&SoundServer::lost);
+void SoundServer::later(void (SoundServer::*what)()) {
+    loop_.post([weak = std::weak_ptr(self_), what, attempt = attempt_] {
+        if (const auto server = weak.lock(); server && (*server)->attempt_ == attempt)
+            ((*server)->*what)();
+    });
 }
 
 void SoundServer::found() {
@@ -101,18 +73,19 @@ void SoundServer::found() {
 
 void SoundServer::lost() {
     ready_ = false;
-    context_.reset();
+    ++attempt_; // nothing more is to be heard of this one
+    connection_.reset();
     if (!std::exchange(missed_, true))
         SystemLog::error("-[SoundServer lost]", __LINE__,
                          "%{public}s:%d: No sound server: playing in silence until it is there.");
-    if (!wanting_.empty())
+    if (library_ && !wanting_.empty())
         retryLater();
     tell(&SoundServerListener::soundServerLost);
 }
 
 void SoundServer::retryLater() {
     retry_ = loop_.at(loop_.now() + delay_, [this] {
-        if (!wanting_.empty() && !context_)
+        if (!wanting_.empty() && !connection_)
             connect();
     });
     delay_ = std::min<std::chrono::milliseconds>(2 * delay_, longestDelay);
@@ -126,13 +99,10 @@ void SoundServer::tell(void (SoundServerListener::*what)()) {
 }
 
 void SoundServer::refreshFormat(std::function<void()> done) {
-    auto* query = new FormatQuery{self_, std::move(done)}; // answered() owns it
-    pa_operation* operation =
-        pa_context_get_sink_info_by_name(context_.get(), "@DEFAULT_SINK@", FormatQuery::answered, query);
-    if (operation == nullptr)
-        delete query;
-    else
-        pa_operation_unref(operation);
+    connection_->lookUpFormat([this, done = std::move(done)](std::optional<PcmFormat> format) {
+        format_ = format.value_or(format_);
+        done();
+    });
 }
 
 } // namespace tarn

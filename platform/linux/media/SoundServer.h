@@ -4,11 +4,8 @@
 #include <memory>
 #include <set>
 
-#include "platform/core/media/PcmFormat.h"
 #include "platform/linux/media/LinuxPlayerLoop.h"
-
-struct pa_context;
-struct pa_sink_info;
+#include "platform/linux/media/sound/SoundLibrary.h"
 
 namespace tarn {
 
@@ -27,11 +24,16 @@ public:
 /// The connection to the sound server, one for all outputs. Player thread.
 ///
 /// It is sought only while somebody wants it, again and again at growing intervals of at most a second and a
-/// half: a paused service wakes up for nothing.
-class SoundServer {
+/// half: a paused service wakes up for nothing. Where the module that speaks to it is not installed there is
+/// no sound server.
+class SoundServer final : private SoundConnectionListener {
 public:
+    /// `loop` outlives the server, and no longer runs when that is destroyed.
     explicit SoundServer(LinuxPlayerLoop& loop);
-    ~SoundServer();
+    ~SoundServer() override;
+
+    /// Loads what speaks to the server, which takes a few milliseconds; the first want() does it otherwise.
+    void prepare() { library(); }
 
     void add(SoundServerListener& listener) { listeners_.insert(&listener); }
     void remove(SoundServerListener& listener);
@@ -49,24 +51,28 @@ public:
     /// The nearest one to the default device's own.
     const PcmFormat& format() const { return format_; }
 
-    /// Null when not connected.
-    pa_context* context() const { return context_.get(); }
+    /// Only when ready(). `listener` outlives the stream.
+    std::unique_ptr<SoundStream> makeStream(const PcmFormat& format, std::size_t bufferFrames,
+                                            SoundStreamListener& listener) {
+        return connection_->makeStream(format, bufferFrames, listener);
+    }
 
 private:
-    struct ContextDelete {
-        void operator()(pa_context* context) const;
-    };
-    struct FormatQuery;
-
+    SoundLibrary* library();
     void connect();
-    void stateChanged();
+    void connectionReady() override { later(&SoundServer::found); }
+    void connectionLost() override { later(&SoundServer::lost); }
+    void later(void (SoundServer::*what)());
     void found();
     void lost();
     void retryLater();
     void tell(void (SoundServerListener::*what)());
 
     LinuxPlayerLoop& loop_;
-    std::unique_ptr<pa_context, ContextDelete> context_;
+    std::unique_ptr<SoundLibrary> library_; // null before it is needed, and when it is not there
+    bool librarySought_ = false;
+    std::unique_ptr<SoundConnection> connection_;
+    int attempt_ = 0; // which connection it is
     bool ready_ = false;
     bool missed_ = false; // its absence has been logged
     PcmFormat format_;
@@ -74,7 +80,7 @@ private:
     RegistrationHandle retry_;
     std::set<SoundServerListener*> listeners_;
     std::set<SoundServerListener*> wanting_;
-    std::shared_ptr<SoundServer*> self_; // null inside once the server object is gone
+    std::shared_ptr<SoundServer*> self_; // for work that is posted and comes too late
 };
 
 } // namespace tarn

@@ -86,8 +86,7 @@ void SystemOutput::makeStream() {
     if (stream_ || mode_ == Mode::idle)
         return;
     const PcmFormat& format = server_.format();
-    stream_ = std::make_unique<PulseStream>(server_.context(), format, capacityFor(format),
-                                            static_cast<PulseStreamListener&>(*this));
+    stream_ = server_.makeStream(format, capacityFor(format), static_cast<SoundStreamListener&>(*this));
 }
 
 void SystemOutput::streamReady() {

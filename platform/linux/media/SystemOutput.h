@@ -7,8 +7,8 @@
 #include "platform/linux/media/Blend.h"
 #include "platform/linux/media/HeardClock.h"
 #include "platform/linux/media/InterruptionListener.h"
-#include "platform/linux/media/PulseStream.h"
 #include "platform/linux/media/SoundServer.h"
+#include "platform/linux/media/sound/SoundStream.h"
 
 namespace tarn {
 
@@ -16,7 +16,7 @@ namespace tarn {
 ///
 /// Between the two it changes by itself: when the server goes it goes on in silence, and when the server is
 /// back it sounds again from where it is by then.
-class SystemOutput final : public Output, private SoundServerListener, private PulseStreamListener {
+class SystemOutput final : public Output, private SoundServerListener, private SoundStreamListener {
 public:
     /// All of these outlive the output.
     SystemOutput(LinuxPlayerLoop& loop, SoundServer& server, InterruptionListener& interruptions,
@@ -83,7 +83,7 @@ private:
     std::string artist_;
 
     // Of the stream. Its frame s is the output's frame base_ + s.
-    std::unique_ptr<PulseStream> stream_;
+    std::unique_ptr<SoundStream> stream_;
     std::int64_t base_ = 0;
     std::int64_t filledTo_ = 0;          // where the server has frames, of ours or of silence
     bool seekNext_ = false;              // the next write begins elsewhere than where the last one ended
@@ -106,6 +106,7 @@ public:
     SystemOutputFactory(LinuxPlayerLoop& loop, InterruptionListener& interruptions)
         : loop_(loop), interruptions_(interruptions), server_(loop) {}
 
+    void prepare() override { server_.prepare(); }
     std::unique_ptr<Output> create(OutputListener& listener) override {
         return std::make_unique<SystemOutput>(loop_, server_, interruptions_, listener);
     }

@@ -8,6 +8,7 @@
 #include <chrono>
 #include <csignal>
 #include <filesystem>
+#include <fstream>
 #include <future>
 #include <random>
 #include <thread>
@@ -68,6 +69,22 @@ TEST(TheProcess, TakesOnlyTwoOptions) {
     EXPECT_EQ(runCommand({TARND, "--version"}).status, 0);
     EXPECT_THAT(runCommand({TARND, "--help"}).output, HasSubstr("Usage: tarnd"));
     EXPECT_EQ(runCommand({TARND, "--verbose"}).status, 2);
+}
+
+TEST(TheProcess, LoadsMediaLibrariesOnlyWhenTheyAreNeeded) {
+    ServiceUnderTest service;
+    const auto loaded = [&](const char* library) {
+        std::ifstream maps("/proc/" + std::to_string(service.process().pid()) + "/maps");
+        const std::string text{std::istreambuf_iterator<char>(maps), {}};
+        return text.find(library) != std::string::npos;
+    };
+    Client client(service.options());
+    EXPECT_TRUE(loaded("libsystemd"));
+    EXPECT_FALSE(loaded("libavcodec"));
+    EXPECT_FALSE(loaded("libpulse"));
+    ASSERT_TRUE(isServed(client, service.song()));
+    EXPECT_TRUE(loaded("libavcodec"));
+    EXPECT_FALSE(loaded("libpulse")) << "nothing is to play yet";
 }
 
 TEST(TheProcess, LeavesNoFileToAProgramThatItMightStart) {

@@ -96,5 +96,6 @@ public:
 /// What the module exports, under the name in decoderModuleSymbol.
 using DecoderModuleFunction = const DecoderModule* (*)();
 inline constexpr char decoderModuleSymbol[] = "tarnDecoderModule1";
+inline constexpr char decoderModuleFile[] = "libtarn-decoder.so";
 
 } // namespace tarn

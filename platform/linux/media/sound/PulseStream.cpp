@@ -1,4 +1,4 @@
-#include "platform/linux/media/PulseStream.h"
+#include "platform/linux/media/sound/PulseStream.h"
 
 #include <pulse/pulseaudio.h>
 #include <sys/time.h>
@@ -7,7 +7,7 @@
 #include <cstring>
 #include <utility>
 
-#include "platform/linux/media/PulseFormat.h"
+#include "platform/linux/media/sound/PulseFormat.h"
 
 namespace tarn {
 
@@ -128,7 +128,7 @@ void PulseStream::OperationDelete::operator()(pa_operation* operation) const {
 }
 
 PulseStream::PulseStream(pa_context* context, const PcmFormat& format, std::size_t bufferFrames,
-                         PulseStreamListener& listener)
+                         SoundStreamListener& listener)
     : format_(format), listener_(listener), self_(std::make_shared<PulseStream*>(this)) {
     const Properties properties;
     properties.set(PA_PROP_MEDIA_ROLE, "music");

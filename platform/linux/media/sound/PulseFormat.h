@@ -9,9 +9,6 @@
 
 namespace tarn {
 
-/// By which desktops and the sound server's memory of volumes know this program.
-inline constexpr char applicationId[] = "ostrel.tarnd";
-
 inline pa_sample_spec specOf(const PcmFormat& format) {
     pa_sample_format_t sample = PA_SAMPLE_FLOAT32NE;
     if (format.sample == SampleFormat::s16)
