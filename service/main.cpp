@@ -21,6 +21,7 @@ There is nothing to configure. To play something: tarnctl play FILE
 int runService() {
     tarn::prepareSignals();
     tarn::raiseFileLimit();
+    tarn::returnFreedMemory();
     tarn::SystemLog::setSink(tarn::systemSink("tarnd"));
     // Threads use both until the process ends; neither is ever destroyed.
     static auto& platform = *new tarn::LinuxPlatform;

@@ -4,20 +4,9 @@
 #include <fstream>
 #include <string>
 
+#include "bench/support/ProcFile.h"
+
 namespace tarn {
-
-namespace {
-
-/// The number behind `key` in a file of lines "key: number ..."; 0 when it is not there.
-long numberIn(const std::filesystem::path& file, const std::string& key) {
-    std::ifstream stream(file);
-    for (std::string word; stream >> word;)
-        if (long number = 0; word == key && stream >> number)
-            return number;
-    return 0;
-}
-
-} // namespace
 
 ProcessUsage::ProcessUsage(pid_t process) {
     const std::filesystem::path folder = "/proc/" + std::to_string(process);
@@ -25,11 +14,11 @@ ProcessUsage::ProcessUsage(pid_t process) {
         long long nanoseconds = 0;
         std::ifstream(task.path() / "schedstat") >> nanoseconds;
         cpu += std::chrono::nanoseconds(nanoseconds);
-        waits += numberIn(task.path() / "status", "voluntary_ctxt_switches:");
+        waits += numberInProcFile(task.path() / "status", "voluntary_ctxt_switches:");
         ++threads;
     }
-    ownMemory = numberIn(folder / "status", "RssAnon:");
-    memory = numberIn(folder / "smaps_rollup", "Pss:");
+    ownMemory = numberInProcFile(folder / "status", "RssAnon:");
+    memory = numberInProcFile(folder / "smaps_rollup", "Pss:");
 }
 
 } // namespace tarn

@@ -9,9 +9,9 @@
 #include <csignal>
 #include <cstdio>
 #include <cstdlib>
-#include <fstream>
 #include <string_view>
 
+#include "bench/support/ProcFile.h"
 #include "platform/linux/ipc/SocketAddress.h"
 
 namespace tarn::bench {
@@ -19,15 +19,6 @@ namespace tarn::bench {
 namespace {
 
 namespace fs = std::filesystem;
-
-/// The number behind a name in one of the files of /proc; 0 when it is not there.
-long numberIn(const fs::path& file, std::string_view name) {
-    std::ifstream lines(file);
-    for (std::string line; std::getline(lines, line);)
-        if (line.starts_with(name))
-            return std::strtol(line.c_str() + name.size(), nullptr, 10);
-    return 0;
-}
 
 std::size_t entriesOf(const fs::path& folder) {
     return static_cast<std::size_t>(std::distance(fs::directory_iterator(folder), fs::directory_iterator()));
@@ -81,11 +72,11 @@ FileDescriptor ServiceProcess::connect() const {
 }
 
 long ServiceProcess::memory() const {
-    return numberIn(fs::path("/proc") / std::to_string(pid_) / "smaps_rollup", "Pss:");
+    return numberInProcFile(fs::path("/proc") / std::to_string(pid_) / "smaps_rollup", "Pss:");
 }
 
 long ServiceProcess::residentMemory() const {
-    return numberIn(fs::path("/proc") / std::to_string(pid_) / "status", "VmRSS:");
+    return numberInProcFile(fs::path("/proc") / std::to_string(pid_) / "status", "VmRSS:");
 }
 
 std::size_t ServiceProcess::threads() const {
@@ -99,7 +90,7 @@ std::size_t ServiceProcess::openFiles() const {
 long ServiceProcess::wakeups() const {
     long sum = 0;
     for (const auto& task : fs::directory_iterator(fs::path("/proc") / std::to_string(pid_) / "task"))
-        sum += numberIn(task.path() / "status", "voluntary_ctxt_switches:");
+        sum += numberInProcFile(task.path() / "status", "voluntary_ctxt_switches:");
     return sum;
 }
 

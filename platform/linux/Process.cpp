@@ -1,5 +1,6 @@
 #include "platform/linux/Process.h"
 
+#include <malloc.h>
 #include <sys/resource.h>
 #include <unistd.h>
 
@@ -45,6 +46,12 @@ void raiseFileLimit() {
         return;
     limit.rlim_cur = limit.rlim_max;
     ::setrlimit(RLIMIT_NOFILE, &limit);
+}
+
+void returnFreedMemory() {
+    constexpr int mostKept = 1024 * 1024; // a frame of usual length costs no system call
+    ::mallopt(M_MMAP_THRESHOLD, mostKept);
+    ::mallopt(M_TRIM_THRESHOLD, mostKept);
 }
 
 } // namespace tarn

@@ -17,4 +17,8 @@ void endOnStopSignals(std::function<void()> beforeEnd);
 /// Allows as many open files as the system lets this process have: every mirrored asset keeps one.
 void raiseFileLimit();
 
+/// Lets the heap keep little of what was freed. By itself it takes a big block that was freed as the sign
+/// that more will come, and one hostile frame would cost the process up to 16 MiB for as long as it lives.
+void returnFreedMemory();
+
 } // namespace tarn
