@@ -1,4 +1,4 @@
-"""Makes the Debian package, installs it into an empty root, and tries what is in there."""
+"""Makes the Debian packages, installs them into an empty root, and tries what is in there."""
 import contextlib
 import os
 import pathlib
@@ -27,20 +27,29 @@ def run(*command, **options):
     return done.stdout
 
 
-def make_package(folder):
+def make_packages(folder):
     run("cpack", "-G", "DEB", "--config", BUILD / "CPackConfig.cmake", "-B", folder)
-    return next(folder.glob("*.deb"))
+    return {package.name.split("_")[0]: package for package in folder.glob("*.deb")}
 
 
-def install(package, root):
-    """The dependencies are those of the machine that runs the test."""
-    database = root / "var/lib/dpkg"
-    for name in ("info", "updates"):
-        (database / name).mkdir(parents=True)
-    (database / "status").touch()
-    run("dpkg", f"--root={root}", f"--log={root}/log", "--force-depends", "--force-not-root",
-        "--force-script-chrootless", "--install", package,
-        env={**os.environ, "PATH": os.environ["PATH"] + ":/usr/local/sbin:/usr/sbin:/sbin"})
+class Root:
+    """An empty root to install packages into. Their dependencies are those of the machine that runs the test."""
+
+    def __init__(self, path):
+        self.path = path
+        database = path / "var/lib/dpkg"
+        for name in ("info", "updates"):
+            (database / name).mkdir(parents=True)
+        (database / "status").touch()
+
+    def dpkg(self, *arguments):
+        run("dpkg", f"--root={self.path}", f"--log={self.path}/log", "--force-depends", "--force-not-root",
+            "--force-script-chrootless", *arguments,
+            env={**os.environ, "PATH": os.environ["PATH"] + ":/usr/local/sbin:/usr/sbin:/sbin"})
+
+    def files(self):
+        found = {path.relative_to(self.path) for path in self.path.rglob("*") if not path.is_dir()}
+        return {str(path) for path in found if not path.is_relative_to("var/lib/dpkg")} - {"log"}
 
 
 def make_song(path):
@@ -85,16 +94,17 @@ class SoundServer:
             pass
 
 
-class AnInstalledPackage(unittest.TestCase):
+class TheInstalledPackages(unittest.TestCase):
     @classmethod
     def setUpClass(cls):
         # Not in /tmp, which the confined service has for itself.
         place = "/var/tmp" if BUILD.resolve().is_relative_to("/tmp") else BUILD
         cls.folder = pathlib.Path(cls.enterClassContext(tempfile.TemporaryDirectory(dir=place)))
-        cls.root = cls.folder / "root"
-        cls.package = make_package(cls.folder)
-        install(cls.package, cls.root)
-        cls.prefix = cls.root / "usr"
+        cls.packages = make_packages(cls.folder)
+        (cls.folder / "root").mkdir()
+        cls.root = Root(cls.folder / "root")
+        cls.root.dpkg("--install", *cls.packages.values())
+        cls.prefix = cls.root.path / "usr"
         cls.song = cls.folder / "song.wav"
         make_song(cls.song)
 
@@ -131,6 +141,40 @@ class AnInstalledPackage(unittest.TestCase):
     def tarnctl(self, *arguments):
         return run(self.prefix / "bin/tarnctl", *arguments, env=self.environment())
 
+    def test_are_split_as_debian_splits_them(self):
+        library = next(name for name in self.packages if re.fullmatch(r"libtarn[0-9.]+", name))
+        self.assertEqual(set(self.packages), {"tarnd", "tarnctl", library, "libtarn-dev", "tarn-doc"})
+        homes = {"bin/tarnd": "tarnd", "lib/systemd/user/tarnd.socket": "tarnd", "bin/tarnctl": "tarnctl",
+                 "lib/libtarn.so." + library.removeprefix("libtarn"): library, "lib/libtarn.so": "libtarn-dev",
+                 "include/tarn/Client.h": "libtarn-dev", "share/tarn/proto/velmo.proto": "libtarn-dev",
+                 "share/doc/tarn/protocol.md": "tarn-doc"}
+        listed = {name: run("dpkg-deb", "--contents", package) for name, package in self.packages.items()}
+        for file, home in homes.items():
+            holders = [name for name, content in listed.items()
+                       if re.search(rf" \./usr/{re.escape(file)}(?: ->.*)?$", content, re.MULTILINE)]
+            self.assertEqual(holders, [home], file)
+        for name in self.packages:
+            self.assertIn("No licence", (self.prefix / "share/doc" / name / "copyright").read_text())
+
+    def test_leave_nothing_behind(self):
+        path = self.folder / "purged"
+        path.mkdir()
+        root = Root(path)
+        root.dpkg("--install", *self.packages.values())
+        enabled = "etc/systemd/user/sockets.target.wants/tarnd.socket"
+        self.assertIn(enabled, root.files())
+        root.dpkg("--install", self.packages["tarnd"])  # again, as an upgrade does
+        root.dpkg("--remove", "tarnd")
+        self.assertNotIn("usr/bin/tarnd", root.files())
+        root.dpkg("--install", self.packages["tarnd"])
+        self.assertIn(enabled, root.files())
+        root.dpkg("--purge", *self.packages)
+        self.assertEqual(root.files(), set())
+
+    @unittest.skipUnless(shutil.which("lintian"), "lintian is not installed")
+    def test_satisfy_lintian(self):
+        run("lintian", "--allow-root", "--fail-on", "error", *self.packages.values())
+
     def test_serves_from_the_socket_it_is_given(self):
         with self.service():
             self.assertIn("0:00", self.tarnctl("info", self.song))
@@ -159,7 +203,7 @@ class AnInstalledPackage(unittest.TestCase):
     def test_lets_programs_be_built_with_its_library(self):
         with self.subTest("find_package"):
             build = self.folder / "example"
-            run("cmake", "-S", SOURCE / "examples/cpp", "-B", build, f"-DCMAKE_PREFIX_PATH={self.prefix}")
+            run("cmake", "-S", SOURCE / "docs/examples/cpp", "-B", build, f"-DCMAKE_PREFIX_PATH={self.prefix}")
             run("cmake", "--build", build)
             with self.service():
                 self.assertIn("0.25 s", run(build / "play", self.song, env=self.environment()))
@@ -169,7 +213,7 @@ class AnInstalledPackage(unittest.TestCase):
                                              PKG_CONFIG_ALLOW_SYSTEM_CFLAGS="1", PKG_CONFIG_ALLOW_SYSTEM_LIBS="1"))
             self.assertIn(f"-I{self.prefix.resolve()}/include",
                           " ".join(self.resolved(flag) for flag in flags.split()))
-            run("c++", "-std=c++20", SOURCE / "examples/cpp/play.cpp", "-o", self.folder / "play", *flags.split())
+            run("c++", "-std=c++20", SOURCE / "docs/examples/cpp/play.cpp", "-o", self.folder / "play", *flags.split())
 
     @staticmethod
     def resolved(flag):
@@ -179,17 +223,25 @@ class AnInstalledPackage(unittest.TestCase):
         protos = self.prefix / "share/tarn/proto"
         run("protoc", f"--python_out={self.folder}", f"-I{protos}", "velmo.proto", "transport.proto")
         with self.service():
-            run("/usr/bin/python3", SOURCE / "examples/python/play.py", self.song,
+            run("/usr/bin/python3", SOURCE / "docs/examples/python/play.py", self.song,
                 env=self.environment(PYTHONPATH=str(self.folder)))
 
     def test_brings_units_that_are_hardened(self):
         unit = self.prefix / "lib/systemd/user/tarnd.service"
         self.assertIn("ExecStart=/usr/bin/tarnd\n", unit.read_text())
         run("systemd-analyze", "security", "--offline=true", "--threshold=15", unit)
+        # The manager looks for the program where the unit says; here it is in the root.
+        units = self.folder / "units"
+        units.mkdir()
+        (units / "tarnd.service").write_text(unit.read_text().replace("/usr/bin", str(self.prefix / "bin")))
+        shutil.copy(unit.with_name("tarnd.socket"), units)
+        man = {"MANPATH": str(self.prefix / "share/man")}
+        self.assertEqual(run("systemd-analyze", "verify", "--user", "--recursive-errors=no", units / "tarnd.socket",
+                             units / "tarnd.service", env=self.environment(**man)), "")
 
     def test_brings_manual_pages_without_faults(self):
-        pages = sorted((self.prefix / "share/man").rglob("*.[178]"))
-        self.assertEqual([page.name for page in pages], ["tarnctl.1", "tarn-protocol.7", "tarnd.8"])
+        pages = sorted((self.prefix / "share/man").rglob("*.gz"))
+        self.assertEqual([page.name for page in pages], ["tarnctl.1.gz", "tarn-protocol.7.gz", "tarnd.8.gz"])
         for page in pages:
             complaints = subprocess.run(["man", "--warnings", "-E", "UTF-8", "-Tutf8", "-l", page], text=True,
                                         stdout=subprocess.DEVNULL, stderr=subprocess.PIPE, check=True,
