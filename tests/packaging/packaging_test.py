@@ -181,17 +181,26 @@ class TheInstalledPackages(unittest.TestCase):
             self.assertIn("song.wav", self.tarnctl("play", self.song))
 
     def test_plays_as_confined_as_its_unit_says(self):
-        namespaces = ("unshare", "--user", "--map-root-user", "--mount", "--net")
+        namespaces = ("unshare", "--user", "--map-root-user", "--mount", "--net", "--ipc", "--uts")
         if subprocess.run([*namespaces, "true"], stderr=subprocess.DEVNULL, check=False).returncode != 0:
             self.skipTest("this machine does not let us make namespaces")
         unit = self.prefix / "lib/systemd/user/tarnd.service"
         confined = pathlib.Path(__file__).with_name("confined.py")
         wrapper = (*namespaces, "/usr/bin/python3", confined, unit)
         with SoundServer(self.folder) as sound, self.service(wrapper, **sound.environment) as process:
-            status = pathlib.Path(f"/proc/{process.pid}/status").read_text()
-            self.assertIn("\nSeccomp:\t2\n", status)
             self.assertIn("song.wav", self.tarnctl("play", self.song))
             sound.wait_for("Created input")
+            status = dict(line.split(":\t", 1) for line in
+                          pathlib.Path(f"/proc/{process.pid}/status").read_text().splitlines())
+            self.assertEqual((status["Seccomp"], status["NoNewPrivs"], status["Umask"]), ("2", "1", "0077"))
+            for capabilities in ("CapPrm", "CapEff", "CapBnd", "CapAmb"):
+                self.assertEqual(int(status[capabilities], 16), 0, capabilities)
+            devices = os.listdir(f"/proc/{process.pid}/root/dev")
+            self.assertEqual(set(devices), {"null", "zero", "full", "random", "urandom", "tty", "shm"})
+            self.assertFalse(os.listdir(f"/proc/{process.pid}/root/tmp"))
+            # Well below TasksMax and MemoryMax, which it takes a service manager to enforce.
+            self.assertLess(int(status["Threads"]), 32)
+            self.assertLess(int(status["VmHWM"].split()[0]), 256 * 1024)
 
     def test_speaks_the_users_language(self):
         with self.service(LANG="de_DE.UTF-8"):
