@@ -48,7 +48,7 @@ struct DecoderTest : testing::TestWithParam<FileFormat> {
         encodeAudio(folder / "source.wav", GetParam().arguments, path);
         asset = openFile(path);
         if (asset) {
-            reader = std::make_unique<FileReader>(asset->file(), 2s);
+            reader = std::make_unique<FileReader>(asset->file());
             decoder = sharedLoader().load()->open(*reader, asset->info()).decoder;
         }
     }

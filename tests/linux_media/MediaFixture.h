@@ -10,6 +10,7 @@
 #include <vector>
 
 #include "platform/linux/media/AssetOpener.h"
+#include "platform/linux/media/FileReader.h"
 #include "platform/linux/media/LinuxMediaAsset.h"
 #include "platform/linux/media/MediaError.h"
 #include "tests/support/AudioFixture.h"

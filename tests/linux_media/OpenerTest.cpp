@@ -159,7 +159,7 @@ TEST_F(OpenerTest, KeepsTheFileOpen) {
     const auto asset = openFile(path);
     ASSERT_NE(asset, nullptr);
     std::filesystem::remove(path);
-    FileReader reader(asset->file(), 2s);
+    FileReader reader(asset->file());
     const auto opened = sharedLoader().load()->open(reader, asset->info());
     ASSERT_NE(opened.decoder, nullptr);
     PcmBuffer buffer;
@@ -173,7 +173,7 @@ TEST_F(OpenerTest, AFileThatEndsTooEarlyFailsThere) {
         const auto asset = openFile(path);
         ASSERT_NE(asset, nullptr);
         std::filesystem::resize_file(path, std::filesystem::file_size(path) / 2);
-        FileReader reader(asset->file(), 2s);
+        FileReader reader(asset->file());
         const auto opened = sharedLoader().load()->open(reader, asset->info());
         ASSERT_NE(opened.decoder, nullptr) << name;
         PcmBuffer buffer;

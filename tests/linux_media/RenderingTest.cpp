@@ -1,6 +1,8 @@
 #include <cmath>
 #include <numbers>
+#include <semaphore>
 
+#include "platform/linux/media/LinuxPlayerLoop.h"
 #include "platform/linux/media/LinuxRendering.h"
 #include "tests/linux_media/MediaFixture.h"
 
@@ -43,7 +45,7 @@ Rendered renderAll(Rendering& rendering, std::size_t limit = 100'000'000) {
 
 struct RenderingTest : testing::Test {
     std::unique_ptr<Rendering> open(const std::filesystem::path& path) {
-        LinuxRenderingFactory factory(sharedLoader());
+        LinuxRenderingFactory factory(loop, sharedLoader());
         auto outcome = factory.open(openFile(path), [] {});
         EXPECT_NE(outcome.rendering, nullptr);
         return std::move(outcome.rendering);
@@ -55,9 +57,46 @@ struct RenderingTest : testing::Test {
     }
 
     TemporaryFolder folder;
+    LinuxPlayerLoop loop;
 };
 
 constexpr PcmFormat sixteenBits{SampleFormat::s16, 44100, 2};
+
+TEST_F(RenderingTest, ARemoteFileIsRenderedToTheSameSamples) {
+    const Recording recording = makeSweep(200'001, 44100, 2);
+    writeWav(folder / "recording.wav", recording);
+    const auto local = openFile(folder / "recording.wav");
+    auto file = std::make_shared<MediaFile>(FileDescriptor(dup(local->file()->descriptor.get())));
+    EXPECT_FALSE(file->remote);
+    file->remote = true;
+    LinuxRenderingFactory factory(loop, sharedLoader());
+    const auto more = std::make_shared<std::counting_semaphore<>>(0);
+    const auto rendering = factory
+                               .open(std::make_shared<LinuxMediaAsset>("file:///a", file, local->info()),
+                                     [more] { more->release(); })
+                               .rendering;
+    for (const std::size_t first : {0u, 150'000u, 44'100u}) {
+        PcmBuffer buffer;
+        rendering->seek(nanoseconds(first * 1'000'000'000 / 44100), 1, sixteenBits);
+        nanoseconds position = -1ns;
+        for (RenderedSpan span; span.state != RenderedSpan::State::ended;) {
+            span = rendering->render(buffer, 4'321);
+            ASSERT_NE(span.state, RenderedSpan::State::failed);
+            if (span.frames > 0 && position > 0ns) {
+                EXPECT_EQ(span.start, position) << "spans join";
+            }
+            position = span.frames > 0 ? span.end : position;
+            if (span.state == RenderedSpan::State::waiting) {
+                ASSERT_TRUE(more->try_acquire_for(10s));
+            }
+        }
+        ASSERT_EQ(buffer.frames, 200'001 - first);
+        EXPECT_EQ(std::memcmp(buffer.bytes.data(), recording.samples.data() + first * 2, buffer.bytes.size()),
+                  0);
+        while (more->try_acquire()) {
+        }
+    }
+}
 
 TEST_F(RenderingTest, TouchesNoSampleAtRateOneInTheFilesOwnFormat) {
     const Recording recording = makeSweep(100'001, 44100, 2);

@@ -1,11 +1,11 @@
 #include "platform/linux/media/AssetOpener.h"
 
 #include <fcntl.h>
-#include <sys/stat.h>
 
 #include <cerrno>
 #include <cstring>
 
+#include "platform/linux/media/FileReader.h"
 #include "platform/linux/media/FileURL.h"
 #include "platform/linux/media/LinuxMediaAsset.h"
 #include "platform/linux/media/MediaError.h"
@@ -21,20 +21,37 @@ MediaAssetOutcome failed(MediaErrorCode code, std::string description, std::stri
     return {nullptr, mediaError(code, std::move(description), std::move(reason))};
 }
 
-struct OpenedFile {
+MediaAssetOutcome late() { return failed(MediaErrorCode::timedOut, "The file did not answer in time."); }
+
+/// What is found out where a file system may keep us waiting; shared with the thread that waits.
+struct Opening {
     SharedFile file;
     int error = 0;
-    bool regular = false;
+    DecoderModule::Examined examined;
 };
 
 // A FIFO or a device must not hold us up, nor a terminal become ours.
-OpenedFile openByPath(const std::string& path) {
-    FileDescriptor file(::open(path.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC | O_NOCTTY));
-    if (!file)
-        return {nullptr, errno, false};
-    struct stat status {};
-    const bool regular = fstat(file.get(), &status) == 0 && S_ISREG(status.st_mode);
-    return {std::make_shared<const FileDescriptor>(std::move(file)), 0, regular};
+FileDescriptor openByPath(const std::string& path) {
+    return FileDescriptor(::open(path.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC | O_NOCTTY));
+}
+
+void openFile(Opening& opening, FileDescriptor handed, const std::string& path) {
+    FileDescriptor file = handed ? std::move(handed) : openByPath(path);
+    if (file)
+        opening.file = std::make_shared<const MediaFile>(std::move(file));
+    else
+        opening.error = errno;
+}
+
+bool examine(const std::shared_ptr<Opening>& opening, const DecoderModule& decoder, SteadyTime deadline) {
+    const auto work = [opening, &decoder, deadline] {
+        FileReader reader(opening->file, deadline);
+        opening->examined = decoder.examine(reader);
+    };
+    if (opening->file->remote)
+        return callUntil(deadline, work);
+    work();
+    return true;
 }
 
 } // namespace
@@ -45,25 +62,26 @@ MediaAssetOutcome AssetOpener::open(const std::string& URL) const {
     if (!path)
         return failed(MediaErrorCode::unsupportedURL, "Only files of this device can be played.");
 
-    auto opened = std::make_shared<OpenedFile>();
-    if (FileDescriptor handed = access_.open(*path))
-        *opened = {std::make_shared<const FileDescriptor>(std::move(handed)), 0, true};
-    else if (!callUntil(deadline, [opened, path = *path] { *opened = openByPath(path); }))
-        return failed(MediaErrorCode::timedOut, "The file did not answer in time.");
-    if (!opened->file)
+    const auto opening = std::make_shared<Opening>();
+    const auto handed = std::make_shared<FileDescriptor>(access_.open(*path));
+    if (!callUntil(deadline,
+                   [opening, handed, path = *path] { openFile(*opening, std::move(*handed), path); }))
+        return late();
+    if (!opening->file)
         return failed(MediaErrorCode::cannotOpen, "The file could not be opened.",
-                      std::strerror(opened->error));
-    if (!opened->regular)
+                      std::strerror(opening->error));
+    if (!opening->file->regular)
         return failed(MediaErrorCode::notRegularFile, "That is not a regular file.");
 
     const DecoderModule* decoder = loader_.load();
     if (decoder == nullptr)
         return failed(MediaErrorCode::noDecoder, "The audio decoder is not installed.");
-    FileReader reader(opened->file, openingLimit, deadline);
-    DecoderModule::Examined examined = decoder->examine(reader);
+    if (!examine(opening, *decoder, deadline))
+        return late();
+    DecoderModule::Examined& examined = opening->examined;
     if (!examined.info)
         return {nullptr, std::move(examined.error)};
-    return {std::make_shared<LinuxMediaAsset>(URL, opened->file, *std::move(examined.info)), {}};
+    return {std::make_shared<LinuxMediaAsset>(URL, opening->file, *std::move(examined.info)), {}};
 }
 
 } // namespace tarn

@@ -6,15 +6,15 @@
 #include <mutex>
 #include <system_error>
 #include <thread>
+#include <utility>
 
 namespace tarn {
 
 namespace {
 
-constexpr int mostThreads = 32;
+constexpr int mostThreads = 64;
 
 struct Call {
-    std::function<void()> work;
     std::mutex mutex;
     std::condition_variable finished;
     bool done = false;
@@ -25,30 +25,35 @@ std::atomic<int>& runningThreads() {
     return count;
 }
 
-void run(const std::shared_ptr<Call>& call) {
-    call->work();
-    call->work = nullptr; // what it owns goes on this thread, before anyone can wait for it
-    runningThreads().fetch_sub(1);
-    std::lock_guard lock(call->mutex);
-    call->done = true;
-    call->finished.notify_one();
-}
-
 } // namespace
 
-bool callUntil(SteadyTime deadline, std::function<void()> work) {
+bool startDetached(std::function<void()> work) {
     if (runningThreads().fetch_add(1) >= mostThreads) {
         runningThreads().fetch_sub(1);
         return false;
     }
-    auto call = std::make_shared<Call>();
-    call->work = std::move(work);
     try {
-        std::thread([call] { run(call); }).detach();
+        std::thread([work = std::move(work)]() mutable {
+            std::exchange(work, nullptr)();
+            runningThreads().fetch_sub(1);
+        }).detach();
     } catch (const std::system_error&) { // no thread to be had
         runningThreads().fetch_sub(1);
         return false;
     }
+    return true;
+}
+
+bool callUntil(SteadyTime deadline, std::function<void()> work) {
+    const auto call = std::make_shared<Call>();
+    const bool started = startDetached([call, work = std::move(work)]() mutable {
+        std::exchange(work, nullptr)(); // what it owns goes on this thread, before anyone can wait for it
+        std::lock_guard lock(call->mutex);
+        call->done = true;
+        call->finished.notify_one();
+    });
+    if (!started)
+        return false;
     std::unique_lock lock(call->mutex);
     return call->finished.wait_until(lock, deadline, [&] { return call->done; });
 }

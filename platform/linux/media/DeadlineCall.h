@@ -7,9 +7,12 @@ namespace tarn {
 
 using SteadyTime = std::chrono::steady_clock::time_point;
 
-/// Runs `work`, a system call that may never return (a stuck mount), on a thread of its own and waits for it
-/// until `deadline`. False when it is late: the thread is left behind until its call returns, so `work` owns
-/// all that it touches. While many are left behind no more are begun, and the answer is false at once.
+/// Runs `work`, in which a system call may never return (a stuck mount), on a thread of its own that nobody
+/// waits for; so `work` owns all that it touches. False when no thread is to be had: while many are left
+/// behind no more are begun. Any thread may call.
+[[nodiscard]] bool startDetached(std::function<void()> work);
+
+/// The same, but waits until `work` is done or `deadline` has come. False when it is late.
 [[nodiscard]] bool callUntil(SteadyTime deadline, std::function<void()> work);
 
 } // namespace tarn

@@ -1,7 +1,7 @@
 #pragma once
 
 #include "platform/MediaAsset.h"
-#include "platform/linux/media/FileReader.h"
+#include "platform/linux/media/MediaFile.h"
 #include "platform/linux/media/decoder/Decoder.h"
 
 namespace tarn {

@@ -4,7 +4,9 @@
 #include <cassert>
 #include <cmath>
 
+#include "platform/core/media/MediaTimes.h"
 #include "platform/linux/media/MediaError.h"
+#include "platform/linux/media/RemoteRendering.h"
 
 namespace tarn {
 
@@ -13,8 +15,17 @@ namespace {
 using namespace std::chrono_literals;
 using std::chrono::nanoseconds;
 
-constexpr auto readLimit = 2s; // what the output's buffer holds
 constexpr std::size_t pieceFrames = 4096;
+
+RenderingFactory::Outcome openNow(const std::shared_ptr<LinuxMediaAsset>& asset,
+                                  const DecoderModule& module) {
+    auto reader = std::make_unique<FileReader>(asset->file());
+    DecoderModule::Opened opened = module.open(*reader, asset->info());
+    if (!opened.decoder)
+        return {nullptr, std::move(opened.error)};
+    return {std::make_unique<LinuxRendering>(asset, module, std::move(reader), std::move(opened.decoder)),
+            std::nullopt};
+}
 
 } // namespace
 
@@ -124,17 +135,21 @@ std::size_t LinuxRendering::takeStretched(PcmBuffer& buffer, std::size_t maxFram
 }
 
 RenderingFactory::Outcome LinuxRenderingFactory::open(const std::shared_ptr<MediaAsset>& asset,
-                                                      std::function<void()> /*goesOn*/) {
+                                                      std::function<void()> goesOn) {
     const auto file = std::dynamic_pointer_cast<LinuxMediaAsset>(asset);
     const DecoderModule* module = loader_.load();
     if (!file || module == nullptr)
         return {nullptr, mediaError(MediaErrorCode::noDecoder, "The audio decoder is not installed.")};
-    auto reader = std::make_unique<FileReader>(file->file(), readLimit);
-    DecoderModule::Opened opened = module->open(*reader, file->info());
-    if (!opened.decoder)
-        return {nullptr, std::move(opened.error)};
-    return {std::make_unique<LinuxRendering>(file, *module, std::move(reader), std::move(opened.decoder)),
-            std::nullopt};
+    if (!file->file()->remote)
+        return openNow(file, *module);
+    RemoteRendering::Options options;
+    if (file->info().frames)
+        options.length = nanosecondsOf(file->duration());
+    auto remote = RemoteRendering::create(
+        loop_, [file, module] { return openNow(file, *module); }, std::move(goesOn), options);
+    if (!remote)
+        return {nullptr, mediaError(MediaErrorCode::timedOut, "Too many files do not answer.")};
+    return {std::move(remote), std::nullopt};
 }
 
 } // namespace tarn

@@ -1,8 +1,10 @@
 #pragma once
 
+#include "platform/core/media/PlayerLoop.h"
 #include "platform/core/media/Rendering.h"
 #include "platform/linux/media/BackwardSource.h"
 #include "platform/linux/media/DecoderLoader.h"
+#include "platform/linux/media/FileReader.h"
 #include "platform/linux/media/ForwardSource.h"
 #include "platform/linux/media/LinuxMediaAsset.h"
 #include "platform/linux/media/Stretcher.h"
@@ -46,15 +48,17 @@ private:
     std::size_t taken_ = 0; // of stretched_, in frames
 };
 
-/// Opens files for rendering with the decoder module.
+/// Opens files for rendering with the decoder module. The player thread itself reads local files; what
+/// another machine or process has to deliver is rendered on a thread of its own.
 class LinuxRenderingFactory final : public RenderingFactory {
 public:
-    /// `loader` outlives the factory and its renderings.
-    explicit LinuxRenderingFactory(DecoderLoader& loader) : loader_(loader) {}
+    /// Both outlive the factory and its renderings.
+    LinuxRenderingFactory(PlayerLoop& loop, DecoderLoader& loader) : loop_(loop), loader_(loader) {}
 
     Outcome open(const std::shared_ptr<MediaAsset>& asset, std::function<void()> goesOn) override;
 
 private:
+    PlayerLoop& loop_;
     DecoderLoader& loader_;
 };
 
