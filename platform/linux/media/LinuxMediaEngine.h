@@ -3,7 +3,6 @@
 #include "platform/core/media/CoreMediaEngine.h"
 #include "platform/linux/FileAccess.h"
 #include "platform/linux/media/AssetOpener.h"
-#include "platform/linux/media/IdleHeap.h"
 #include "platform/linux/media/LinuxAudioSession.h"
 #include "platform/linux/media/LinuxRendering.h"
 #include "platform/linux/media/SystemOutput.h"
@@ -29,11 +28,10 @@ public:
     /// Silences what still plays.
     ~LinuxMediaEngine() override;
 
-    MediaAssetOutcome openAsset(const std::string& URL) override;
+    MediaAssetOutcome openAsset(const std::string& URL) override { return opener_.open(URL); }
 
 private:
     const AssetOpener opener_;
-    IdleHeap heap_{LinuxMediaParts::loop};
 };
 
 } // namespace tarn
