@@ -3,4 +3,6 @@ add_library(tarn_warnings INTERFACE)
 target_compile_options(tarn_warnings INTERFACE
     -Wall -Wextra -Wpedantic -Wshadow -Wconversion -Wnon-virtual-dtor -Woverloaded-virtual -Wextra-semi -Wcast-qual
     $<$<CXX_COMPILER_ID:GNU>:-Wsuggest-override>
+    # Where one unit includes several sources: gcc takes them for headers, and names that are local to one are global to the next.
+    $<$<BOOL:${CMAKE_UNITY_BUILD}>:-Wno-shadow $<$<CXX_COMPILER_ID:GNU>:-Wno-subobject-linkage>>
     $<$<BOOL:${TARN_WERROR}>:-Werror>)

@@ -9,7 +9,7 @@ namespace tarn::tool {
 
 namespace {
 
-std::string quoted(std::string_view text) {
+std::string inQuotes(std::string_view text) {
     constexpr std::string_view digits = "0123456789abcdef";
     std::string out = "\"";
     for (const char character : text) {
@@ -47,9 +47,9 @@ std::string valueText(LineFormat format, const DictionaryValue& value) {
         [&](const auto& held) -> std::string {
             using Held = std::decay_t<decltype(held)>;
             if constexpr (std::is_same_v<Held, std::string>)
-                return quoted(held);
+                return inQuotes(held);
             else if constexpr (std::is_same_v<Held, Data>)
-                return quoted(hexadecimal(held));
+                return inQuotes(hexadecimal(held));
             else if constexpr (std::is_same_v<Held, Dictionary>)
                 return objectText(format, held);
             else if constexpr (std::is_same_v<Held, DictionaryList>)
@@ -68,7 +68,7 @@ std::string objectText(LineFormat format, const Dictionary& dictionary) {
     std::string text;
     for (const auto& [key, value] : dictionary) {
         text += text.empty() ? "{" : format == LineFormat::JSON ? "," : " ";
-        text += format == LineFormat::JSON ? quoted(key) + ":" : key + "=";
+        text += format == LineFormat::JSON ? inQuotes(key) + ":" : key + "=";
         text += valueText(format, value);
     }
     return text.empty() ? "{}" : text + "}";
@@ -91,9 +91,9 @@ std::string outputLine(LineFormat format, std::string_view type, const Dictionar
             line += " " + key + "=" + valueText(format, value);
         return line;
     }
-    line = "{\"type\":" + quoted(type);
+    line = "{\"type\":" + inQuotes(type);
     for (const auto& [key, value] : fields)
-        line += "," + quoted(key) + ":" + valueText(format, value);
+        line += "," + inQuotes(key) + ":" + valueText(format, value);
     return line + "}";
 }
 

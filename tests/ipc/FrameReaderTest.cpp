@@ -1,4 +1,5 @@
 #include "platform/linux/ipc/FrameReader.h"
+#include "tests/ipc/RawClient.h"
 
 #include <fcntl.h>
 
@@ -13,8 +14,6 @@ namespace {
 
 using Sender = FrameReader::Sender;
 using testing::HasSubstr;
-
-Data bytes(std::string_view text) { return {text.begin(), text.end()}; }
 
 FileDescriptor anyFile() { return FileDescriptor(::open("/dev/null", O_RDONLY | O_CLOEXEC)); }
 

@@ -7,9 +7,12 @@
 #include <string_view>
 #include <vector>
 
+#include "platform/Data.h"
 #include "platform/linux/ipc/FrameReader.h"
 
 namespace tarn {
+
+inline Data bytes(std::string_view text) { return {text.begin(), text.end()}; }
 
 /// A client that speaks in frames and can get everything wrong.
 class RawClient {

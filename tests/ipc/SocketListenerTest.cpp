@@ -24,8 +24,6 @@ using testing::HasSubstr;
 using testing::IsEmpty;
 using testing::SizeIs;
 
-Data bytes(std::string_view text) { return {text.begin(), text.end()}; }
-
 void echo(ReceivedCall call) { call.callback->call(call.data, std::nullopt); }
 
 std::size_t openFiles() {

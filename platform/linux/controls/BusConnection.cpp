@@ -34,7 +34,7 @@ constexpr microseconds timerAccuracy = milliseconds(1);
 /// once.
 constexpr seconds provenLifetime{10};
 
-constexpr char method[] = "BusConnection";
+constexpr char connectionMethod[] = "BusConnection";
 
 constexpr char localService[] = "org.freedesktop.DBus.Local";
 constexpr char localPath[] = "/org/freedesktop/DBus/Local";
@@ -168,14 +168,14 @@ void BusConnection::tryAgain() {
 void BusConnection::reportLoss(int reason) {
     if (report_ == Report::nothing || std::exchange(lossReported_, true))
         return;
-    SystemLog::error(method, __LINE__,
+    SystemLog::error(connectionMethod, __LINE__,
                      "%{public}s:%d: The %{public}s is out of reach (%{public}s); going on without it.",
                      name_, std::strerror(reason));
 }
 
 void BusConnection::reportReturn() {
     if (std::exchange(lossReported_, false))
-        SystemLog::message(method, __LINE__, "%{public}s:%d: The %{public}s is back.", name_);
+        SystemLog::message(connectionMethod, __LINE__, "%{public}s:%d: The %{public}s is back.", name_);
 }
 
 } // namespace tarn

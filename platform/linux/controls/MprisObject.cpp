@@ -11,7 +11,7 @@ namespace tarn {
 
 namespace {
 
-constexpr char method[] = "MprisObject";
+constexpr char mprisMethod[] = "MprisObject";
 constexpr char busNamePrefix[] = "org.mpris.MediaPlayer2.";
 constexpr char noSuchContentError[] = "ostrel.tarnd.Error.NoSuchContent";
 constexpr char commandFailedError[] = "ostrel.tarnd.Error.CommandFailed";
@@ -60,7 +60,7 @@ void MprisObject::appear() {
         sd_bus_slot* slot = nullptr;
         const int result = sd_bus_add_object_vtable(bus_, &slot, mprisPath, name, table, this);
         if (result < 0)
-            SystemLog::error(method, __LINE__,
+            SystemLog::error(mprisMethod, __LINE__,
                              "%{public}s:%d: Could not add %{public}s to the session bus: %d", name, result);
         interface.reset(slot);
     };
@@ -86,7 +86,7 @@ int MprisObject::handleNameReply(sd_bus_message* reply, void* object, sd_bus_err
     if (answer == exists && self.requestedName_ == self.wellKnownName_)
         self.requestName(self.wellKnownName_ + ".instance" + std::to_string(getpid()));
     else
-        SystemLog::error(method, __LINE__, "%{public}s:%d: The session bus refuses the name %{public}s.",
+        SystemLog::error(mprisMethod, __LINE__, "%{public}s:%d: The session bus refuses the name %{public}s.",
                          self.requestedName_);
     return 0;
 }

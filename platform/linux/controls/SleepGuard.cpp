@@ -10,7 +10,7 @@ namespace tarn {
 
 namespace {
 
-constexpr char method[] = "SleepGuard";
+constexpr char sleepMethod[] = "SleepGuard";
 constexpr char loginService[] = "org.freedesktop.login1";
 constexpr char loginPath[] = "/org/freedesktop/login1";
 constexpr char loginInterface[] = "org.freedesktop.login1.Manager";
@@ -95,7 +95,7 @@ int SleepGuard::handlePrepareForSleep(sd_bus_message* message, void* guard, sd_b
 }
 
 void SleepGuard::pause() {
-    SystemLog::message(method, __LINE__, "%{public}s:%d: Pausing before the system sleeps.");
+    SystemLog::message(sleepMethod, __LINE__, "%{public}s:%d: Pausing before the system sleeps.");
     if (!pauses_)
         pauses_.emplace(targets_);
     const bool taken = pauses_->deliver(

@@ -16,8 +16,8 @@ namespace tarn {
 
 namespace {
 
-constexpr char path[] = "/org/freedesktop/login1";
-constexpr char interface[] = "org.freedesktop.login1.Manager";
+constexpr char managerPath[] = "/org/freedesktop/login1";
+constexpr char managerInterface[] = "org.freedesktop.login1.Manager";
 
 /// A lock is held until the other end of its pipe is closed.
 struct Held {
@@ -46,7 +46,7 @@ public:
         sd_bus_set_address(bus_, address.c_str());
         sd_bus_set_bus_client(bus_, 1);
         if (sd_bus_start(bus_) < 0 ||
-            sd_bus_add_object_vtable(bus_, nullptr, path, interface, table, this) < 0 ||
+            sd_bus_add_object_vtable(bus_, nullptr, managerPath, managerInterface, table, this) < 0 ||
             sd_bus_request_name(bus_, "org.freedesktop.login1", 0) < 0)
             throw std::runtime_error("no login manager");
     }
@@ -69,7 +69,7 @@ public:
     }
 
     void prepareForSleep(bool beginning) {
-        sd_bus_emit_signal(bus_, path, interface, "PrepareForSleep", "b", beginning ? 1 : 0);
+        sd_bus_emit_signal(bus_, managerPath, managerInterface, "PrepareForSleep", "b", beginning ? 1 : 0);
         sd_bus_flush(bus_);
     }
 
