@@ -28,6 +28,19 @@ MediaErrorCode refusal(const std::string& URL) {
     return static_cast<MediaErrorCode>(outcome.error.code);
 }
 
+/// All that a file holds, and why no more of it; no error when it ends by itself.
+std::pair<PcmBuffer, Error> playThrough(const LinuxMediaAsset& asset) {
+    FileReader reader(asset.file());
+    const auto opened = sharedLoader().load()->open(reader, asset.info());
+    if (!opened.decoder)
+        return {{}, opened.error};
+    PcmBuffer buffer;
+    Decoder::State state = Decoder::State::more;
+    while (state == Decoder::State::more)
+        state = opened.decoder->read(buffer, 10'000);
+    return {buffer, state == Decoder::State::failed ? opened.decoder->error() : Error{}};
+}
+
 /// A file in memory that fails, or stops answering, from some byte on.
 class FaultySource final : public ByteSource {
 public:
@@ -168,22 +181,42 @@ TEST_F(OpenerTest, KeepsTheFileOpen) {
 }
 
 TEST_F(OpenerTest, AFileThatEndsTooEarlyFailsThere) {
-    for (const char* name : {"cut.flac", "cut.m4a", "cut.mp3", "cut.aiff"}) {
+    for (const char* name : {"cut.flac", "cut.m4a", "cut.mp3", "cut.aiff", "cut.wav"}) {
         const auto path = encode(name == std::string("cut.m4a") ? "-movflags faststart" : "", name);
         const auto asset = openFile(path);
         ASSERT_NE(asset, nullptr);
         std::filesystem::resize_file(path, std::filesystem::file_size(path) / 2);
-        FileReader reader(asset->file());
-        const auto opened = sharedLoader().load()->open(reader, asset->info());
-        ASSERT_NE(opened.decoder, nullptr) << name;
-        PcmBuffer buffer;
-        Decoder::State state = Decoder::State::more;
-        while (state == Decoder::State::more)
-            state = opened.decoder->read(buffer, 10'000);
-        EXPECT_EQ(state, Decoder::State::failed) << name;
-        EXPECT_EQ(opened.decoder->error().code, static_cast<std::int64_t>(MediaErrorCode::truncated)) << name;
+        const auto [buffer, error] = playThrough(*asset);
+        EXPECT_EQ(error.code, static_cast<std::int64_t>(MediaErrorCode::truncated)) << name;
         EXPECT_GT(buffer.frames, 30'000u) << name << ": what is there is played";
         EXPECT_LT(buffer.frames, 70'000u) << name;
+    }
+}
+
+TEST_F(OpenerTest, AFileThatWasCutOffBeforeItIsOpenedKeepsItsPromisedLengthAndFailsThere) {
+    for (const char* name : {"cut.flac", "cut.m4a", "cut.mp3", "cut.aiff", "cut.wav"}) {
+        const auto path = encode(name == std::string("cut.m4a") ? "-movflags faststart" : "", name);
+        std::filesystem::resize_file(path, std::filesystem::file_size(path) / 2);
+        const auto asset = openFile(path);
+        ASSERT_NE(asset, nullptr) << name;
+        EXPECT_NEAR(asset->duration().seconds(), 100'003 / 44'100.0, 0.01) << name;
+        const auto [buffer, error] = playThrough(*asset);
+        EXPECT_EQ(error.code, static_cast<std::int64_t>(MediaErrorCode::truncated)) << name;
+        EXPECT_GT(buffer.frames, 30'000u) << name << ": what is there is played";
+        EXPECT_LT(buffer.frames, 70'000u) << name;
+    }
+}
+
+TEST_F(OpenerTest, AWavFileWhoseWriterDidNotKnowItsLengthIsWhole) {
+    std::string bytes = contentOf(folder / "source.wav");
+    for (const std::string& size : {std::string("\xFF\xFF\xFF\xFF"), std::string("\0\xF0\xFF\x7F", 4)}) {
+        bytes.replace(bytes.find("data") + 4, 4, size);
+        const auto asset = openFile(folder.write("piped.wav", bytes));
+        ASSERT_NE(asset, nullptr);
+        EXPECT_EQ(asset->duration(), MediaTime(100'003, 44'100));
+        const auto [buffer, error] = playThrough(*asset);
+        EXPECT_EQ(error.code, 0);
+        EXPECT_EQ(buffer.frames, 100'003u);
     }
 }
 

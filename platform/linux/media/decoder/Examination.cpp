@@ -9,6 +9,7 @@
 #include "platform/linux/media/decoder/PacketTimeline.h"
 #include "platform/linux/media/decoder/Samples.h"
 #include "platform/linux/media/decoder/Tags.h"
+#include "platform/linux/media/decoder/WavPromise.h"
 
 namespace tarn {
 
@@ -117,6 +118,17 @@ std::int64_t unroundedEnd(std::int64_t end, ByteSource& source) {
     return std::abs(mediaEnd - end) <= tolerance ? mediaEnd : end;
 }
 
+// The demuxer takes what is left of a WAV file that was cut off for the whole.
+std::optional<std::int64_t> promisedWavFrames(const Container& container, ByteSource& source) {
+    const AVCodecParameters& parameters = *container.stream().codecpar;
+    const std::int64_t frameSize = parameters.block_align;
+    const bool pcm = av_get_exact_bits_per_sample(parameters.codec_id) > 0;
+    if (std::strcmp(container.context().iformat->name, "wav") != 0 || !pcm || frameSize <= 0)
+        return std::nullopt;
+    const auto bytes = brokenWavPromise(source);
+    return bytes ? std::optional(*bytes / frameSize) : std::nullopt;
+}
+
 } // namespace
 
 DecoderModule::Examined examineFile(ByteSource& source) {
@@ -141,7 +153,9 @@ DecoderModule::Examined examineFile(ByteSource& source) {
     const auto tag = readGaplessTag(container, source, length.firstPacketPosition());
     const bool mp3 = parameters.codec_id == AV_CODEC_ID_MP3;
     info.firstFrame = tag && mp3 ? tag->delay + mp3DecoderDelay : length.origin();
-    std::optional<std::int64_t> end = length.end();
+    std::optional<std::int64_t> end = promisedWavFrames(container, source);
+    if (!end)
+        end = length.end();
     if (container.failure())
         return {std::nullopt, *container.failure()};
     if (end && !tag && isMpeg4(container.context()))
