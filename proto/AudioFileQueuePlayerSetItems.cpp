@@ -11,10 +11,10 @@ void VLProtoAudioFileQueuePlayerSetItems::clearPlayerItemIdentifiers() {
         playerItemIdentifiers_->clear();
 }
 
-void VLProtoAudioFileQueuePlayerSetItems::addPlayerItemIdentifiers(std::string element) {
+void VLProtoAudioFileQueuePlayerSetItems::addPlayerItemIdentifiers(std::string_view element) {
     if (!playerItemIdentifiers_)
         playerItemIdentifiers_.emplace();
-    playerItemIdentifiers_->push_back(std::move(element));
+    playerItemIdentifiers_->push_back(element);
 }
 
 } // namespace tarn

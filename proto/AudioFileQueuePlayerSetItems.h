@@ -4,9 +4,9 @@
 #include <optional>
 #include <string>
 #include <string_view>
-#include <vector>
 
 #include "proto/Message.h"
+#include "proto/TextList.h"
 
 namespace tarn {
 
@@ -19,18 +19,15 @@ public:
     void setIdentifier(std::optional<std::string> value) { identifier_ = std::move(value); }
 
     using playerItemIdentifiersType = std::string;
-    const std::optional<std::vector<std::string>>& playerItemIdentifiers() const {
-        return playerItemIdentifiers_;
-    }
-    void setPlayerItemIdentifiers(std::optional<std::vector<std::string>> list) {
-        playerItemIdentifiers_ = std::move(list);
-    }
+    const std::optional<TextList>& playerItemIdentifiers() const { return playerItemIdentifiers_; }
+    void setPlayerItemIdentifiers(std::optional<TextList> list) { playerItemIdentifiers_ = std::move(list); }
     void clearPlayerItemIdentifiers();
-    void addPlayerItemIdentifiers(std::string element);
+    void addPlayerItemIdentifiers(std::string_view element);
     std::size_t playerItemIdentifiersCount() const {
         return playerItemIdentifiers_ ? playerItemIdentifiers_->size() : 0;
     }
-    const std::string& playerItemIdentifiersAtIndex(std::size_t index) const {
+    /// Good until the list changes. Throws std::out_of_range.
+    std::string_view playerItemIdentifiersAtIndex(std::size_t index) const {
         return playerItemIdentifiers_.value().at(index);
     }
 
@@ -41,7 +38,7 @@ public:
 
 private:
     std::optional<std::string> identifier_;
-    std::optional<std::vector<std::string>> playerItemIdentifiers_;
+    std::optional<TextList> playerItemIdentifiers_;
 };
 
 extern template class Message<VLProtoAudioFileQueuePlayerSetItems>;

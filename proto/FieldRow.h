@@ -13,6 +13,7 @@
 #include "platform/Data.h"
 #include "platform/core/ProtoCodable.h"
 #include "proto/Boxed.h"
+#include "proto/TextList.h"
 
 namespace tarn {
 
@@ -34,22 +35,21 @@ template <class Value>
 concept WireMessage = std::derived_from<typename Value::element_type, ProtoCodable> &&
     std::same_as<Value, std::shared_ptr<typename Value::element_type>>;
 
-/// What a repeated field consists of.
-template <class Value>
-concept WireElement = std::same_as<Value, std::string> || WireMessage<Value>;
-
 /// How a message holds a repeated field: an emptied list differs from one that was never made.
-template <WireElement Element>
+using WireTextList = std::optional<TextList>;
+template <WireMessage Element>
 using WireList = std::optional<std::vector<Element>>;
 
 template <class Value>
 concept WireMessageList = WireMessage<typename Value::value_type::value_type> &&
     std::same_as<Value, WireList<typename Value::value_type::value_type>>;
 
+template <class Value>
+concept WireAnyList = std::same_as<Value, WireTextList> || WireMessageList<Value>;
+
 /// Everything that a field can be.
 template <class Value>
-concept WireValue = WireScalar<Value> || WireText<Value> || WireMessage<Value> || WireMessageList<Value> ||
-    std::same_as<Value, WireList<std::string>>;
+concept WireValue = WireScalar<Value> || WireText<Value> || WireMessage<Value> || WireAnyList<Value>;
 
 enum class FieldLabel { required, optional, repeated };
 

@@ -26,17 +26,19 @@ bool read(ProtoReader& reader, std::optional<Data>& value) {
 
 /// The texts of a list mostly have one length: the first one tells how many the rest may hold. Room is made
 /// for so many at once, up to a few pages, and not for what a single short one among long ones promises.
-bool read(ProtoReader& reader, WireList<std::string>& value) {
-    constexpr std::size_t mostReserved = 1024;
+bool read(ProtoReader& reader, WireTextList& value) {
+    constexpr std::size_t mostTexts = 1024;
+    constexpr std::size_t mostCharacters = 65536;
     const auto text = reader.readString();
     if (!text)
         return true;
     if (!value) {
         const std::size_t rest = reader.length() - reader.position();
         value.emplace();
-        value->reserve(std::min(1 + rest / (text->size() + 2), mostReserved));
+        value->reserve(std::min(1 + rest / (text->size() + 2), mostTexts),
+                       std::min(text->size() + rest, mostCharacters));
     }
-    value->emplace_back(*text);
+    value->push_back(*text);
     return true;
 }
 
@@ -48,9 +50,9 @@ void write(ProtoWriter& writer, unsigned number, const std::optional<Data>& valu
     writer.writeData(value ? std::span(*value) : std::span<const std::uint8_t>(), number);
 }
 
-void write(ProtoWriter& writer, unsigned number, const WireList<std::string>& value) {
-    for (const auto& element : *value)
-        writer.writeString(element, number);
+void write(ProtoWriter& writer, unsigned number, const WireTextList& value) {
+    for (std::size_t index = 0; index < value->size(); ++index)
+        writer.writeString(value->at(index), number);
 }
 
 namespace {
@@ -75,10 +77,10 @@ std::uint32_t hash(const std::optional<Data>& value) {
     return hashOfBytes({reinterpret_cast<const char*>(value->data()), value->size()});
 }
 
-std::uint32_t hash(const WireList<std::string>& value) {
+std::uint32_t hash(const WireTextList& value) {
     std::uint32_t result = 0;
-    for (const auto& element : *value)
-        result = hashOfElements(result, hashOfBytes(element));
+    for (std::size_t index = 0; index < value->size(); ++index)
+        result = hashOfElements(result, hashOfBytes(value->at(index)));
     return result;
 }
 
@@ -94,10 +96,10 @@ std::uint32_t hashOfElements(std::uint32_t before, std::uint32_t element) {
     return before * 31 + element + 1;
 }
 
-void put(Dictionary& dictionary, std::string_view name, const WireList<std::string>& value) {
+void put(Dictionary& dictionary, std::string_view name, const WireTextList& value) {
     DictionaryList list;
-    for (const auto& element : *value)
-        list.push_back({element});
+    for (std::size_t index = 0; index < value->size(); ++index)
+        list.push_back({std::string(value->at(index))});
     dictionary.emplace(name, DictionaryValue{std::move(list)});
 }
 

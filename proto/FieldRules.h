@@ -20,7 +20,7 @@ namespace tarn::fieldRules {
 
 bool read(ProtoReader& reader, std::optional<std::string>& value);
 bool read(ProtoReader& reader, std::optional<Data>& value);
-bool read(ProtoReader& reader, WireList<std::string>& value);
+bool read(ProtoReader& reader, WireTextList& value);
 inline bool read(ProtoReader& reader, float& value) {
     value = reader.readFloat();
     return true;
@@ -67,7 +67,7 @@ bool read(ProtoReader& reader, WireList<std::shared_ptr<Embedded>>& value) {
 
 void write(ProtoWriter& writer, unsigned number, const std::optional<std::string>& value);
 void write(ProtoWriter& writer, unsigned number, const std::optional<Data>& value);
-void write(ProtoWriter& writer, unsigned number, const WireList<std::string>& value);
+void write(ProtoWriter& writer, unsigned number, const WireTextList& value);
 inline void write(ProtoWriter& writer, unsigned number, bool value) { writer.writeBool(value, number); }
 inline void write(ProtoWriter& writer, unsigned number, std::int32_t value) {
     writer.writeInt32(value, number);
@@ -119,8 +119,8 @@ bool carries(const Object& value) {
     return holds(value);
 }
 
-template <WireElement Element>
-bool carries(const WireList<Element>& value) {
+template <WireAnyList List>
+bool carries(const List& value) {
     return value && !value->empty();
 }
 
@@ -160,12 +160,18 @@ void merge(std::shared_ptr<Embedded>& value, const std::shared_ptr<Embedded>& ot
         value = other;
 }
 
-template <WireElement Element>
-void merge(WireList<Element>& value, const WireList<Element>& other) {
-    const std::vector<Element> added = *other; // the two may be one list
+template <std::derived_from<ProtoCodable> Embedded>
+void merge(WireList<std::shared_ptr<Embedded>>& value, const WireList<std::shared_ptr<Embedded>>& other) {
+    const auto added = *other; // the two may be one list
     if (!value)
         value.emplace();
     value->insert(value->end(), added.begin(), added.end());
+}
+
+inline void merge(WireTextList& value, const WireTextList& other) {
+    if (!value)
+        value.emplace();
+    value->append(*other);
 }
 
 // equal
@@ -198,7 +204,7 @@ bool equal(const WireList<std::shared_ptr<Embedded>>& left,
 
 std::uint32_t hash(const std::optional<std::string>& value);
 std::uint32_t hash(const std::optional<Data>& value);
-std::uint32_t hash(const WireList<std::string>& value);
+std::uint32_t hash(const WireTextList& value);
 std::uint32_t hash(double value);
 std::uint32_t hashOfElements(std::uint32_t before, std::uint32_t element);
 
@@ -238,7 +244,7 @@ void put(Dictionary& dictionary, std::string_view name, const Boxed<Object>& val
     put(dictionary, name, value.get());
 }
 
-void put(Dictionary& dictionary, std::string_view name, const WireList<std::string>& value);
+void put(Dictionary& dictionary, std::string_view name, const WireTextList& value);
 
 template <std::derived_from<ProtoCodable> Embedded>
 void put(Dictionary& dictionary, std::string_view name, const std::shared_ptr<Embedded>& value) {

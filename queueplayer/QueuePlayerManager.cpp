@@ -70,7 +70,7 @@ void VLTorviAudioFilePlayerQueuePlayerManager::_serveUpsert(
         return;
     std::vector<std::shared_ptr<MediaItem>> items;
     for (std::size_t index = 0; index < payload.playerItemIdentifiersCount(); ++index) {
-        const std::string& itemIdentifier = payload.playerItemIdentifiersAtIndex(index);
+        const std::string itemIdentifier(payload.playerItemIdentifiersAtIndex(index));
         auto item = playerItemWithIdentifier(itemIdentifier);
         if (!item) {
             _reportMissingAssetWithID(itemIdentifier, "upsertWithItems", reply);

@@ -118,9 +118,9 @@ TEST(List, IsReplacedByCopyToUnlessEmptyAndAppendedByMerge) {
     Items source;
     source.addPlayerItemIdentifiers("b");
     target.mergeFrom(source);
-    EXPECT_EQ(*target.playerItemIdentifiers(), (std::vector<std::string>{"a", "b"}));
+    EXPECT_EQ(*target.playerItemIdentifiers(), (TextList{"a", "b"}));
     source.copyTo(target);
-    EXPECT_EQ(*target.playerItemIdentifiers(), std::vector<std::string>{"b"});
+    EXPECT_EQ(*target.playerItemIdentifiers(), TextList{"b"});
     target.mergeFrom(target);
     EXPECT_EQ(target.playerItemIdentifiersCount(), 2U);
     EXPECT_THROW(target.playerItemIdentifiersAtIndex(2), std::out_of_range);

@@ -80,9 +80,7 @@ private:
     void write(ProtoWriter& writer, unsigned number, Value*) {
         writer.writeString(text(), number);
     }
-    void write(ProtoWriter& writer, unsigned number, WireList<std::string>*) {
-        writer.writeString(text(), number);
-    }
+    void write(ProtoWriter& writer, unsigned number, WireTextList*) { writer.writeString(text(), number); }
 
     template <WireMessage Value>
     void write(ProtoWriter& writer, unsigned number, Value*) {

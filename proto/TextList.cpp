@@ -1,0 +1,31 @@
+#include "proto/TextList.h"
+
+namespace tarn {
+
+TextList::TextList(std::initializer_list<std::string_view> texts) {
+    for (const std::string_view text : texts)
+        push_back(text);
+}
+
+TextList::TextList(const std::vector<std::string>& texts) {
+    for (const auto& text : texts)
+        push_back(text);
+}
+
+void TextList::append(const TextList& other) {
+    const TextList added = other; // the two may be one list
+    for (std::size_t index = 0; index < added.size(); ++index)
+        push_back(added.at(index));
+}
+
+void TextList::clear() {
+    characters_.clear();
+    ends_.clear();
+}
+
+void TextList::reserve(std::size_t texts, std::size_t characters) {
+    ends_.reserve(texts);
+    characters_.reserve(characters);
+}
+
+} // namespace tarn
