@@ -122,26 +122,26 @@ std::vector<Data> made(const std::vector<Share>& shares) {
 
 /// Commands of the client, then events of the service.
 const std::vector<Share> envelopeShares = {
-    {30, assetUpsert},
-    {80, [] { return velmoMessageForPlayerItemUpsertWithAsset(contained(uuid(), uuid()))->serialize(); }},
-    {10, [] { return setItems(8); }},
-    {80,
+    {90, assetUpsert},
+    {90, [] { return velmoMessageForPlayerItemUpsertWithAsset(contained(uuid(), uuid()))->serialize(); }},
+    {12, [] { return setItems(10); }},
+    {70,
      [] { return velmoMessageForQueuePlayerAppendItem(contained(queuePlayerName, uuid()))->serialize(); }},
-    {40, [] { return velmoMessageForAssetDestroy(object(uuid()))->serialize(); }},
-    {40, [] { return velmoMessageForPlayerItemDestroy(object(uuid()))->serialize(); }},
-    {200, [] { return velmoMessageForPlayerItemGetCurrentTime(object(uuid()))->serialize(); }},
-    {30, setCurrentTime},
+    {50, [] { return velmoMessageForAssetDestroy(object(uuid()))->serialize(); }},
+    {50, [] { return velmoMessageForPlayerItemDestroy(object(uuid()))->serialize(); }},
+    {70, [] { return velmoMessageForPlayerItemGetCurrentTime(object(uuid()))->serialize(); }},
+    {24, setCurrentTime},
     {40, [] { return velmoMessage(rate(1))->serialize(); }},
-    {20, [] { return velmoMessageForQueuePlayerAdvanceToNextItem(object(queuePlayerName))->serialize(); }},
-    {40, [] { return velmoMessageForPlayerItemSetStatus(status(uuid(), false))->serialize(); }},
+    {10, [] { return velmoMessageForQueuePlayerAdvanceToNextItem(object(queuePlayerName))->serialize(); }},
+    {90, [] { return velmoMessageForPlayerItemSetStatus(status(uuid(), false))->serialize(); }},
     {10, [] { return velmoMessageForPlayerItemSetStatus(status(uuid(), true))->serialize(); }},
-    {10, [] { return velmoMessageForQueuePlayerSetStatus(status(queuePlayerName, false))->serialize(); }},
+    {12, [] { return velmoMessageForQueuePlayerSetStatus(status(queuePlayerName, false))->serialize(); }},
     {40, [] { return velmoMessage(rate(0))->serialize(); }},
     {40,
      [] {
          return velmoMessageForQueuePlayerSetCurrentItem(contained(queuePlayerName, uuid()))->serialize();
      }},
-    {30, [] { return velmoMessageForPlayerItemNotifyDidPlayToEndTime(object(uuid()))->serialize(); }},
+    {20, [] { return velmoMessageForPlayerItemNotifyDidPlayToEndTime(object(uuid()))->serialize(); }},
     {20, [] { return velmoMessageForPlayerItemNotifyTimeJumped(object(uuid()))->serialize(); }},
 };
 
@@ -149,9 +149,10 @@ const std::vector<Share> envelopeShares = {
 
 Mix::Mix()
     : envelopes(made(envelopeShares)),
-      statuses(made({{10, [] { return status(std::nullopt, false)->serialize(); }}})),
-      assetMetaData(made({{30, assetAnswer}})),
-      currentTimes(made({{200, currentTimeAnswer}})) {}
+      statuses(made({{90, [] { return status(std::nullopt, false)->serialize(); }},
+                     {12, [] { return status(uuid(), false)->serialize(); }}})),
+      assetMetaData(made({{90, assetAnswer}})),
+      currentTimes(made({{70, currentTimeAnswer}})) {}
 
 Data queueOfItems(unsigned count) { return setItems(count); }
 
