@@ -36,12 +36,8 @@ MediaAssetOutcome openedAsset(MediaEngine& media, const std::string& URL) {
 
 /// Why a file did not open, for the client.
 std::string reasonOf(const Error& error) {
-    for (const char* key : {localizedFailureReasonKey, localizedDescriptionKey}) {
-        auto text = error.userInfo.find(key);
-        if (text != error.userInfo.end())
-            return text->second;
-    }
-    return describe(error);
+    const std::string text = textsOf(error);
+    return text.empty() ? describe(error) : text;
 }
 
 } // namespace

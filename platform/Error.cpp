@@ -2,14 +2,19 @@
 
 namespace tarn {
 
-std::string describe(const Error& error) {
+std::string textsOf(const Error& error) {
     std::string text;
     for (const char* key : {localizedDescriptionKey, localizedFailureReasonKey}) {
         auto entry = error.userInfo.find(key);
         if (entry != error.userInfo.end())
-            text += entry->second + ' ';
+            text += (text.empty() ? "" : " ") + entry->second;
     }
-    return text + '(' + error.domain + ", code " + std::to_string(error.code) + ')';
+    return text;
+}
+
+std::string describe(const Error& error) {
+    const std::string text = textsOf(error);
+    return text + (text.empty() ? "(" : " (") + error.domain + ", code " + std::to_string(error.code) + ')';
 }
 
 std::string describe(const std::optional<Error>& error) {

@@ -20,6 +20,9 @@ struct Error {
 inline constexpr char localizedDescriptionKey[] = "LocalizedDescription";
 inline constexpr char localizedFailureReasonKey[] = "LocalizedFailureReason";
 
+/// What it tells a person: the description, and the reason behind it; empty when it has neither.
+std::string textsOf(const Error& error);
+
 /// For the log: the texts if there are any, with domain and code.
 std::string describe(const Error& error);
 
