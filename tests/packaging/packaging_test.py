@@ -201,6 +201,18 @@ class TheInstalledPackages(unittest.TestCase):
             # Well below TasksMax and MemoryMax, which it takes a service manager to enforce.
             self.assertLess(int(status["Threads"]), 32)
             self.assertLess(int(status["VmHWM"].split()[0]), 256 * 1024)
+            self.play_what_only_the_client_sees()
+
+    def play_what_only_the_client_sees(self):
+        """The /tmp of the confined service is another one than the client's."""
+        with tempfile.TemporaryDirectory(dir="/tmp") as folder:
+            song = pathlib.Path(folder, "private.wav")
+            make_song(song)
+            refused = subprocess.run([self.prefix / "bin/tarnctl", "play", song], env=self.environment(), text=True,
+                                     capture_output=True, timeout=DEADLINE, check=False)
+            self.assertEqual(refused.returncode, 1)
+            self.assertIn("could not be opened", refused.stderr)
+            self.assertIn("Played everything", self.tarnctl("play", "--grant", song))
 
     def test_speaks_the_users_language(self):
         with self.service(LANG="de_DE.UTF-8"):

@@ -56,10 +56,10 @@ private:
     static ApplicationLabel ownLabel() { return {serviceName, ""}; }
 
     std::optional<ApplicationLabel> label(const std::string& application) const {
-        const auto name = applicationName_(application);
-        if (!name || name->empty())
+        const std::string name = busText(applicationName_(application).value_or(""));
+        if (name.find_first_not_of(' ') == std::string::npos)
             return std::nullopt;
-        return ApplicationLabel{busText(*name), busText(application)};
+        return ApplicationLabel{name, busText(application)};
     }
 
     bool playerLives() const {

@@ -32,6 +32,8 @@ protected:
     static std::optional<std::string> applicationName(const std::string& desktopEntry) {
         if (desktopEntry == "org.example.MusicBox")
             return "Music Box";
+        if (desktopEntry == "org.example.Blank")
+            return "\n\t ";
         return std::nullopt;
     }
 

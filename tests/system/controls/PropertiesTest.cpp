@@ -76,12 +76,14 @@ TEST_F(PropertiesTest, WithoutATrackThePlayerIsStopped) {
                {".Player", "Position", R"({"type":"x","data":0})"}});
 }
 
-TEST_F(PropertiesTest, AnUnknownApplicationIsShownAsTheService) {
-    publish(track("First", 0, 0), "org.example.Unknown");
-    player_ = std::make_unique<FakePlayer>(controls_->remoteCommands());
-    ASSERT_TRUE(listener_.waitForPlayer());
-    expectAll({{"", "Identity", R"({"type":"s","data":"tarnd"})"},
-               {"", "DesktopEntry", R"({"type":"s","data":""})"}});
+TEST_F(PropertiesTest, AnApplicationWithoutANameIsShownAsTheService) {
+    for (const char* application : {"org.example.Unknown", "org.example.Blank"}) {
+        publish(track("First", 0, 0), application);
+        player_ = std::make_unique<FakePlayer>(controls_->remoteCommands());
+        ASSERT_TRUE(listener_.waitForPlayer());
+        expectAll({{"", "Identity", R"({"type":"s","data":"tarnd"})"},
+                   {"", "DesktopEntry", R"({"type":"s","data":""})"}});
+    }
 }
 
 TEST_F(PropertiesTest, ThePositionRunsWhileItPlays) {

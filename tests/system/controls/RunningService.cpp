@@ -53,8 +53,8 @@ RunningService::RunningService(std::vector<std::string> environment, const std::
     // Of two settings of one name the first one counts: the runtime folder is not the sound server's.
     environment.insert(environment.begin(),
                        {"XDG_RUNTIME_DIR=" + folder, "HOME=" + folder, "XDG_DATA_HOME=" + folder + "/data",
-                        "XDG_DATA_DIRS=" + folder + "/none", "NOTIFY_SOCKET=" + readyPath, "LANG=C",
-                        "DBUS_SYSTEM_BUS_ADDRESS=unix:path=/nonexistent"});
+                        "XDG_DATA_DIRS=" + folder + "/none", "NOTIFY_SOCKET=" + readyPath, "LANG=C"});
+    environment.emplace_back("DBUS_SYSTEM_BUS_ADDRESS=unix:path=/nonexistent");
     process_ = std::make_unique<ChildProcess>(std::vector<std::string>{program}, environment,
                                               ChildProcess::ErrorOutput::withOutput);
     ready.waitForReady();

@@ -13,7 +13,8 @@ namespace tarn {
 /// The service itself, with a runtime folder and data folders of its own. Nothing of the system's is used.
 class RunningService final {
 public:
-    /// Returns when the service is ready. `environment` says where the sound server and the session bus are.
+    /// Returns when the service is ready. `environment` says where the sound server and the buses
+    /// are; without one for the system bus there is none.
     RunningService(std::vector<std::string> environment, const std::string& program);
 
     pid_t pid() const { return process_->pid(); }

@@ -1,4 +1,6 @@
 #include <algorithm>
+#include <fstream>
+#include <iterator>
 
 #include <gmock/gmock.h>
 
@@ -6,6 +8,7 @@
 
 #include "tests/support/AudioFixture.h"
 #include "tests/system/controls/BusListener.h"
+#include "tests/system/controls/FakeLoginManager.h"
 #include "tests/system/controls/PrivateBus.h"
 #include "tests/system/controls/RunningService.h"
 #include "tests/system/sound/SoundServerProcess.h"
@@ -27,6 +30,7 @@ protected:
     std::vector<std::string> serviceEnvironment() const {
         std::vector<std::string> environment = sound_.environment();
         environment.push_back(bus_.environment());
+        environment.push_back("DBUS_SYSTEM_BUS_ADDRESS=" + bus_.address());
         return environment;
     }
 
@@ -206,6 +210,65 @@ TEST_F(ServiceTest, WhatIsPausedDuringACallStaysPaused) {
     phone.reset();
     EXPECT_EQ(listener_.next(milliseconds(1000)), std::nullopt);
     EXPECT_EQ(status(), "Paused\n");
+}
+
+TEST_F(ServiceTest, TheSystemSleepsAndPlaybackWorksAfterIt) {
+    FakeLoginManager manager(bus_.address());
+    mirrorAlbum();
+    play();
+    ASSERT_TRUE(manager.waitForLocks({"idle:block", "sleep:delay"}));
+    manager.prepareForSleep(true);
+    EXPECT_EQ(listener_.next(), statusChanged);
+    EXPECT_EQ(status(), "Paused\n");
+    EXPECT_TRUE(manager.waitForLocks({}));
+    EXPECT_TRUE(service_.waitForLog("Pausing before the system sleeps"));
+    // What the sound server does to its device when the system goes to sleep and wakes up.
+    sound_.control({"suspend-sink", "out", "1"});
+    sound_.control({"suspend-sink", "out", "0"});
+    manager.prepareForSleep(false);
+    EXPECT_EQ(status(), "Paused\n");
+    play();
+    EXPECT_TRUE(manager.waitForLocks({"idle:block", "sleep:delay"}));
+}
+
+TEST_F(ServiceTest, TheStreamTellsTheSoundServerWhatItIs) {
+    mirrorAlbum();
+    play();
+    const std::string streams = sound_.control({"list", "sink-inputs"});
+    for (const char* property :
+         {R"(media.role = "music")", R"(application.name = "tarnd")", R"(application.id = "ostrel.tarnd")",
+          R"(module-stream-restore.id = "sink-input-by-application-id:ostrel.tarnd")"})
+        EXPECT_THAT(streams, testing::HasSubstr(property));
+}
+
+TEST_F(ServiceTest, HostileTagsOfAFileCostNothing) {
+    const auto path = service_.folder() / "hostile.wav";
+    writeWav(path, makeSweep(441'000, 44'100, 2));
+    std::ifstream original(path, std::ios::binary);
+    std::string content(std::istreambuf_iterator<char>(original), {});
+    const auto chunk = [](const std::string& name, const std::string& body) {
+        std::string size(4, '\0');
+        for (std::size_t byte = 0; byte < 4; ++byte)
+            size[byte] = static_cast<char>(body.size() >> (8 * byte));
+        return name + size + body;
+    };
+    const std::string title("\xff\xfe<3>\n\xe2\x80\xaetitle\x1b[2J\xed\xa0\x80\0", 22);
+    const std::string tags = chunk("INAM", title) + chunk("IART", std::string(1 << 20, '\n'));
+    content.insert(12, chunk("LIST", "INFO" + tags));
+    service_.folder().write("hostile.wav", content);
+
+    ASSERT_TRUE(wait(client_.upsertAsset({.identifier = "hostile", .URL = client::fileURL(path)})));
+    ASSERT_TRUE(wait(client_.upsertItem("hostile", "hostile")));
+    ASSERT_TRUE(wait(client_.upsertQueuePlayer("hostile,org.example.MusicBox", {"hostile"})));
+    ASSERT_TRUE(listener_.waitForPlayer());
+    play();
+    EXPECT_EQ(listener_.readAllProperties(), 20);
+    const std::string shown = playerctl({"metadata", "title"}).output;
+    EXPECT_THAT(shown, testing::HasSubstr("title"));
+    EXPECT_EQ(std::count(shown.begin(), shown.end(), '\n'), 1);
+    EXPECT_EQ(shown.find('\x1b'), std::string::npos);
+    ASSERT_TRUE(wait(client_.removeAllItems("hostile,org.example.MusicBox")));
+    EXPECT_EQ(listener_.next(), "Player: PlaybackStatus Metadata CanGoNext CanPlay CanPause");
 }
 
 TEST_F(ServiceTest, TheDeviceThatVanishesPauses) {
