@@ -28,7 +28,7 @@ class LinuxMediaControls::Implementation {
 public:
     Implementation(ApplicationName applicationName, Addresses addresses)
         : applicationName_(std::move(applicationName)),
-          mpris_(loop_, commands_, serviceName),
+          mpris_(commands_, serviceName),
           session_(loop_.event(), std::move(addresses.sessionBus), "session bus",
                    BusConnection::Report::outages, mpris_),
           sleep_(loop_, targets_, commands_, std::move(addresses.systemBus)) {
@@ -88,7 +88,7 @@ private:
     const std::shared_ptr<PublicationBoard> board_ =
         std::make_shared<PublicationBoard>(ownLabel(), [this] { loop_.post([this] { refresh(); }); });
     RemoteTargets targets_{[board = board_] { board->touch(); }};
-    RemoteCommandThread commands_{targets_};
+    RemoteCommandThread commands_{loop_, targets_};
     MprisState state_;
     std::uint64_t publicationSeen_ = 0;
     MprisObject mpris_;

@@ -20,8 +20,8 @@ MessageHandle referenced(sd_bus_message* message) { return MessageHandle(sd_bus_
 
 } // namespace
 
-MprisObject::MprisObject(BusLoop& loop, RemoteCommandThread& commands, std::string name)
-    : loop_(loop), commands_(commands), wellKnownName_(busNamePrefix + std::move(name)) {}
+MprisObject::MprisObject(RemoteCommandThread& commands, std::string name)
+    : commands_(commands), wellKnownName_(busNamePrefix + std::move(name)) {}
 
 MprisObject::~MprisObject() = default;
 
@@ -126,14 +126,11 @@ int MprisObject::command(sd_bus_message* message, RemoteCommandKind kind, sd_bus
             return sd_bus_error_set(error, commandFailedError, "There is nothing to play.");
         // Pausing does no harm and may be urgent: it is passed on even if nothing is known to play.
         if (kind == RemoteCommandKind::pause)
-            deliverUnanswered(kind);
+            commands_.deliverUnanswered(kind);
         return sd_bus_reply_method_return(message, nullptr);
     }
     const std::uint64_t number = ++lastCommand_;
-    const bool taken = commands_.deliver(kind, [&loop = loop_, this, number](RemoteCommandResult result) {
-        loop.post([this, number, result] { answer(number, result); });
-    });
-    if (!taken)
+    if (!commands_.deliver(kind, [this, number](RemoteCommandResult result) { answer(number, result); }))
         return sd_bus_error_set(error, SD_BUS_ERROR_LIMITS_EXCEEDED, "Too many commands are waiting.");
     unanswered_.emplace(number, referenced(message));
     return 1;
@@ -158,17 +155,12 @@ void MprisObject::answer(std::uint64_t command, RemoteCommandResult result) {
     }
 }
 
-void MprisObject::deliverUnanswered(RemoteCommandKind kind) {
-    // With too many commands waiting, one that nobody waits for is let go.
-    static_cast<void>(commands_.deliver(kind, [](RemoteCommandResult) {}));
-}
-
 void MprisObject::rateSet(double rate) {
     const bool playing = state_.playbackStatus == PlaybackStatus::playing;
     if (rate == 0.0)
-        deliverUnanswered(RemoteCommandKind::pause);
+        commands_.deliverUnanswered(RemoteCommandKind::pause);
     else if (rate == 1.0 && playing && state_.rate != 1.0)
-        deliverUnanswered(RemoteCommandKind::play);
+        commands_.deliverUnanswered(RemoteCommandKind::play);
 }
 
 } // namespace tarn

@@ -7,7 +7,6 @@
 
 #include "platform/linux/controls/BusConnection.h"
 #include "platform/linux/controls/BusHandles.h"
-#include "platform/linux/controls/BusLoop.h"
 #include "platform/linux/controls/MprisState.h"
 #include "platform/linux/controls/RemoteCommandThread.h"
 
@@ -21,7 +20,7 @@ namespace tarn {
 class MprisObject final : public BusConnectionClient {
 public:
     /// `name` is the last element of the bus name.
-    MprisObject(BusLoop& loop, RemoteCommandThread& commands, std::string name);
+    MprisObject(RemoteCommandThread& commands, std::string name);
     ~MprisObject() override;
 
     const MprisState& state() const { return state_; }
@@ -48,10 +47,8 @@ private:
     void requestName(std::string name);
     void signal(const MprisChanges& changes);
     void emit(const char* interface, const std::vector<std::string>& properties);
-    void deliverUnanswered(RemoteCommandKind kind);
     void answer(std::uint64_t command, RemoteCommandResult result);
 
-    BusLoop& loop_;
     RemoteCommandThread& commands_;
     const std::string wellKnownName_;
     MprisState state_;

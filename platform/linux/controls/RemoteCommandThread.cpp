@@ -6,8 +6,8 @@
 
 namespace tarn {
 
-RemoteCommandThread::RemoteCommandThread(RemoteTargets& targets)
-    : targets_(targets), thread_([this] { run(); }) {}
+RemoteCommandThread::RemoteCommandThread(BusLoop& loop, RemoteTargets& targets)
+    : loop_(loop), targets_(targets), thread_([this] { run(); }) {}
 
 RemoteCommandThread::~RemoteCommandThread() {
     {
@@ -29,6 +29,10 @@ bool RemoteCommandThread::deliver(RemoteCommandKind kind, Completion completion)
     return true;
 }
 
+void RemoteCommandThread::deliverUnanswered(RemoteCommandKind kind) {
+    static_cast<void>(deliver(kind, nullptr));
+}
+
 bool RemoteCommandThread::isBusy() {
     const std::lock_guard lock(mutex_);
     return delivering_ || !waiting_.empty();
@@ -41,11 +45,13 @@ void RemoteCommandThread::run() {
         changed_.wait(lock, [this] { return ending_ || !waiting_.empty(); });
         if (ending_)
             return;
-        const Delivery delivery = std::move(waiting_.front());
+        Delivery delivery = std::move(waiting_.front());
         waiting_.pop_front();
         delivering_ = true;
         lock.unlock();
-        delivery.completion(targets_.deliver(delivery.kind));
+        const RemoteCommandResult result = targets_.deliver(delivery.kind);
+        if (delivery.completion)
+            loop_.post([completion = std::move(delivery.completion), result] { completion(result); });
         lock.lock();
         delivering_ = false;
     }

@@ -8,6 +8,7 @@
 #include <thread>
 
 #include "platform/core/RemoteTargets.h"
+#include "platform/linux/controls/BusLoop.h"
 
 namespace tarn {
 
@@ -15,13 +16,14 @@ namespace tarn {
 /// Any thread may call, except its own for the destructor.
 class RemoteCommandThread final {
 public:
-    /// Runs on this thread.
+    /// Runs on the bus thread.
     using Completion = std::function<void(RemoteCommandResult result)>;
 
     /// How many commands may wait; more are only ever sent to do harm.
     static constexpr std::size_t limit = 64;
 
-    explicit RemoteCommandThread(RemoteTargets& targets);
+    /// Both outlive the thread.
+    RemoteCommandThread(BusLoop& loop, RemoteTargets& targets);
 
     /// Waits for the command that is being delivered and drops the others.
     ~RemoteCommandThread();
@@ -31,6 +33,9 @@ public:
 
     /// Returns at once; false, and never a call of `completion`, when too many commands wait already.
     [[nodiscard]] bool deliver(RemoteCommandKind kind, Completion completion);
+
+    /// The same for a command whose outcome nobody waits for: with too many waiting, it is let go.
+    void deliverUnanswered(RemoteCommandKind kind);
 
     /// Is a command being delivered, or waiting to be?
     bool isBusy();
@@ -43,6 +48,7 @@ private:
 
     void run();
 
+    BusLoop& loop_;
     RemoteTargets& targets_;
     std::mutex mutex_;
     std::condition_variable changed_;

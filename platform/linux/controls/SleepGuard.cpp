@@ -97,13 +97,11 @@ int SleepGuard::handlePrepareForSleep(sd_bus_message* message, void* guard, sd_b
 void SleepGuard::pause() {
     SystemLog::message(sleepMethod, __LINE__, "%{public}s:%d: Pausing before the system sleeps.");
     if (!pauses_)
-        pauses_.emplace(targets_);
-    const bool taken = pauses_->deliver(
-        RemoteCommandKind::pause, [this](RemoteCommandResult) { loop_.post([this] { sleep_.release(); }); });
-    if (!taken)
+        pauses_.emplace(loop_, targets_);
+    if (!pauses_->deliver(RemoteCommandKind::pause, [this](RemoteCommandResult) { sleep_.release(); }))
         sleep_.release();
-    if (commands_.isBusy()) // with too many waiting, this one is let go: nobody waits for it
-        static_cast<void>(commands_.deliver(RemoteCommandKind::pause, [](RemoteCommandResult) {}));
+    if (commands_.isBusy())
+        commands_.deliverUnanswered(RemoteCommandKind::pause);
 }
 
 } // namespace tarn
