@@ -1,8 +1,9 @@
 #!/usr/bin/env python3
 """Plays a file through the service, with nothing but its published messages.
 
-Make the two modules first:
-    protoc --python_out=. -I /usr/share/tarn/proto velmo.proto transport.proto
+Make its two modules first, in this folder; Debian has what that takes in protobuf-compiler and python3-protobuf:
+    protoc --python_out=. -I ../../../proto velmo.proto transport.proto
+An installation has the messages in share/tarn/proto.
 """
 import os
 import pathlib
