@@ -13,7 +13,9 @@
 #include "bench/controls/DeafBus.h"
 #include "platform/linux/controls/BusAddress.h"
 #include "platform/linux/controls/LinuxMediaControls.h"
+#include "platform/linux/controls/applications/DesktopApplicationRegistry.h"
 #include "tests/support/CapturedLog.h"
+#include "tests/support/TemporaryFolder.h"
 #include "tests/system/controls/BusListener.h"
 #include "tests/system/controls/FakePlayer.h"
 #include "tests/system/controls/PrivateBus.h"
@@ -86,6 +88,7 @@ public:
         if (countMessages() > 0)
             return fail("the controls speak without need");
         timePublications();
+        timeLookups();
         return timeReturns();
     }
 
@@ -152,6 +155,30 @@ private:
         times.sort();
         std::printf("publishing, on the publishing thread: median %.2f us, 99th percentile %.2f us\n",
                     times.median(), times.nearlyAll());
+    }
+
+    /// Of the application that an extension belongs to, among a desktop's usual number of them.
+    static void timeLookups() {
+        constexpr int applications = 300;
+        const TemporaryFolder folder;
+        for (int number = 0; number < applications; ++number)
+            folder.write("applications/org.example.Application" + std::to_string(number) + ".desktop",
+                         "[Desktop Entry]\nType=Application\nName=Application\n");
+        DesktopApplicationRegistry registry({folder.path()}, {"de", "en"});
+        const auto lookUp = [&] {
+            const auto begin = steady_clock::now();
+            static_cast<void>(registry.applicationContainingExtension("org.example.Application7.Watch"));
+            return Microseconds(steady_clock::now() - begin);
+        };
+        const Microseconds reading = lookUp();
+        Times times;
+        for (int sample = 0; sample < samples; ++sample)
+            times.add(lookUp());
+        times.sort();
+        std::printf(
+            "looking up one of %d applications: median %.1f us, 99th percentile %.1f us; the first time, "
+            "which reads them, %.0f us\n",
+            applications, times.median(), times.nearlyAll(), reading.count());
     }
 
     int timeReturns() {
