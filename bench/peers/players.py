@@ -86,6 +86,9 @@ class Mpd(Player):
     def pause(self):
         self.ask("pause 1")
 
+    def wait_for_end(self):
+        self.ask("idle player")
+
     def positions(self, count: int):
         self.socket.sendall(b"status\n" * count)
         while count > 0:
@@ -122,6 +125,10 @@ class Mpv(Player):
     def rate(self, rate: float):
         self.ask("set_property", "speed", rate)
 
+    def wait_for_end(self):
+        while b'"end-file"' not in self.line():
+            pass
+
     def positions(self, count: int):
         self.socket.sendall(b'{"command":["get_property","time-pos"]}\n' * count)
         while count > 0:
@@ -152,14 +159,24 @@ class Tarn(Player):
         envelope = field(2, field(kind, command))
         return struct.pack("<IBxxxQ", len(envelope), 1, call) + envelope
 
+    def next_frame(self) -> tuple:
+        """Its kind and body."""
+        while len(self.unread) < 16 or len(self.unread) < 16 + struct.unpack_from("<I", self.unread)[0]:
+            self.unread += self.socket.recv(65536)
+        length, kind = struct.unpack_from("<IB", self.unread)
+        body, self.unread = self.unread[16:16 + length], self.unread[16 + length:]
+        return kind, body
+
     def answers(self, count: int):
         """Reads on until so many calls were answered or released."""
         while count > 0:
-            while len(self.unread) < 16 or len(self.unread) < 16 + struct.unpack_from("<I", self.unread)[0]:
-                self.unread += self.socket.recv(65536)
-            length, kind = struct.unpack_from("<IB", self.unread)
-            self.unread = self.unread[16 + length:]
-            count -= kind in (3, 4)
+            count -= self.next_frame()[0] in (3, 4)
+
+    def wait_for_end(self):
+        """The event that the item was played to its end."""
+        end = field(2, field(self.ITEM, field(6, field(1, "item"))))
+        while self.next_frame() != (5, end):
+            pass
 
     def ask(self, kind: int, command: bytes):
         self.socket.sendall(self.frame(kind, command))

@@ -36,17 +36,22 @@ class Recorder:
             env=server.environment, stdout=subprocess.PIPE, bufsize=0)
         self.changed = threading.Condition()
         self.sounds = None
-        self.since = time.monotonic()
+        self.last_sound = 0.0  # when the last sample came that was not silent
+        self.since = time.monotonic()  # when that began
         threading.Thread(target=self._listen, daemon=True).start()
         self.wait(False)
 
     def _listen(self):
         while piece := self.process.stdout.read(1764):
+            now = time.monotonic()
             sounds = piece.count(0) != len(piece)
+            silent_tail = len(piece) - len(piece.rstrip(b"\0")) if sounds else 0
             with self.changed:
+                if sounds:
+                    self.last_sound = now - silent_tail / FRAME_SIZE / RATE
                 if sounds != self.sounds:
                     self.sounds = sounds
-                    self.since = time.monotonic()
+                    self.since = now
                     self.changed.notify_all()
 
     def wait(self, sounds: bool) -> float:
@@ -71,6 +76,13 @@ def wait_until(condition, what: str, limit: float = 20):
 
 FORMATS = {"flac": ["-c:a", "flac"], "m4a": ["-c:a", "aac", "-b:a", "192k"],
            "mp3": ["-c:a", "libmp3lame", "-q:a", "2"], "opus": ["-c:a", "libopus", "-b:a", "128k"]}
+
+
+def make_tone(path: pathlib.Path, seconds: float):
+    """A file that sounds to its last sample."""
+    subprocess.run(["ffmpeg", "-nostdin", "-v", "error", "-y", "-f", "lavfi", "-i", f"anoisesrc=r={RATE}:a=0.3",
+                    "-ac", "2", "-sample_fmt", "s16", "-t", str(seconds), str(path)], check=True)
+    return path
 
 
 def make_files(folder: pathlib.Path, seconds: float) -> dict:

@@ -23,6 +23,9 @@ public:
     /// frame that would have been heard next. The player renders again from there.
     virtual void outputWasReset() = 0;
 
+    /// Its clock was off, or has only begun to run: timeOfFrame() answers differently now.
+    virtual void outputClockMoved() = 0;
+
     /// The device that sounded is gone, and the output will not fall on to another by itself.
     virtual void outputDeviceVanished() = 0;
 };

@@ -51,6 +51,7 @@ private:
 
     void outputIsWritable() override { scheduleLocking(); }
     void outputWasReset() override { scheduleLocking(); }
+    void outputClockMoved() override { scheduleLocking(); }
     void outputDeviceVanished() override;
 
     void schedule();

@@ -18,6 +18,9 @@ constexpr auto streamRetry = 1500ms;
 constexpr auto timingRetry = 40ms;
 constexpr nanoseconds slowTimingRetry = 1s; // for a device that takes its time to begin
 constexpr int mostTimingTries = 25;
+constexpr int takingBackTries = 3;
+constexpr nanoseconds clockTolerance = 1ms;
+constexpr nanoseconds timingMargin = 2ms;
 constexpr auto renderingMargin = 25ms; // for rendering a piece and taking it to the server
 
 std::size_t capacityFor(const PcmFormat& format) {
@@ -242,13 +245,27 @@ void SystemOutput::streamTimingUpdated() {
         return;
     }
     latency_ = std::max(latency_, timing->latency);
-    if (timing->playing)
+    if (timing->playing) {
+        const nanoseconds before = timeOfFrame(writeIndex_);
         clock_.run(base_ + timing->readIndex + timing->silence - framesIn(timing->latency), timing->time);
+        const nanoseconds moved = timeOfFrame(writeIndex_) - before;
+        if (moved > clockTolerance || moved < -clockTolerance)
+            listener_.outputClockMoved();
+    }
     armWritable();
     if (timing->playing && timing->readIndex > 0 && timingTries_ > 0)
         return;
-    const nanoseconds pause = ++timingTries_ < mostTimingTries ? timingRetry : slowTimingRetry;
-    timingTimer_ = loop_.at(loop_.now() + pause, [this] { stream_->updateTiming(); });
+    timingTimer_ = loop_.at(loop_.now() + pauseBeforeTiming(*timing), [this] { stream_->updateTiming(); });
+}
+
+// How long until the next look at a stream of which nothing is heard yet. A device that still plays what it
+// took before takes ours when that is over, unless it can take the rest of it back, which it does at once.
+nanoseconds SystemOutput::pauseBeforeTiming(const SoundStream::Timing& timing) {
+    if (++timingTries_ >= mostTimingTries)
+        return slowTimingRetry;
+    if (timing.playing || timingTries_ < takingBackTries)
+        return timingRetry;
+    return std::clamp<nanoseconds>(timing.latency + timingMargin, timingRetry, slowTimingRetry);
 }
 
 // -- Writing.

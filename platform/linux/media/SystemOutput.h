@@ -59,6 +59,7 @@ private:
     void loseStream();
     void beginAnew(Mode mode);
     void updateTimingSoon();
+    std::chrono::nanoseconds pauseBeforeTiming(const SoundStream::Timing& timing);
     void send(const PcmBuffer& buffer, bool standing);
     void silenceFrom(std::int64_t index);
     void armWritable();

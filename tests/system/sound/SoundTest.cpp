@@ -1,4 +1,5 @@
 #include <numbers>
+#include <thread>
 
 #include "tests/support/CapturedLog.h"
 #include "tests/system/sound/SoundFixture.h"
@@ -65,6 +66,27 @@ TEST_F(SoundTest, TellsThePositionThatIsHeard) {
         const double error = positionError(*player, recorder, recording);
         EXPECT_GT(error, -0.02);
         EXPECT_LT(error, 0.08);
+    }
+}
+
+// This device takes two seconds at a time, and begins with ours only when those that it has are over.
+TEST_F(SoundTest, AnItemShorterThanTheDevicesBufferMovesAndEndsWhenItIsHeard) {
+    server.control({"load-module", "module-null-sink", "sink_name=slow"});
+    server.control({"set-default-sink", "slow"});
+    const Recording recording = makeSweep(second / 2, 44100, 2);
+    for (int i = 0; i < 3; ++i) {
+        const auto item = makeItem(recording);
+        const auto player = makePlayer({item});
+        player->setRate(1);
+        double position = 0;
+        while (player->rate() != 0 && (position = item->currentTime().seconds()) == 0)
+            std::this_thread::yield();
+        const auto beginning = std::chrono::steady_clock::now() - std::chrono::duration<double>(position);
+        EXPECT_LT(position, 0.25) << "it is told from the beginning on";
+        ASSERT_TRUE(events.wait(MediaItem::didPlayToEndTime));
+        const std::chrono::duration<double> length = std::chrono::steady_clock::now() - beginning;
+        EXPECT_GT(length.count(), 0.49);
+        EXPECT_LT(length.count(), 0.7);
     }
 }
 
