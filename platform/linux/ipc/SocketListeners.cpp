@@ -5,15 +5,17 @@
 namespace tarn {
 
 std::unique_ptr<ServiceListener> SocketListeners::createWithServiceName(const std::string& name) {
-    auto socket = std::make_unique<ListeningSocket>(name);
-    auto listener = std::make_unique<SocketListener>(socket->take(), tokens_);
-    sockets_.push_back(std::move(socket));
-    return listener;
+    return sockets_.withLocked([&](auto& sockets) {
+        auto& socket = sockets.emplace_back(std::make_unique<ListeningSocket>(name));
+        return std::make_unique<SocketListener>(socket->take(), tokens_);
+    });
 }
 
 void SocketListeners::removeSocketFiles() const {
-    for (const auto& socket : sockets_)
-        socket->removeFile();
+    sockets_.withLocked([](const auto& sockets) {
+        for (const auto& socket : sockets)
+            socket->removeFile();
+    });
 }
 
 } // namespace tarn

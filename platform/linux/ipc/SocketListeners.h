@@ -1,11 +1,11 @@
 #pragma once
 
 #include <memory>
-#include <mutex>
 #include <string>
 #include <vector>
 
 #include "platform/ServiceListener.h"
+#include "platform/core/MutexProtected.h"
 #include "platform/linux/ipc/ListeningSocket.h"
 #include "platform/linux/ipc/TokenTable.h"
 
@@ -19,12 +19,12 @@ public:
     /// Throws std::system_error, or std::runtime_error when another process serves the name.
     std::unique_ptr<ServiceListener> createWithServiceName(const std::string& name) override;
 
-    /// For a process that is about to end. Any thread, while no listener is being made.
+    /// For a process that is about to end. Any thread, at any time; waits for a listener that is being made.
     void removeSocketFiles() const;
 
 private:
     TokenTable& tokens_;
-    std::vector<std::unique_ptr<ListeningSocket>> sockets_;
+    MutexProtected<std::vector<std::unique_ptr<ListeningSocket>>> sockets_;
 };
 
 } // namespace tarn
