@@ -38,7 +38,8 @@ private:
     bool resumed_ = false;
 };
 
-std::unique_ptr<ServiceListener> SimulatedServiceListeners::createWithServiceName(const std::string& name) {
+std::unique_ptr<ServiceListener>
+SimulatedServiceListeners::createWithServiceName([[maybe_unused]] const std::string& name) {
     assert(name == "ostrel.tarnd");
     return std::make_unique<Listener>(*this);
 }

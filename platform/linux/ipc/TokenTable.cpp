@@ -4,7 +4,6 @@
 #include <sys/stat.h>
 
 #include <algorithm>
-#include <ranges>
 
 namespace tarn {
 
@@ -45,7 +44,7 @@ void TokenTable::forget(std::uint64_t connection) {
 
 std::int64_t TokenTable::consume(const char* token) {
     return state_.withLocked([&](State& state) -> std::int64_t {
-        for (auto& tokens : state.waiting | std::views::values | std::views::reverse) {
+        for (auto& [connection, tokens] : state.waiting) {
             const auto found = tokens.find(std::string_view(token));
             if (found == tokens.end())
                 continue;
@@ -64,7 +63,7 @@ void TokenTable::release(std::int64_t handle) {
 
 FileDescriptor TokenTable::open(const std::string& path) {
     return state_.withLocked([&](State& state) {
-        for (const auto& granted : state.held | std::views::values | std::views::reverse)
+        for (const auto& [handle, granted] : state.held)
             if (granted.path == path)
                 return FileDescriptor(::fcntl(granted.file.get(), F_DUPFD_CLOEXEC, 0));
         return FileDescriptor();

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <cstdint>
+#include <functional>
 #include <map>
 #include <string>
 #include <string_view>
@@ -38,8 +39,8 @@ private:
     using Waiting = std::map<std::string, GrantedFile, std::less<>>; // by token
 
     struct State {
-        std::map<std::uint64_t, Waiting> waiting; // by connection, the newest has the greatest number
-        std::map<std::int64_t, GrantedFile> held; // by handle
+        std::map<std::uint64_t, Waiting, std::greater<>> waiting; // by connection, the newest first
+        std::map<std::int64_t, GrantedFile, std::greater<>> held; // by handle, the newest first
         std::int64_t nextHandle = 0;
     };
 

@@ -45,7 +45,7 @@ std::optional<CallReply> decodeReply(std::span<const std::uint8_t> body) {
         return std::nullopt;
     CallReply reply{message->data(), std::nullopt};
     if (const auto& part = message->error()) {
-        reply.error.emplace(part->domain().value_or(""), part->code());
+        reply.error = {.domain = part->domain().value_or(""), .code = part->code(), .userInfo = {}};
         for (std::size_t i = 0; i < part->userInfoCount(); ++i) {
             const auto& entry = part->userInfoAtIndex(i);
             reply.error->userInfo[entry->key().value_or("")] = entry->value().value_or("");
