@@ -33,6 +33,13 @@ void FrameClient::send(int calls) {
     }
 }
 
+void FrameClient::send(int calls, Writes writes) {
+    if (writes == Writes::ofAllAtOnce)
+        return send(calls);
+    for (int i = 0; i < calls; ++i)
+        send(1);
+}
+
 int FrameClient::receive() {
     std::vector<Frame> frames;
     const auto count = ::recv(socket_.get(), buffer_.data(), buffer_.size(), 0);
@@ -57,16 +64,16 @@ std::vector<std::chrono::nanoseconds> FrameClient::roundTrips(int count) {
     return times;
 }
 
-double FrameClient::rate(int count, int ahead) {
+double FrameClient::rate(int count, int ahead, Writes writes) {
     const auto begin = SteadyTime::now();
-    send(ahead);
+    send(ahead, writes);
     int sent = ahead;
     for (int answered = 0; answered < count;) {
         const int now = receive();
         answered += now;
         const int next = std::min(now, count - sent);
         if (next > 0)
-            send(next);
+            send(next, writes);
         sent += std::max(next, 0);
     }
     return count / std::chrono::duration<double>(SteadyTime::now() - begin).count();

@@ -18,11 +18,17 @@ public:
     /// How long each of `count` round trips took, one after the other.
     std::vector<std::chrono::nanoseconds> roundTrips(int count);
 
+    enum class Writes {
+        ofEachCall, // as libtarn writes them
+        ofAllAtOnce // those that take the place of what was answered in one read
+    };
+
     /// Round trips in a second with `ahead` calls on the way at all times.
-    double rate(int count, int ahead);
+    double rate(int count, int ahead, Writes writes);
 
 private:
     void send(int calls);
+    void send(int calls, Writes writes);
     int receive();
 
     FileDescriptor socket_;
