@@ -16,7 +16,7 @@ namespace tarn {
 class ClientCallback {
 public:
     virtual ~ClientCallback() = default;
-    virtual void call(const std::optional<Data>& data, const std::optional<Error>& error) = 0;
+    virtual void call(std::optional<Data> data, const std::optional<Error>& error) = 0;
 };
 
 /// One call as it arrived: the bytes of an envelope, and its callback. When the client wants no answer, the
@@ -34,8 +34,8 @@ class VLLongFormAudioServerProtocol {
 public:
     virtual ~VLLongFormAudioServerProtocol() = default;
 
-    /// On the I/O thread. Takes the calls that arrived together, in order; returns when they have been
-    /// queued.
+    /// On the I/O thread. Takes the calls that arrived together, in order; they are queued before anything
+    /// that the thread calls next.
     virtual void receiveData(std::vector<ReceivedCall> calls) = 0;
 };
 

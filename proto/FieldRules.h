@@ -6,9 +6,9 @@
 #include <string>
 #include <vector>
 
+#include "platform/core/BlockCache.h"
 #include "platform/core/ProtoReader.h"
 #include "platform/core/ProtoWriter.h"
-#include "proto/BlockCache.h"
 #include "proto/FieldRow.h"
 
 /// What each operation of a message does to one field: one overload for each kind of value.

@@ -19,7 +19,7 @@ public:
     explicit Reply(std::unique_ptr<ClientCallback> callback) : callback_(std::move(callback)) {}
 
     /// Answers with a serialized payload.
-    void data(const Data& payload) { answer(payload, std::nullopt); }
+    void data(Data payload) { answer(std::move(payload), std::nullopt); }
 
     void error(const Error& error) { answer(std::nullopt, error); }
 
@@ -29,9 +29,9 @@ public:
     explicit operator bool() const { return callback_ != nullptr; }
 
 private:
-    void answer(const std::optional<Data>& data, const std::optional<Error>& error) {
+    void answer(std::optional<Data> data, const std::optional<Error>& error) {
         if (auto callback = std::exchange(callback_, nullptr))
-            callback->call(data, error);
+            callback->call(std::move(data), error);
     }
 
     std::unique_ptr<ClientCallback> callback_;

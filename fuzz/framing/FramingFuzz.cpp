@@ -8,6 +8,7 @@
 #include <string>
 #include <tuple>
 
+#include "platform/core/ProtoWriter.h"
 #include "platform/linux/ipc/FrameReader.h"
 #include "platform/linux/ipc/TransportMessages.h"
 
@@ -75,8 +76,11 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
         require(readIn(again, again.size(), sender, frame.kind == FrameKind::extension).frames.size() == 1);
         if (const auto extension = decodeExtension(frame.body))
             require(decodeExtension(encodeExtension(*extension)).has_value());
-        if (const auto reply = decodeReply(frame.body))
-            require(decodeReply(encodeReply(reply->data, reply->error)).has_value());
+        if (const auto reply = decodeReply(frame.body)) {
+            ProtoWriter encoded;
+            writeReply(reply->data, reply->error, encoded);
+            require(decodeReply(encoded.bytes()).has_value());
+        }
     }
     return 0;
 }

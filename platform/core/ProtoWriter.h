@@ -49,6 +49,9 @@ public:
     /// Everything that was written so far.
     Data data() const { return {begin_, cursor_}; }
 
+    /// The same without a copy; good until more is written.
+    std::span<const std::uint8_t> bytes() const { return {begin_, cursor_}; }
+
 private:
     static constexpr std::size_t longestVarint = 10;
     static constexpr std::size_t longestKeyAndNumber = 2 * longestVarint;

@@ -16,9 +16,9 @@ public:
             deliver({SimulatedDelivery::Kind::released, id_, {}, {}});
     }
 
-    void call(const std::optional<Data>& data, const std::optional<Error>& error) override {
+    void call(std::optional<Data> data, const std::optional<Error>& error) override {
         if (!std::exchange(called_, true))
-            deliver({SimulatedDelivery::Kind::answer, id_, data, error});
+            deliver({SimulatedDelivery::Kind::answer, id_, std::move(data), error});
     }
 
 private:

@@ -51,7 +51,7 @@ public:
             transcript_->add(command_ + ": no answer");
     }
 
-    void call(const std::optional<Data>& data, const std::optional<Error>& error) override {
+    void call(std::optional<Data> data, const std::optional<Error>& error) override {
         called_ = true;
         transcript_->add(command_ + ": " + outcome(data, error));
     }

@@ -3,6 +3,8 @@
 #include <utility>
 
 #include "platform/SystemLog.h"
+#include "platform/core/BlockCache.h"
+#include "platform/core/ProtoWriter.h"
 #include "platform/linux/ipc/TransportMessages.h"
 
 namespace tarn {
@@ -18,17 +20,22 @@ CallAnswer::~CallAnswer() {
     socket_->finishCall(bytes_);
 }
 
-void CallAnswer::call(const std::optional<Data>& data, const std::optional<Error>& error) {
+void* CallAnswer::operator new(std::size_t) { return BlockCache<sizeof(CallAnswer)>::take(); }
+
+void CallAnswer::operator delete(void* block) noexcept { BlockCache<sizeof(CallAnswer)>::give(block); }
+
+void CallAnswer::call(std::optional<Data> data, const std::optional<Error>& error) {
     if (callId_ == 0 || answered_)
         return;
-    const auto reply = encodeReply(data, error);
-    if (reply.size() > FrameHeader::largestBody) {
+    ProtoWriter reply;
+    writeReply(std::move(data), error, reply);
+    if (reply.bytes().size() > FrameHeader::largestBody) {
         SystemLog::error(__func__, __LINE__, "%{public}s:%d: dropped an answer of %d bytes: too long",
-                         reply.size());
+                         reply.bytes().size());
         return;
     }
     answered_ = true;
-    socket_->send(FrameKind::reply, callId_, reply);
+    socket_->send(FrameKind::reply, callId_, reply.bytes());
 }
 
 } // namespace tarn

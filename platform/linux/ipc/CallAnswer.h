@@ -16,7 +16,11 @@ public:
     CallAnswer(std::shared_ptr<ConnectionSocket> socket, std::uint64_t callId, std::size_t bytes);
     ~CallAnswer() override;
 
-    void call(const std::optional<Data>& data, const std::optional<Error>& error) override;
+    // Every call has one.
+    static void* operator new(std::size_t size);
+    static void operator delete(void* block) noexcept;
+
+    void call(std::optional<Data> data, const std::optional<Error>& error) override;
 
 private:
     const std::shared_ptr<ConnectionSocket> socket_;

@@ -41,18 +41,21 @@ void SocketConnection::receiveData(const Data& data) {
 bool SocketConnection::handle(std::uint32_t events, Receiver& receiver) {
     if ((events & EPOLLOUT) != 0)
         socket_->flush();
-    const bool hangUp = (events & (EPOLLRDHUP | EPOLLHUP | EPOLLERR)) != 0;
-    if (const auto failure = socket_->failure(); hangUp && !failure.empty())
-        interrupt(failure);
-    else if (hangUp && !resumed_)
-        loss_ = Loss::invalidation;
-    else if (hangUp)
-        while (loss_ == Loss::none)
-            read(receiver);
+    if ((events & (EPOLLRDHUP | EPOLLHUP | EPOLLERR)) != 0)
+        handleHangUp(receiver);
     else if ((events & EPOLLIN) != 0)
         read(receiver);
     socket_->limitReading();
     return loss_ == Loss::none;
+}
+
+void SocketConnection::handleHangUp(Receiver& receiver) {
+    if (const auto failure = socket_->failure(); !failure.empty())
+        return interrupt(failure);
+    if (!resumed_)
+        loss_ = Loss::invalidation;
+    while (loss_ == Loss::none)
+        read(receiver);
 }
 
 void SocketConnection::read(Receiver& receiver) {

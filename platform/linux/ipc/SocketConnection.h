@@ -48,6 +48,7 @@ private:
     enum class Loss { none, interruption, invalidation };
 
     void receiveData(const Data& data) override;
+    void handleHangUp(Receiver& receiver);
     void read(Receiver& receiver);
     void deliver(std::vector<Frame> frames);
     void takeExtension(Frame frame);

@@ -1,6 +1,7 @@
 #include "platform/linux/ipc/TransportMessages.h"
 
 #include <memory>
+#include <utility>
 
 #include "proto/TransportExtension.h"
 #include "proto/TransportReply.h"
@@ -21,9 +22,9 @@ std::optional<Extension> decodeExtension(std::span<const std::uint8_t> body) {
     return Extension{*message->token(), *message->path()};
 }
 
-Data encodeReply(const std::optional<Data>& data, const std::optional<Error>& error) {
+void writeReply(std::optional<Data> data, const std::optional<Error>& error, ProtoWriter& writer) {
     TransportReply message;
-    message.setData(data);
+    message.setData(std::move(data));
     if (error) {
         auto part = std::make_shared<TransportError>();
         part->setDomain(error->domain);
@@ -36,7 +37,7 @@ Data encodeReply(const std::optional<Data>& data, const std::optional<Error>& er
         }
         message.setError(std::move(part));
     }
-    return message.serialize();
+    message.writeTo(writer);
 }
 
 std::optional<CallReply> decodeReply(std::span<const std::uint8_t> body) {

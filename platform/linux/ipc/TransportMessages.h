@@ -9,6 +9,8 @@
 
 namespace tarn {
 
+class ProtoWriter;
+
 /// A client's grant: `token` stands for the file at `path`.
 struct Extension {
     std::string token;
@@ -21,10 +23,11 @@ struct CallReply {
     std::optional<Error> error;
 };
 
-/// The bodies of frames. Decoding yields none when the bytes are no such message or lack what it must have.
+/// The bodies of frames, encoded and decoded. Decoding yields none when the bytes are no such message or lack
+/// what it must have.
 Data encodeExtension(const Extension& extension);
 std::optional<Extension> decodeExtension(std::span<const std::uint8_t> body);
-Data encodeReply(const std::optional<Data>& data, const std::optional<Error>& error);
+void writeReply(std::optional<Data> data, const std::optional<Error>& error, ProtoWriter& writer);
 std::optional<CallReply> decodeReply(std::span<const std::uint8_t> body);
 
 } // namespace tarn
