@@ -23,19 +23,25 @@ void VLTorviAudioFilePlayerServer::handleMessage(std::shared_ptr<VLProtoAudioFil
     using Message = VLProtoAudioFilePlayerMessage;
     if (message == nullptr)
         return;
-    // Work holds the router, the message and the reply until it has run.
-    auto work = [&](auto managerCreateIfNeeded, auto part) {
-        return [=, self = shared_from_this()] {
-            ((*self).*managerCreateIfNeeded)()->handleMessage(((*message).*part)(), std::move(*reply));
-        };
-    };
     if (message->hasQueuePlayer())
-        queuePlayerManagerQueue_->async(
-            work(&Router::queuePlayerManagerCreateIfNeeded, &Message::queuePlayer));
+        submit<&Router::queuePlayerManagerCreateIfNeeded, &Message::queuePlayer>(
+            *queuePlayerManagerQueue_, std::move(message), std::move(reply));
     else if (message->hasPlayerItem())
-        playerItemManagerQueue_->async(work(&Router::playerItemManagerCreateIfNeeded, &Message::playerItem));
+        submit<&Router::playerItemManagerCreateIfNeeded, &Message::playerItem>(
+            *playerItemManagerQueue_, std::move(message), std::move(reply));
     else if (message->hasAsset())
-        queuePlayerManagerQueue_->async(work(&Router::assetManagerCreateIfNeeded, &Message::asset));
+        submit<&Router::assetManagerCreateIfNeeded, &Message::asset>(*queuePlayerManagerQueue_,
+                                                                     std::move(message), std::move(reply));
+}
+
+/// The work holds the router, the message and the reply until it has run.
+template <auto managerCreateIfNeeded, auto part>
+void VLTorviAudioFilePlayerServer::submit(SerialQueue& queue,
+                                          std::shared_ptr<VLProtoAudioFilePlayerMessage> message,
+                                          std::shared_ptr<Reply> reply) {
+    queue.async([self = shared_from_this(), message = std::move(message), reply = std::move(reply)] {
+        ((*self).*managerCreateIfNeeded)()->handleMessage(((*message).*part)(), std::move(*reply));
+    });
 }
 
 std::shared_ptr<VLTorviAudioFilePlayerAssetManager>

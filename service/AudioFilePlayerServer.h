@@ -64,6 +64,10 @@ private:
         std::weak_ptr<EventSink> audioServer;
     };
 
+    template <auto managerCreateIfNeeded, auto part>
+    void submit(SerialQueue& queue, std::shared_ptr<VLProtoAudioFilePlayerMessage> message,
+                std::shared_ptr<Reply> reply);
+
     template <class Manager>
     std::shared_ptr<Manager> createIfNeeded(std::shared_ptr<Manager> Managers::*slot);
     static void _updateManagerAssociations(Managers& managers);

@@ -9,6 +9,7 @@
 #include "platform/Localization.h"
 #include "platform/NowPlayingService.h"
 #include "platform/SystemLog.h"
+#include "platform/core/BlockCache.h"
 #include "proto/VelmoMessage.h"
 #include "reply/Error.h"
 #include "service/AudioFilePlayerServer.h"
@@ -71,6 +72,7 @@ void VLLongFormAudioServer::_connectionWasInvalidated() {
 void VLLongFormAudioServer::_replaceCurrentConnectionWithConnection(
     std::shared_ptr<ServiceConnection> connection) {
     assert(!commandServiceQueue_->isCurrent() && !platform_.queues.main().isCurrent());
+    waitForIntake();
     _setConnectionIsValid(false); // cancels the commands that have not begun
     commandServiceQueue_->sync([&] {
         audioFilePlayerServer_ = nullptr;
@@ -92,14 +94,24 @@ void VLLongFormAudioServer::receiveData(std::vector<ReceivedCall> calls) {
     arrived.reserve(calls.size());
     for (auto& call : calls)
         if (auto envelope = envelopeFromData(call.data))
-            arrived.emplace_back(std::move(envelope), std::make_shared<Reply>(std::move(call.callback)));
+            arrived.emplace_back(std::move(envelope), makeCached<Reply>(std::move(call.callback)));
     if (arrived.empty())
         return;
-    platform_.queues.main().sync([&] {
+    waitForIntake();
+    intakeIsDone_ = false;
+    platform_.queues.main().async([self = shared_from_this(), arrived = std::move(arrived)]() mutable {
         for (auto& [envelope, reply] : arrived)
-            _enqueueAudioCommand(std::make_shared<const VLLongFormAudioCommand>(
+            self->_enqueueAudioCommand(makeCached<const VLLongFormAudioCommand>(
                 envelope->audioFilePlayerMessage(), std::move(reply)));
+        self->intakeIsDone_ = true;
     });
+}
+
+/// The I/O thread waits for the main queue only when it has something else for the service to do. By then the
+/// step is usually long done, and the thread need not be woken for it.
+void VLLongFormAudioServer::waitForIntake() {
+    if (!intakeIsDone_)
+        platform_.queues.main().sync([] {});
 }
 
 void VLLongFormAudioServer::sendData(const Data& data) {

@@ -132,7 +132,7 @@ TYPED_TEST(ServiceStory, CommandsThatWaitWhenTheirClientIsReplacedAreCancelled) 
             [gate] { EXPECT_TRUE(gate->wait(std::chrono::seconds(60))); });
         for (int i = 0; i < 3; ++i)
             first.call(commands::getCurrentTime("unknown"));
-        world.listeners().settle();
+        world.settleIntake();
         SimulatedClient second(world.listeners());
         second.call(commands::getCurrentTime("unknown"));
         while (world.service()._connectionIsValid())
@@ -156,7 +156,7 @@ TYPED_TEST(ServiceStory, ALateAnswerGoesToTheConnectionThatItsCallCameFrom) {
         auto gate = world.clock().makeSignal();
         items->async([gate] { EXPECT_TRUE(gate->wait(std::chrono::seconds(60))); });
         first.call(commands::getCurrentTime("unknown"));
-        world.listeners().settle();
+        world.settleIntake();
         service.commandServiceQueue()->sync([] {});
         SimulatedClient second(world.listeners());
         second.call(commands::getCurrentTime("unknown"));
@@ -277,7 +277,7 @@ TYPED_TEST(ServiceStory, EventsGoToTheClientOfTheMomentInOrderOrNowhere) {
 /// Takes no work.
 class FullQueue final : public SerialQueue {
 public:
-    void async(std::function<void()>) override { throw std::runtime_error("the queue is full"); }
+    void async(Work) override { throw std::runtime_error("the queue is full"); }
     void sync(const std::function<void()>& work) override { work(); }
     bool isCurrent() const override { return false; }
     const std::string& label() const override { return label_; }

@@ -53,6 +53,11 @@ ThreadedWorld::ThreadedWorld(std::uint64_t seed)
     queues_.main().sync([] {}); // from now on it listens
 }
 
+void SimulatedWorld::settleIntake() {
+    platform_.listeners.settle();
+    platform_.queues.main().sync([] {});
+}
+
 ThreadedWorld::~ThreadedWorld() {
     settle();
     queues_.main().end();
@@ -64,8 +69,13 @@ void ThreadedWorld::linger() {
         std::this_thread::yield();
 }
 
-void ThreadedWorld::settle() {
+void ThreadedWorld::settleIntake() {
     listeners_.settle();
+    queues_.main().sync([] {});
+}
+
+void ThreadedWorld::settle() {
+    settleIntake();
     std::shared_ptr<VLTorviAudioFilePlayerServer> router;
     service_->commandServiceQueue()->sync([&] { router = service_->audioFilePlayerServer(); });
     if (router == nullptr)

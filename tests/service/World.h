@@ -43,6 +43,9 @@ public:
     /// Returns when all that was begun is done.
     void settle() { platform_.scheduler.runReady(); }
 
+    /// Returns when what was sent has become commands of the command queue.
+    void settleIntake();
+
 private:
     SimulatedPlatform platform_;
     std::shared_ptr<VLLongFormAudioServer> service_;
@@ -65,6 +68,7 @@ public:
     void progress() { std::this_thread::yield(); }
     void linger();
     void settle();
+    void settleIntake();
 
 private:
     class NoMedia;
