@@ -4,6 +4,8 @@
 #include <memory>
 #include <string>
 
+#include "platform/Work.h"
+
 namespace tarn {
 
 /// Runs submitted work one piece at a time, in order of submission.
@@ -16,7 +18,7 @@ public:
     virtual ~SerialQueue() = default;
 
     /// Returns at once; `work` keeps alive whatever it captured until it has run. `work` must not throw.
-    virtual void async(std::function<void()> work) = 0;
+    virtual void async(Work work) = 0;
 
     /// Returns when `work`, and everything submitted before it, has run. `work` may run on the caller's
     /// thread.

@@ -7,12 +7,10 @@
 
 namespace tarn {
 
-void MainQueue::async(std::function<void()> work) {
-    {
-        std::lock_guard lock(mutex_);
-        line_.push_back(std::move(work));
-    }
-    changed_.notify_one(); // without the lock, which the main thread wants at once
+void MainQueue::async(Work work) {
+    std::unique_lock lock(mutex_);
+    line_.push_back(std::move(work));
+    wakeIfItWaits(std::move(lock));
 }
 
 void MainQueue::sync(const std::function<void()>& work) {
@@ -29,10 +27,14 @@ bool MainQueue::isCurrent() const { return QueueFrame::isInnermost(this); }
 
 void MainQueue::runLoop() {
     std::unique_lock lock(mutex_);
-    for (;;) {
-        changed_.wait(lock, [this] { return ended_ || !line_.empty(); });
-        if (ended_)
-            return;
+    while (!ended_) {
+        if (line_.empty()) {
+            waits_ = true;
+            lock.unlock();
+            wake_.acquire();
+            lock.lock();
+            continue;
+        }
         auto work = std::move(line_.front());
         line_.pop_front();
         lock.unlock();
@@ -43,9 +45,17 @@ void MainQueue::runLoop() {
 }
 
 void MainQueue::end() {
-    std::lock_guard lock(mutex_);
+    std::unique_lock lock(mutex_);
     ended_ = true;
-    changed_.notify_one();
+    wakeIfItWaits(std::move(lock));
+}
+
+/// The main thread wants the lock as soon as it wakes up, so the lock is let go first.
+void MainQueue::wakeIfItWaits(std::unique_lock<std::mutex> lock) {
+    const bool waited = std::exchange(waits_, false);
+    lock.unlock();
+    if (waited)
+        wake_.release();
 }
 
 } // namespace tarn

@@ -1,8 +1,8 @@
 #pragma once
 
-#include <condition_variable>
 #include <deque>
 #include <mutex>
+#include <semaphore>
 
 #include "platform/SerialQueue.h"
 
@@ -11,7 +11,7 @@ namespace tarn {
 /// The queue of the main thread's run loop.
 class MainQueue final : public SerialQueue {
 public:
-    void async(std::function<void()> work) override;
+    void async(Work work) override;
     void sync(const std::function<void()>& work) override;
     bool isCurrent() const override;
     const std::string& label() const override { return label_; }
@@ -24,10 +24,13 @@ public:
 
 private:
     const std::string label_ = "main";
-    std::mutex mutex_;
-    std::condition_variable changed_;
-    std::deque<std::function<void()>> line_;
+    void wakeIfItWaits(std::unique_lock<std::mutex> lock);
+
+    std::counting_semaphore<> wake_{0};
+    std::mutex mutex_; // guards what follows
+    std::deque<Work> line_;
     bool ended_ = false;
+    bool waits_ = false;
 };
 
 } // namespace tarn

@@ -15,11 +15,6 @@ QueueFrame::QueueFrame(const void* queue) : queue_(queue), outer_(innermost) { i
 
 QueueFrame::~QueueFrame() { innermost = outer_; }
 
-void QueueFrame::run(const void* queue, const std::function<void()>& work) noexcept {
-    QueueFrame frame(queue);
-    work();
-}
-
 bool QueueFrame::isInnermost(const void* queue) { return innermost != nullptr && innermost->queue_ == queue; }
 
 void QueueFrame::abortIfInside(const void* queue, const std::string& label) {

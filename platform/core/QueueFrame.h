@@ -1,6 +1,5 @@
 #pragma once
 
-#include <functional>
 #include <string>
 
 namespace tarn {
@@ -10,7 +9,11 @@ namespace tarn {
 class QueueFrame {
 public:
     /// Runs `work` as work of `queue`. What it throws ends the process.
-    static void run(const void* queue, const std::function<void()>& work) noexcept;
+    template <class Callable>
+    static void run(const void* queue, Callable& work) noexcept {
+        QueueFrame frame(queue);
+        work();
+    }
 
     /// Is the innermost frame of the calling thread one of `queue`?
     static bool isInnermost(const void* queue);

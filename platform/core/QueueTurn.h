@@ -1,8 +1,7 @@
 #pragma once
 
-#include <condition_variable>
 #include <memory>
-#include <mutex>
+#include <semaphore>
 
 #include "platform/core/BlockingSection.h"
 
@@ -15,24 +14,18 @@ public:
 
     void wait() {
         BlockingSection blocking;
-        std::unique_lock lock(place_->mutex);
-        place_->granted.wait(lock, [this] { return isGranted_; });
+        place_->granted.acquire();
     }
 
-    /// The waiting thread may destroy this as soon as it sees the grant; its place lives until it is woken.
+    /// Once. The waiting thread may destroy this as soon as it sees the grant; its place lives on.
     void grant() {
         const auto place = place_;
-        {
-            std::lock_guard lock(place->mutex);
-            isGranted_ = true;
-        }
-        place->granted.notify_one(); // without the lock, which the woken thread wants at once
+        place->granted.release();
     }
 
 private:
     struct Place {
-        std::mutex mutex;
-        std::condition_variable granted;
+        std::counting_semaphore<> granted{0};
     };
 
     /// A thread waits for one turn at a time.
@@ -42,7 +35,6 @@ private:
     }
 
     const std::shared_ptr<Place> place_;
-    bool isGranted_ = false; // under the place's lock
 };
 
 } // namespace tarn

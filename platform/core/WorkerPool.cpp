@@ -14,8 +14,8 @@ WorkerPool::~WorkerPool() {
     assert(currentWorker_ == nullptr || &currentWorker_->pool != this);
     std::unique_lock lock(mutex_);
     stopping_ = true;
-    for (const auto& worker : idle_)
-        worker->wake.notify_one();
+    for (const auto& worker : std::exchange(idle_, {}))
+        worker->wake.release();
     retired_.wait(lock, [this] { return workers_.empty(); });
     for (const auto& worker : finished_)
         worker->thread.join();
@@ -42,7 +42,7 @@ void WorkerPool::makeReady(std::shared_ptr<Task> task) {
         woken = giveLocked(std::move(task));
     }
     if (woken != nullptr)
-        woken->wake.notify_one();
+        woken->wake.release();
 }
 
 /// Gives the task to an idle worker and returns it, to be woken. Without one the task waits for a new worker,
@@ -80,7 +80,7 @@ void WorkerPool::beginBlocking(Worker& worker) {
             spawnLocked();
     }
     if (woken != nullptr)
-        woken->wake.notify_one();
+        woken->wake.release();
 }
 
 void WorkerPool::endBlocking(Worker& worker) {
@@ -145,10 +145,11 @@ std::shared_ptr<WorkerPool::Task> WorkerPool::waitForTask(Workers::iterator self
         return task;
     if (!stopping_ && idle_.size() < maxIdle) {
         idle_.push_back(*self);
-        worker.wake.wait(lock, [&] { return worker.given != nullptr || stopping_; });
+        lock.unlock();
+        worker.wake.acquire();
         if (worker.given != nullptr)
             return std::exchange(worker.given, nullptr);
-        std::erase(idle_, *self);
+        lock.lock(); // the pool stops
     }
     finished_.splice(finished_.end(), workers_, self);
     retired_.notify_all();

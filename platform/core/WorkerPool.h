@@ -7,6 +7,7 @@
 #include <list>
 #include <memory>
 #include <mutex>
+#include <semaphore>
 #include <thread>
 #include <vector>
 
@@ -60,10 +61,9 @@ private:
         std::shared_ptr<Task> next; // to be taken up by this worker when it is done with its own
         bool blocked = false;       // in a BlockingSection
 
-        // Under the pool's lock.
-        std::thread thread;
-        std::condition_variable wake;
-        std::shared_ptr<Task> given; // to an idle worker, which then wakes up
+        std::counting_semaphore<> wake{0};
+        std::shared_ptr<Task> given; // to an idle worker, before it is woken
+        std::thread thread;          // under the pool's lock
     };
     using Workers = std::list<std::shared_ptr<Worker>>;
 

@@ -18,7 +18,7 @@ public:
 
     const std::string& label() const { return label_; }
 
-    void async(std::function<void()> work) {
+    void async(Work work) {
         {
             std::lock_guard lock(mutex_);
             line_.push_back({std::move(work), nullptr});
@@ -37,17 +37,14 @@ public:
     }
 
     bool run(WorkerPool::TimePoint end) noexcept override {
-        std::unique_lock lock(mutex_);
-        while (!handOverLocked()) {
-            Entry entry = std::move(line_.front());
-            line_.pop_front();
-            lock.unlock();
+        for (bool isFirst = true; !handOver(); isFirst = false) {
+            if (!isFirst && std::chrono::steady_clock::now() >= end)
+                return true;
+            Entry entry = std::move(taken_.front());
+            taken_.pop_front();
             QueueFrame frame(this);
             entry.work();
             entry.work = nullptr; // what it held may be the queue's last owner: still on the queue
-            if (std::chrono::steady_clock::now() >= end)
-                return true;
-            lock.lock();
         }
         return false;
     }
@@ -55,7 +52,7 @@ public:
 private:
     /// Work for a worker, or a thread that waits in sync().
     struct Entry {
-        std::function<void()> work;
+        Work work;
         QueueTurn* turn;
     };
 
@@ -71,31 +68,31 @@ private:
     }
 
     void giveUp() {
-        {
-            std::lock_guard lock(mutex_);
-            if (handOverLocked())
-                return;
-        }
-        pool_.schedule(shared_from_this());
+        if (!handOver())
+            pool_.schedule(shared_from_this());
     }
 
     /// Lets go of the queue unless the next in line is work for a worker.
-    bool handOverLocked() {
-        if (line_.empty()) {
-            held_ = false;
-            return true;
+    bool handOver() {
+        if (taken_.empty()) {
+            std::lock_guard lock(mutex_);
+            held_ = !line_.empty();
+            if (!held_)
+                return true;
+            taken_.swap(line_);
         }
-        QueueTurn* turn = line_.front().turn;
+        QueueTurn* turn = taken_.front().turn;
         if (turn == nullptr)
             return false;
-        line_.pop_front();
+        taken_.pop_front();
         turn->grant();
         return true;
     }
 
     WorkerPool& pool_;
     const std::string label_;
-    std::mutex mutex_;
+    std::deque<Entry> taken_; // from the line, all at once, by whoever holds the queue; before the line
+    std::mutex mutex_;        // guards what follows
     std::deque<Entry> line_;
     bool held_ = false;
 };
@@ -103,7 +100,7 @@ private:
 WorkerQueue::WorkerQueue(WorkerPool& pool, std::string label)
     : state_(std::make_shared<State>(pool, std::move(label))) {}
 
-void WorkerQueue::async(std::function<void()> work) { state_->async(std::move(work)); }
+void WorkerQueue::async(Work work) { state_->async(std::move(work)); }
 
 void WorkerQueue::sync(const std::function<void()>& work) {
     auto state = state_; // the work may drop the last handle

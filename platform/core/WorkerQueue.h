@@ -19,7 +19,7 @@ public:
     /// The pool outlives the queue and its work.
     WorkerQueue(WorkerPool& pool, std::string label);
 
-    void async(std::function<void()> work) override;
+    void async(Work work) override;
     void sync(const std::function<void()>& work) override;
     bool isCurrent() const override;
     const std::string& label() const override;

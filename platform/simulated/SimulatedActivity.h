@@ -1,10 +1,11 @@
 #pragma once
 
 #include <deque>
-#include <functional>
 #include <memory>
 #include <string>
 #include <vector>
+
+#include "platform/Work.h"
 
 namespace tarn {
 
@@ -15,7 +16,7 @@ class SimulatedScheduler;
 struct SimulatedLane {
     /// Work to be run, or an activity that waits for its turn in sync().
     struct Entry {
-        std::function<void()> work;
+        Work work;
         SimulatedActivity* turn;
     };
 

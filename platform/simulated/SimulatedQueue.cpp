@@ -15,7 +15,7 @@ SimulatedQueue::SimulatedQueue(SimulatedScheduler& scheduler, std::string label)
     lane_->label = std::move(label);
 }
 
-void SimulatedQueue::async(std::function<void()> work) {
+void SimulatedQueue::async(Work work) {
     auto& scheduler = scheduler_; // the work may drop the last handle before this returns
     scheduler.submit(lane_, std::move(work));
     scheduler.yieldPoint();

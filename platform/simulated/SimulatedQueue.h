@@ -12,7 +12,7 @@ class SimulatedQueue final : public SerialQueue {
 public:
     SimulatedQueue(SimulatedScheduler& scheduler, std::string label);
 
-    void async(std::function<void()> work) override;
+    void async(Work work) override;
     void sync(const std::function<void()>& work) override;
     bool isCurrent() const override;
     const std::string& label() const override;

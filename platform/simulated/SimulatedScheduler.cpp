@@ -42,15 +42,15 @@ bool waitsInACircle(const SimulatedActivity& activity) {
     std::abort();
 }
 
-using Work = std::function<void()>;
+using TimedWork = std::function<void()>;
 
 /// Keeps a timer going, and its work wanted.
 struct TimerRegistration final : Registration {
-    TimerRegistration(std::shared_ptr<Work> timerToKeep, std::shared_ptr<Work> workToKeep)
+    TimerRegistration(std::shared_ptr<TimedWork> timerToKeep, std::shared_ptr<TimedWork> workToKeep)
         : timer(std::move(timerToKeep)), work(std::move(workToKeep)) {}
 
-    const std::shared_ptr<Work> timer;
-    const std::shared_ptr<Work> work;
+    const std::shared_ptr<TimedWork> timer;
+    const std::shared_ptr<TimedWork> work;
 };
 
 } // namespace
@@ -68,7 +68,7 @@ std::shared_ptr<SimulatedQueue> SimulatedScheduler::createQueue(std::string labe
 
 RegistrationHandle SimulatedScheduler::at(Time time, std::shared_ptr<SimulatedQueue> queue,
                                           std::function<void()> work) {
-    auto wanted = std::make_shared<Work>(std::move(work));
+    auto wanted = std::make_shared<TimedWork>(std::move(work));
     auto timer = addTimer(time, [this, lane = queue->lane_, weak = std::weak_ptr(wanted)] {
         submit(lane, [weak] {
             if (auto stillWanted = weak.lock())
@@ -158,7 +158,7 @@ std::shared_ptr<SimulatedScheduler::Timer> SimulatedScheduler::addTimer(Time tim
     return timer;
 }
 
-void SimulatedScheduler::submit(const Lane& lane, std::function<void()> work) {
+void SimulatedScheduler::submit(const Lane& lane, Work work) {
     if (lane->holder == nullptr && lane->line.empty())
         runnable_.push_back(lane);
     lane->line.push_back({std::move(work), nullptr});
@@ -201,12 +201,6 @@ void SimulatedScheduler::runFirst(const Lane& lane) {
     work = nullptr;
     current_->inside.pop_back();
     giveUp(lane);
-}
-
-void SimulatedScheduler::runInside(const Lane& lane, const std::function<void()>& work) noexcept {
-    current_->inside.push_back(lane.get());
-    work();
-    current_->inside.pop_back();
 }
 
 } // namespace tarn

@@ -11,6 +11,8 @@
 #include <vector>
 
 #include "platform/Registration.h"
+#include "platform/Work.h"
+#include "platform/simulated/SimulatedActivity.h"
 
 namespace tarn {
 
@@ -90,11 +92,17 @@ private:
     SimulatedActivity& spareActivity();
     std::shared_ptr<Timer> addTimer(Time time, Timer fire);
 
-    void submit(const Lane& lane, std::function<void()> work);
+    void submit(const Lane& lane, Work work);
     void takeTurn(const Lane& lane);
     void giveUp(const Lane& lane);
     void runFirst(const Lane& lane);
-    void runInside(const Lane& lane, const std::function<void()>& work) noexcept;
+
+    template <class Callable>
+    void runInside(const Lane& lane, Callable& work) noexcept {
+        current_->inside.push_back(lane.get());
+        work();
+        current_->inside.pop_back();
+    }
 
     std::mt19937_64 engine_;
     Time now_{0};
