@@ -2,6 +2,7 @@
 
 #include <fcntl.h>
 #include <sys/socket.h>
+#include <sys/time.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -22,6 +23,18 @@ namespace fs = std::filesystem;
 
 std::size_t entriesOf(const fs::path& folder) {
     return static_cast<std::size_t>(std::distance(fs::directory_iterator(folder), fs::directory_iterator()));
+}
+
+/// Ends the program when the service does not become ready.
+void waitUntilReady(int notifications) {
+    constexpr timeval deadline{10, 0};
+    ::setsockopt(notifications, SOL_SOCKET, SO_RCVTIMEO, &deadline, sizeof(deadline));
+    std::array<char, 64> message{};
+    while (::recv(notifications, message.data(), message.size() - 1, 0) > 0)
+        if (std::string_view(message.data()).find("READY=1") != std::string_view::npos)
+            return;
+    std::fprintf(stderr, "the service did not become ready\n");
+    std::abort();
 }
 
 [[noreturn]] void become(const fs::path& folder, const fs::path& readySocket) {
@@ -49,10 +62,7 @@ ServiceProcess::ServiceProcess() {
     pid_ = ::fork();
     if (pid_ == 0)
         become(folder_, readyPath);
-    std::array<char, 64> message{};
-    while (::recv(ready.get(), message.data(), message.size() - 1, 0) > 0 &&
-           std::string_view(message.data()).find("READY=1") == std::string_view::npos) {
-    }
+    waitUntilReady(ready.get());
     startTime_ = std::chrono::steady_clock::now() - begin;
 }
 
