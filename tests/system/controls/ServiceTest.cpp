@@ -252,7 +252,7 @@ TEST_F(ServiceTest, HostileTagsOfAFileCostNothing) {
             size[byte] = static_cast<char>(body.size() >> (8 * byte));
         return name + size + body;
     };
-    const std::string title("\xff\xfe<3>\n\xe2\x80\xaetitle\x1b[2J\xed\xa0\x80\0", 22);
+    const std::string title = "\xff\xfe<3>\n\xe2\x80\xaetitle\xe2\x80\xac\x1b[2J\xed\xa0\x80";
     const std::string tags = chunk("INAM", title) + chunk("IART", std::string(1 << 20, '\n'));
     content.insert(12, chunk("LIST", "INFO" + tags));
     service_.folder().write("hostile.wav", content);
