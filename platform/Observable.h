@@ -24,12 +24,12 @@ public:
 
     virtual ~Observable() = default;
 
-    /// Watches `keyPath`: `block` runs once inside this call with the value of the moment, then once for
-    /// every change, on the thread that made the change or on one that is already reporting for this
-    /// registration.
+    /// Watches `keyPath`: `block` runs once inside this call with the value of the moment, then after every
+    /// change, on the thread that made the change or on one that is already reporting for this registration.
     ///
-    /// Calls of one registration never overlap, and the last call sees the last value. No lock of the object
-    /// is held meanwhile. A key path that the object does not have is a bug.
+    /// Calls of one registration never overlap; changes that are made during a call share the one that
+    /// follows it. The last call sees the last value. No lock of the object is held meanwhile. A key path
+    /// that the object does not have is a bug; its name outlives the registration, as a literal does.
     [[nodiscard]] virtual RegistrationHandle observe(std::string_view keyPath, Block block) = 0;
 };
 

@@ -1,98 +1,108 @@
 #include "platform/core/ObserverList.h"
 
-#include <mutex>
-#include <string>
+#include <atomic>
+#include <cstdint>
+#include <thread>
 #include <utility>
 
 namespace tarn {
 
-/// One registration. Changes are counted; the thread that finds the observer free makes the calls, also for
-/// the changes that other threads count meanwhile.
+/// One registration. The thread that finds the observer free makes the calls, also for the changes that
+/// others see meanwhile; these are only marked.
 class ObserverList::Observer {
 public:
-    Observer(std::string keyPath, std::shared_ptr<const Read> read, Observable::Block block)
-        : keyPath_(std::move(keyPath)), read_(std::move(read)), block_(std::move(block)) {}
+    /// The calls are the maker's, beginning with the initial one.
+    Observer(std::string_view keyPath, Observable::Block block)
+        : keyPath_(keyPath), block_(std::move(block)) {}
 
-    const std::string& keyPath() const { return keyPath_; }
+    std::string_view keyPath() const { return keyPath_; }
+    bool hasEnded() const { return (state_ & ended) != 0; }
 
-    /// Before anyone else knows the observer: the calls are the caller's, beginning with the initial one.
-    void reserveInitialCall() {
-        pending_ = 1;
-        calling_ = true;
+    /// True when the calls for it are the caller's to make.
+    bool markChanged() {
+        state_ |= changed;
+        return take();
     }
 
-    void makeReservedCalls(Observable& object) {
-        while (takePending())
-            block_(object, {{"new", (*read_)(keyPath_)}});
-    }
-
-    void changed(Observable& object) {
-        {
-            std::lock_guard lock(mutex_);
-            ++pending_;
-            if (std::exchange(calling_, true))
+    /// Between two calls the observer stands free for a moment: a thread that changes the value without pause
+    /// takes over then, and this one gets on.
+    void makeCalls(Observable& object, Read read) {
+        for (;;) {
+            makeCall(object, read);
+            if (letGo() != changed)
+                return;
+            std::this_thread::yield();
+            if (!take())
                 return;
         }
-        makeReservedCalls(object);
     }
 
     void end() {
-        std::lock_guard lock(mutex_);
-        ended_ = true;
+        if ((state_.fetch_or(ended) & (calling | ended)) == 0)
+            block_ = nullptr;
     }
 
 private:
-    bool takePending() {
-        std::lock_guard lock(mutex_);
-        if (ended_ || pending_ == 0) {
-            calling_ = false;
-            return false;
-        }
-        --pending_;
-        return true;
+    static constexpr std::uint8_t changed = 1; // since the last call began
+    static constexpr std::uint8_t calling = 2; // someone makes the calls; only they touch the block
+    static constexpr std::uint8_t ended = 4;
+
+    bool take() {
+        std::uint8_t free = changed;
+        return state_.compare_exchange_strong(free, changed | calling);
     }
 
-    const std::string keyPath_;
-    const std::shared_ptr<const Read> read_;
-    const Observable::Block block_;
-    std::mutex mutex_;
-    std::size_t pending_ = 0;
-    bool calling_ = false;
-    bool ended_ = false;
+    void makeCall(Observable& object, Read read) {
+        state_ &= static_cast<std::uint8_t>(~changed);
+        try {
+            block_(object, {{"new", read(object, keyPath_)}});
+        } catch (...) {
+            letGo(); // or no later change would be reported
+            throw;
+        }
+    }
+
+    /// What is marked now. What the block of an ended observation holds goes with its last call.
+    std::uint8_t letGo() {
+        const auto left = static_cast<std::uint8_t>(state_.fetch_and(changed | ended) & (changed | ended));
+        if ((left & ended) != 0)
+            block_ = nullptr;
+        return left;
+    }
+
+    const std::string_view keyPath_;
+    Observable::Block block_;
+    std::atomic<std::uint8_t> state_ = calling;
 };
 
 class ObserverList::Membership final : public Registration {
 public:
-    Membership(const std::shared_ptr<Observers>& observers, std::shared_ptr<Observer> observer)
-        : observers_(observers), observer_(std::move(observer)) {}
-
-    ~Membership() override {
-        observer_->end();
-        if (auto observers = observers_.lock())
-            observers->withLocked([this](auto& list) { std::erase(list, observer_); });
-    }
+    explicit Membership(std::shared_ptr<Observer> observer) : observer_(std::move(observer)) {}
+    ~Membership() override { observer_->end(); }
 
 private:
-    const std::weak_ptr<Observers> observers_;
     const std::shared_ptr<Observer> observer_;
 };
 
-ObserverList::ObserverList(Observable& object, Read read)
-    : object_(object),
-      read_(std::make_shared<const Read>(std::move(read))),
-      observers_(std::make_shared<Observers>()) {}
+ObserverList::~ObserverList() {
+    const auto observers = observers_.withLocked([](auto& list) { return std::move(list); });
+    for (const auto& observer : observers)
+        observer->end();
+}
 
 RegistrationHandle ObserverList::observe(std::string_view keyPath, Observable::Block block) {
-    auto observer = std::make_shared<Observer>(std::string(keyPath), read_, std::move(block));
-    observer->reserveInitialCall();
-    auto membership = std::make_unique<Membership>(observers_, observer);
-    observers_->withLocked([&](auto& list) { list.push_back(observer); });
-    observer->makeReservedCalls(object_);
+    auto observer = std::make_shared<Observer>(keyPath, std::move(block));
+    auto membership = std::make_unique<Membership>(observer);
+    observers_.withLocked([&](auto& list) {
+        std::erase_if(list, [](const auto& other) { return other->hasEnded(); });
+        list.push_back(observer);
+    });
+    observer->makeCalls(object_, read_);
     return membership;
 }
 
 void ObserverList::changed(std::string_view keyPath) {
-    auto observers = observers_->withLocked([&](const auto& list) {
+    const auto observers = observers_.withLocked([&](const auto& list) {
         std::vector<std::shared_ptr<Observer>> matching;
         for (const auto& observer : list)
             if (observer->keyPath() == keyPath)
@@ -100,7 +110,8 @@ void ObserverList::changed(std::string_view keyPath) {
         return matching;
     });
     for (const auto& observer : observers)
-        observer->changed(object_);
+        if (observer->markChanged())
+            observer->makeCalls(object_, read_);
 }
 
 } // namespace tarn

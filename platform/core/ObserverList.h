@@ -14,26 +14,28 @@ namespace tarn {
 class ObserverList {
 public:
     /// The value of a key path at the moment of the call; asserts that the object has the key path.
-    using Read = std::function<ObservedValue(std::string_view keyPath)>;
+    using Read = ObservedValue (*)(const Observable& object, std::string_view keyPath);
 
-    ObserverList(Observable& object, Read read);
+    ObserverList(Observable& object, Read read) : object_(object), read_(read) {}
+    ~ObserverList();
+    ObserverList(const ObserverList&) = delete;
+    ObserverList& operator=(const ObserverList&) = delete;
 
     /// What Observable::observe() promises.
     [[nodiscard]] RegistrationHandle observe(std::string_view keyPath, Observable::Block block);
 
-    /// The value of `keyPath` has changed: every observer is called once with the value that `read` then
-    /// gives. The call of an observer that is busy on another thread, or further out on this one, is left to
-    /// that one.
+    /// The value of `keyPath` has changed: every observer is called with the value that `read` then gives.
+    /// The call of an observer that is busy on another thread, or further out on this one, is left to that
+    /// one; several of these become one.
     void changed(std::string_view keyPath);
 
 private:
     class Observer;
     class Membership;
-    using Observers = MutexProtected<std::vector<std::shared_ptr<Observer>>>;
 
     Observable& object_;
-    const std::shared_ptr<const Read> read_;
-    const std::shared_ptr<Observers> observers_;
+    const Read read_;
+    MutexProtected<std::vector<std::shared_ptr<Observer>>> observers_;
 };
 
 } // namespace tarn

@@ -18,6 +18,7 @@ public:
         return observers_.observe(keyPath, std::move(block));
     }
 
+    std::int64_t value() const { return value_; }
     void setValue(std::int64_t value) {
         value_ = value;
         observers_.changed("value");
@@ -25,7 +26,9 @@ public:
 
 private:
     std::atomic<std::int64_t> value_ = 0;
-    ObserverList observers_{*this, [this](std::string_view) { return ObservedValue(value_.load()); }};
+    ObserverList observers_{*this, [](const Observable& self, std::string_view) {
+                                return ObservedValue(static_cast<const Subject&>(self).value_.load());
+                            }};
 };
 
 std::int64_t newValue(const ChangeDescription& change) { return std::get<std::int64_t>(change.at("new")); }
@@ -109,6 +112,33 @@ TEST(ObservationTest, TheLastReportIsTheLastValueHoweverRegistrationAndChangesMe
         ASSERT_EQ(last, value);
         ASSERT_LE(calls, 5);
     }
+}
+
+TEST(ObservationTest, AThreadThatChangesTheValueWithoutPauseDoesNotHoldUpARegistration) {
+    constexpr int forEver = 100'000;
+    Subject subject;
+    std::atomic<bool> stop = false;
+    std::jthread changing([&] {
+        for (std::int64_t value = 1; !stop; ++value)
+            subject.setValue(value);
+        subject.setValue(-1);
+    });
+    std::int64_t last = 0;
+    int callsHere = 0;
+    auto registration = subject.observe(
+        "value", [&, here = std::this_thread::get_id()](Observable&, const ChangeDescription& report) {
+            last = newValue(report);
+            if (std::this_thread::get_id() != here)
+                return;
+            if (++callsHere == forEver)
+                stop = true;
+            while (!stop && subject.value() == last)
+                std::this_thread::yield(); // so that there is always one more to report
+        });
+    stop = true;
+    changing.join();
+    EXPECT_LT(callsHere, forEver);
+    EXPECT_EQ(last, -1);
 }
 
 TEST(NotificationTest, ReachesTheHandlersOfThatNameAndSenderInOrder) {

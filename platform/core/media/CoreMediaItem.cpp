@@ -15,7 +15,9 @@ namespace tarn {
 CoreMediaItem::CoreMediaItem(PlayerEnvironment& environment, std::shared_ptr<MediaAsset> asset)
     : environment_(environment),
       asset_(std::move(asset)),
-      observers_(*this, [this](std::string_view keyPath) { return read(keyPath); }) {}
+      observers_(*this, [](const Observable& object, std::string_view keyPath) {
+          return static_cast<const CoreMediaItem&>(object).read(keyPath);
+      }) {}
 
 RegistrationHandle CoreMediaItem::observe(std::string_view keyPath, Block block) {
     return observers_.observe(keyPath, std::move(block));

@@ -39,7 +39,9 @@ std::shared_ptr<CoreQueuePlayer> CoreQueuePlayer::create(PlayerEnvironment& envi
 CoreQueuePlayer::CoreQueuePlayer(PlayerEnvironment& environment)
     : environment_(environment),
       playback_(std::make_shared<Playback>(environment)),
-      observers_(*this, [this](std::string_view keyPath) { return read(keyPath); }) {}
+      observers_(*this, [](const Observable& object, std::string_view keyPath) {
+          return static_cast<const CoreQueuePlayer&>(object).read(keyPath);
+      }) {}
 
 CoreQueuePlayer::~CoreQueuePlayer() { playback_->close(); }
 
