@@ -6,9 +6,9 @@
 
 namespace tarn {
 
-MediaMetadataItem::MediaMetadataItem(std::string key, std::string keySpace,
+MediaMetadataItem::MediaMetadataItem(std::string_view key, std::string_view keySpace,
                                      std::optional<std::string> stringValue)
-    : key_(std::move(key)), keySpace_(std::move(keySpace)), stringValue_(std::move(stringValue)) {}
+    : key_(key), keySpace_(keySpace), stringValue_(std::move(stringValue)) {}
 
 std::vector<MediaMetadataItem>
 MediaMetadataItem::metadataItemsFromArray(const std::vector<MediaMetadataItem>& items, std::string_view key,

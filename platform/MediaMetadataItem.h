@@ -15,11 +15,13 @@ public:
     static constexpr std::string_view commonKeyAlbumName = "albumName";
     static constexpr std::string_view commonKeyArtist = "artist";
 
-    /// `stringValue` is none when the tag's value is not text; text is valid UTF-8.
-    MediaMetadataItem(std::string key, std::string keySpace, std::optional<std::string> stringValue);
+    /// `key` and `keySpace` are names that outlive the item, as those above do: thousands of items share
+    /// them. `stringValue` is none when the tag's value is not text; text is valid UTF-8.
+    MediaMetadataItem(std::string_view key, std::string_view keySpace,
+                      std::optional<std::string> stringValue);
 
-    const std::string& key() const { return key_; }
-    const std::string& keySpace() const { return keySpace_; }
+    std::string_view key() const { return key_; }
+    std::string_view keySpace() const { return keySpace_; }
     const std::optional<std::string>& stringValue() const { return stringValue_; }
 
     /// The items with that key in that key space, in their order.
@@ -28,8 +30,8 @@ public:
                                                                  std::string_view keySpace);
 
 private:
-    std::string key_;
-    std::string keySpace_;
+    std::string_view key_;
+    std::string_view keySpace_;
     std::optional<std::string> stringValue_;
 };
 

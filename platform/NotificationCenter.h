@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 #include <functional>
 #include <initializer_list>
@@ -26,8 +27,10 @@ public:
 
     virtual ~NotificationCenter() = default;
 
-    /// `handler` runs on the posting thread, for notifications of these names from that sender only. The
-    /// names are literals, or outlive the registration otherwise.
+    static constexpr std::size_t mostNames = 3;
+
+    /// `handler` runs on the posting thread, for notifications of these names, at most three, from that sender
+    /// only. The names are literals, or outlive the registration otherwise.
     [[nodiscard]] virtual RegistrationHandle addObserver(std::initializer_list<std::string_view> names,
                                                          const void* sender, Handler handler) = 0;
 

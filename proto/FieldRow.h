@@ -11,8 +11,8 @@
 #include <vector>
 
 #include "platform/Data.h"
+#include "platform/core/Boxed.h"
 #include "platform/core/ProtoCodable.h"
-#include "proto/Boxed.h"
 #include "proto/TextList.h"
 
 namespace tarn {

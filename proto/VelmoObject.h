@@ -7,7 +7,7 @@
 #include <string_view>
 
 #include "platform/Data.h"
-#include "proto/Boxed.h"
+#include "platform/core/Boxed.h"
 #include "proto/Message.h"
 
 namespace tarn {

@@ -5,7 +5,7 @@
 
 namespace tarn {
 
-/// A std::optional that costs one pointer while it holds nothing, for a message that may come by the hundred
+/// A std::optional that costs one pointer while it holds nothing, for what may come by the hundred
 /// thousand. Reads as an optional; copies its value.
 template <class Value>
 class Boxed {

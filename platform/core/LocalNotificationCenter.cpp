@@ -1,18 +1,23 @@
 #include "platform/core/LocalNotificationCenter.h"
 
 #include <algorithm>
+#include <array>
 #include <atomic>
+#include <cassert>
 #include <utility>
+#include <vector>
 
 namespace tarn {
 
 class LocalNotificationCenter::Observer {
 public:
-    Observer(std::initializer_list<std::string_view> names, Handler handler)
-        : names_(names), handler_(std::move(handler)) {}
+    Observer(std::initializer_list<std::string_view> names, Handler handler) : handler_(std::move(handler)) {
+        assert(names.size() <= names_.size());
+        std::copy(names.begin(), names.end(), names_.begin());
+    }
 
     bool hears(std::string_view name) const {
-        return std::find(names_.begin(), names_.end(), name) != names_.end();
+        return !name.empty() && std::find(names_.begin(), names_.end(), name) != names_.end();
     }
 
     void deliver(const Notification& notification) {
@@ -23,7 +28,7 @@ public:
     void end() { ended_ = true; }
 
 private:
-    const std::vector<std::string_view> names_;
+    std::array<std::string_view, mostNames> names_; // empty behind those that there are
     const Handler handler_;
     std::atomic<bool> ended_ = false;
 };
@@ -37,18 +42,14 @@ public:
     ~Membership() override {
         observer_->end();
         if (auto observers = observers_.lock())
-            observers->withLocked([this](auto& map) { removeFrom(map); });
+            observers->withLocked([this](auto& map) {
+                const auto [first, last] = map.equal_range(sender_);
+                map.erase(std::find_if(first, last,
+                                       [this](const auto& entry) { return entry.second == observer_; }));
+            });
     }
 
 private:
-    template <class Map>
-    void removeFrom(Map& map) {
-        auto place = map.find(sender_);
-        std::erase(place->second, observer_);
-        if (place->second.empty())
-            map.erase(place);
-    }
-
     const std::weak_ptr<Observers> observers_;
     const void* const sender_;
     const std::shared_ptr<Observer> observer_;
@@ -59,18 +60,21 @@ LocalNotificationCenter::LocalNotificationCenter() : observers_(std::make_shared
 RegistrationHandle LocalNotificationCenter::addObserver(std::initializer_list<std::string_view> names,
                                                         const void* sender, Handler handler) {
     auto observer = std::make_shared<Observer>(names, std::move(handler));
-    observers_->withLocked([&](auto& map) { map[sender].push_back(observer); });
+    observers_->withLocked([&](auto& map) { map.emplace(sender, observer); });
     return std::make_unique<Membership>(observers_, sender, std::move(observer));
 }
 
 void LocalNotificationCenter::post(const Notification& notification) {
-    auto observers = observers_->withLocked([&](const auto& map) {
-        auto place = map.find(notification.sender);
-        return place == map.end() ? std::vector<std::shared_ptr<Observer>>{} : place->second;
+    const auto observers = observers_->withLocked([&](const auto& map) {
+        std::vector<std::shared_ptr<Observer>> hearing;
+        const auto [first, last] = map.equal_range(notification.sender);
+        for (auto entry = first; entry != last; ++entry)
+            if (entry->second->hears(notification.name))
+                hearing.push_back(entry->second);
+        return hearing;
     });
     for (const auto& observer : observers)
-        if (observer->hears(notification.name))
-            observer->deliver(notification);
+        observer->deliver(notification);
 }
 
 } // namespace tarn

@@ -2,7 +2,6 @@
 
 #include <map>
 #include <memory>
-#include <vector>
 
 #include "platform/NotificationCenter.h"
 #include "platform/core/MutexProtected.h"
@@ -23,7 +22,7 @@ private:
     class Observer;
     class Membership;
     /// By sender, in order of registration.
-    using Observers = MutexProtected<std::map<const void*, std::vector<std::shared_ptr<Observer>>>>;
+    using Observers = MutexProtected<std::multimap<const void*, std::shared_ptr<Observer>>>;
 
     const std::shared_ptr<Observers> observers_;
 };

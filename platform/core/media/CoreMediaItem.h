@@ -3,6 +3,7 @@
 #include <chrono>
 
 #include "platform/MediaItem.h"
+#include "platform/core/Boxed.h"
 #include "platform/core/LiveObjects.h"
 #include "platform/core/ObserverList.h"
 #include "platform/core/media/PlayerEnvironment.h"
@@ -28,7 +29,7 @@ public:
 
     struct State {
         MediaStatus status = MediaStatus::unknown;
-        std::optional<Error> error;
+        Boxed<Error> error;                   // most items never fail
         PlayQueue* driver = nullptr;          ///< the queue that it entered last, while it stands in it
         std::chrono::nanoseconds position{0}; ///< where playing goes on; up to date while no queue drives it
         bool playedToEnd = false;             ///< so it begins anew when it enters a queue again

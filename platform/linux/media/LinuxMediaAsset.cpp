@@ -8,8 +8,7 @@ LinuxMediaAsset::LinuxMediaAsset(std::string URL, SharedFile file, AudioFileInfo
     : URL_(std::move(URL)), file_(std::move(file)), info_(std::move(info)) {
     const auto keep = [this](std::string_view key, std::optional<std::string>& text) {
         if (text)
-            metadata_.emplace_back(std::string(key), std::string(MediaMetadataItem::commonKeySpace),
-                                   std::exchange(text, std::nullopt));
+            metadata_.emplace_back(key, MediaMetadataItem::commonKeySpace, std::exchange(text, std::nullopt));
     };
     keep(MediaMetadataItem::commonKeyTitle, info_.title);
     keep(MediaMetadataItem::commonKeyAlbumName, info_.album);

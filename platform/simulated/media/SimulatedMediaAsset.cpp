@@ -11,7 +11,7 @@ SimulatedMediaAsset::SimulatedMediaAsset(std::string URL, std::shared_ptr<const 
     metadata_.reserve(3);
     auto add = [this](std::string_view key, const std::optional<std::string>& text) {
         if (text)
-            metadata_.emplace_back(std::string(key), std::string(MediaMetadataItem::commonKeySpace), text);
+            metadata_.emplace_back(key, MediaMetadataItem::commonKeySpace, text);
     };
     add(MediaMetadataItem::commonKeyTitle, script_->title);
     add(MediaMetadataItem::commonKeyAlbumName, script_->albumTitle);
