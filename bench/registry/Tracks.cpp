@@ -53,6 +53,8 @@ Tracks::Tracks(std::size_t count)
     for (const auto& name : names_)
         mirror(*name);
     bytesPerTrack_ = static_cast<double>(heapInUse() - before) / static_cast<double>(count);
+    for (std::size_t track = 0; track < count; ++track)
+        addToBareMaps(track);
 }
 
 void Tracks::mirror(const std::string& name) {
@@ -61,6 +63,15 @@ void Tracks::mirror(const std::string& name) {
     items_->upsertItemWithIdentifier(name, asset, Reply());
     assetObjects_.push_back(asset.get());
     itemObjects_.push_back(items_->playerItemWithIdentifier(name).get());
+}
+
+void Tracks::addToBareMaps(std::size_t track) {
+    auto object = std::make_shared<int>();
+    bareMaps_.objectOfName.withLocked([&](auto& map) { map.emplace(*names_[track], object); });
+    bareMaps_.objectOfAddress.withLocked([&](auto& map) { map.emplace(assetObjects_[track], object); });
+    bareMaps_.nameOfAddress.withLocked([&](auto& map) { map.emplace(itemObjects_[track], *names_[track]); });
+    // As far apart as the objects of the tracks are.
+    bareMaps_.distance.push_back(std::make_unique<char[]>(static_cast<std::size_t>(bytesPerTrack_)));
 }
 
 } // namespace tarn

@@ -4,10 +4,12 @@
 #include <memory>
 #include <optional>
 #include <string>
+#include <unordered_map>
 #include <vector>
 
 #include "assets/AssetManager.h"
 #include "assets/PlayerItemManager.h"
+#include "platform/core/MutexProtected.h"
 #include "platform/simulated/SimulatedPlatform.h"
 
 namespace tarn {
@@ -26,6 +28,16 @@ public:
     const VLTorviAudioFilePlayerAssetManager& assets() const { return *assets_; }
     const VLTorviAudioFilePlayerItemManager& items() const { return *items_; }
 
+    /// The same keys in maps of the standard library, each under a lock as any thread may ask, as far apart
+    /// in memory as the tracks are.
+    struct BareMaps {
+        MutexProtected<std::unordered_map<std::string, std::shared_ptr<int>>> objectOfName;
+        MutexProtected<std::unordered_map<const void*, std::shared_ptr<int>>> objectOfAddress;
+        MutexProtected<std::unordered_map<const void*, std::string>> nameOfAddress;
+        std::vector<std::unique_ptr<char[]>> distance; // between their entries
+    };
+    const BareMaps& bareMaps() const { return bareMaps_; }
+
     /// What the managers and all that they keep take of the heap, for each track.
     double bytesPerTrack() const { return bytesPerTrack_; }
 
@@ -33,6 +45,7 @@ private:
     class Sink;
 
     void mirror(const std::string& name);
+    void addToBareMaps(std::size_t track);
 
     SimulatedPlatform device_{1};
     std::shared_ptr<Sink> sink_;
@@ -41,6 +54,7 @@ private:
     std::vector<std::optional<std::string>> names_;
     std::vector<const MediaAsset*> assetObjects_;
     std::vector<const MediaItem*> itemObjects_;
+    BareMaps bareMaps_;
     double bytesPerTrack_ = 0;
 };
 
