@@ -39,8 +39,8 @@ public:
     /// Where the strings tables of the error domain are.
     virtual std::string errorBundlePath() const = 0;
 
-    /// Null when there is no bundle at the path.
-    virtual std::unique_ptr<Bundle> openBundle(const std::string& path) const = 0;
+    /// Null when there is no bundle at the path. The bundle is used no longer than this object lives.
+    virtual std::shared_ptr<const Bundle> openBundle(const std::string& path) const = 0;
 
     virtual bool fileExists(const std::string& path) const = 0;
 

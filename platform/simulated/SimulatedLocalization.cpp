@@ -2,6 +2,7 @@
 
 #include <utility>
 
+#include "platform/core/localization/BundleText.h"
 #include "platform/core/localization/LanguageChoice.h"
 
 namespace tarn {
@@ -30,13 +31,7 @@ public:
 
     std::string localizedString(const std::string& key, const std::string& defaultValue,
                                 const std::string& table) const override {
-        auto languages = localization_.preferredLocalizations(languages_, localization_.preferredLanguages());
-        languages.emplace_back("en");
-        for (const std::string& language : languages)
-            if (const auto strings = localization_.readStringsFile(tablePath(path_, language, table)))
-                if (const auto entry = strings->find(key); entry != strings->end())
-                    return entry->second;
-        return defaultValue.empty() ? key : defaultValue;
+        return textOfBundle(*this, localization_, key, defaultValue, table);
     }
 
 private:
@@ -56,10 +51,10 @@ void SimulatedLocalization::setTable(const std::string& bundlePath, const std::s
 
 void SimulatedLocalization::addFile(const std::string& path) { files_[path]; }
 
-std::unique_ptr<Bundle> SimulatedLocalization::openBundle(const std::string& path) const {
+std::shared_ptr<const Bundle> SimulatedLocalization::openBundle(const std::string& path) const {
     const auto bundle = bundles_.find(path);
     return bundle == bundles_.end() ? nullptr
-                                    : std::make_unique<SimulatedBundle>(*this, path, bundle->second);
+                                    : std::make_shared<const SimulatedBundle>(*this, path, bundle->second);
 }
 
 bool SimulatedLocalization::fileExists(const std::string& path) const { return files_.contains(path); }

@@ -29,7 +29,7 @@ public:
 
     std::vector<std::string> preferredLanguages() const override { return preferredLanguages_; }
     std::string errorBundlePath() const override { return errorBundlePath_; }
-    std::unique_ptr<Bundle> openBundle(const std::string& path) const override;
+    std::shared_ptr<const Bundle> openBundle(const std::string& path) const override;
     bool fileExists(const std::string& path) const override;
     std::optional<Bundle::Strings> readStringsFile(const std::string& path) const override;
     std::vector<std::string>

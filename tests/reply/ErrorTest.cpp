@@ -92,9 +92,9 @@ TEST_F(ALocalizedString, IsTheKeyWithALineInTheLogWithoutABundle) {
 TEST(TheErrorBundle, DescribesEveryCodeInEveryLanguage) {
     const CapturedLog log;
     const std::string path = TARN_RESOURCES "/errors.bundle";
-    const auto languages = DirectoryLocalization("", {}).openBundle(path)->localizations();
-    ASSERT_THAT(languages, ElementsAre("de", "en", "es", "fr", "it", "ja", "ko", "pt", "zh-Hans"));
     const DirectoryLocalization english(path, {"en"});
+    const auto languages = english.openBundle(path)->localizations();
+    ASSERT_THAT(languages, ElementsAre("de", "en", "es", "fr", "it", "ja", "ko", "pt", "zh-Hans"));
     for (const std::string& language : languages) {
         const DirectoryLocalization localization(path, {language});
         for (std::int64_t code = 0; code < 28; ++code) {
@@ -116,6 +116,16 @@ TEST(ABundleOnDisk, SurvivesBrokenTables) {
         const DirectoryLocalization localization(folder.path(), {language});
         EXPECT_EQ(vlUtils_localizedStringForSystemLanguage(localization, "key", folder.path()), "English")
             << language;
+    }
+}
+
+TEST(ABundleOnDisk, IsLookedUpOnce) {
+    const TemporaryFolder folder;
+    folder.write("en.lproj/Localizable.strings", "\"key\" = \"English\";");
+    const DirectoryLocalization localization(folder.path(), {"de"});
+    for (int time = 0; time < 2; ++time) {
+        EXPECT_EQ(vlUtils_localizedStringForSystemLanguage(localization, "key", folder.path()), "English");
+        folder.write("de.lproj/Localizable.strings", "\"key\" = \"Deutsch\";");
     }
 }
 

@@ -5,7 +5,7 @@
 #include <utility>
 
 #include "platform/core/RegularFile.h"
-#include "platform/core/localization/LanguageChoice.h"
+#include "platform/core/localization/BundleText.h"
 #include "platform/core/localization/StringsFile.h"
 
 namespace tarn {
@@ -15,24 +15,23 @@ namespace {
 namespace fs = std::filesystem;
 
 constexpr const char* languageFolderSuffix = ".lproj";
-constexpr const char* developmentLanguage = "en";
 constexpr std::size_t sizeLimit = 1 << 20;
 
-} // namespace
-
-DirectoryBundle::DirectoryBundle(fs::path path, std::vector<std::string> preferredLanguages)
-    : path_(std::move(path)), preferredLanguages_(std::move(preferredLanguages)) {}
-
-std::vector<std::string> DirectoryBundle::localizations() const {
+std::vector<std::string> languagesIn(const fs::path& bundle) {
     std::vector<std::string> names;
     std::error_code error;
-    fs::directory_iterator entry(path_, error);
+    fs::directory_iterator entry(bundle, error);
     for (; !error && entry != fs::directory_iterator(); entry.increment(error))
         if (entry->path().extension() == languageFolderSuffix)
             names.push_back(entry->path().stem());
     std::ranges::sort(names);
     return names;
 }
+
+} // namespace
+
+DirectoryBundle::DirectoryBundle(fs::path path, const Localization& localization)
+    : path_(std::move(path)), localization_(localization), localizations_(languagesIn(path_)) {}
 
 std::optional<std::string> DirectoryBundle::pathForResource(const std::string& name, const std::string& type,
                                                             const std::string& localization) const {
@@ -43,17 +42,7 @@ std::optional<std::string> DirectoryBundle::pathForResource(const std::string& n
 
 std::string DirectoryBundle::localizedString(const std::string& key, const std::string& defaultValue,
                                              const std::string& table) const {
-    auto languages = choosePreferredLocalizations(localizations(), preferredLanguages_);
-    languages.emplace_back(developmentLanguage);
-    for (const std::string& language : languages) {
-        const auto path = pathForResource(table, "strings", language);
-        const auto strings = path ? readStringsFileAt(*path) : std::nullopt;
-        if (!strings)
-            continue;
-        if (const auto entry = strings->find(key); entry != strings->end())
-            return entry->second;
-    }
-    return defaultValue.empty() ? key : defaultValue;
+    return textOfBundle(*this, localization_, key, defaultValue, table);
 }
 
 std::optional<Bundle::Strings> readStringsFileAt(const fs::path& path) {

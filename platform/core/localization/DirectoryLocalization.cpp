@@ -28,16 +28,30 @@ std::string environmentVariable(const char* name) {
     return value ? value : "";
 }
 
+template <class Value>
+std::optional<Value> known(const MutexProtected<std::map<std::string, Value>>& values,
+                           const std::string& path) {
+    return values.withLocked([&](const auto& map) {
+        const auto entry = map.find(path);
+        return entry == map.end() ? std::nullopt : std::optional(entry->second);
+    });
+}
+
 } // namespace
 
 DirectoryLocalization::DirectoryLocalization(std::string errorBundlePath,
                                              std::vector<std::string> preferredLanguages)
     : errorBundlePath_(std::move(errorBundlePath)), preferredLanguages_(std::move(preferredLanguages)) {}
 
-std::unique_ptr<Bundle> DirectoryLocalization::openBundle(const std::string& path) const {
+std::shared_ptr<const Bundle> DirectoryLocalization::openBundle(const std::string& path) const {
+    if (auto open = known(openBundles_, path))
+        return *open;
     std::error_code error;
-    return fs::is_directory(path, error) ? std::make_unique<DirectoryBundle>(path, preferredLanguages_)
-                                         : nullptr;
+    if (!fs::is_directory(path, error))
+        return nullptr;
+    const auto bundle = std::make_shared<const DirectoryBundle>(path, *this);
+    openBundles_.withLocked([&](auto& bundles) { bundles.insert_or_assign(path, bundle); });
+    return bundle;
 }
 
 bool DirectoryLocalization::fileExists(const std::string& path) const {
@@ -46,12 +60,8 @@ bool DirectoryLocalization::fileExists(const std::string& path) const {
 }
 
 std::optional<Bundle::Strings> DirectoryLocalization::readStringsFile(const std::string& path) const {
-    auto known = readFiles_.withLocked([&](const auto& files) {
-        const auto file = files.find(path);
-        return file == files.end() ? std::nullopt : std::optional(file->second);
-    });
-    if (known)
-        return known;
+    if (auto file = known(readFiles_, path))
+        return file;
     auto strings = readStringsFileAt(path);
     if (strings)
         readFiles_.withLocked([&](auto& files) { files.insert_or_assign(path, *strings); });

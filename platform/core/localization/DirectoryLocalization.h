@@ -5,14 +5,15 @@
 
 namespace tarn {
 
-/// Localization from folders of the file system. A strings file that could be read once is not read again.
+/// Localization from folders of the file system. A bundle that was found once is not looked up again, nor is
+/// a strings file that could be read: one text of an error must not cost two dozen system calls.
 class DirectoryLocalization final : public Localization {
 public:
     DirectoryLocalization(std::string errorBundlePath, std::vector<std::string> preferredLanguages);
 
     std::vector<std::string> preferredLanguages() const override { return preferredLanguages_; }
     std::string errorBundlePath() const override { return errorBundlePath_; }
-    std::unique_ptr<Bundle> openBundle(const std::string& path) const override;
+    std::shared_ptr<const Bundle> openBundle(const std::string& path) const override;
     bool fileExists(const std::string& path) const override;
     std::optional<Bundle::Strings> readStringsFile(const std::string& path) const override;
     std::vector<std::string>
@@ -22,6 +23,7 @@ public:
 private:
     const std::string errorBundlePath_;
     const std::vector<std::string> preferredLanguages_;
+    mutable MutexProtected<std::map<std::string, std::shared_ptr<const Bundle>>> openBundles_;
     mutable MutexProtected<std::map<std::string, Bundle::Strings>> readFiles_;
 };
 
