@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 
 #include "platform/MediaItem.h"
+#include "platform/MediaQueuePlayer.h"
 #include "platform/core/PropertyList.h"
 #include "proto/Envelope.h"
 #include "proto/ErrorUserInfo.h"
@@ -98,19 +99,50 @@ private:
     std::shared_ptr<MediaAsset> asset_;
 };
 
-auto statusOf(MediaStatus status, std::optional<Error> error) {
-    return VLProtoAudioFilePlayerStatus::statusMessageFromPlayerItem(FixedItem(status, std::move(error)),
-                                                                     "a");
+/// The same, and has no queue.
+class FixedPlayer final : public MediaQueuePlayer {
+public:
+    FixedPlayer(MediaStatus status, std::optional<Error> error) : status_(status), error_(std::move(error)) {}
+
+    RegistrationHandle observe(std::string_view, Block) override { return nullptr; }
+    MediaStatus status() const override { return status_; }
+    std::optional<Error> error() const override { return error_; }
+    float rate() const override { return 0; }
+    void setRate(float) override {}
+    void pause() override {}
+    void play() override {}
+    std::shared_ptr<MediaItem> currentItem() const override { return nullptr; }
+    MediaTime currentTime() const override { return MediaTime::zero(); }
+    void advanceToNextItem() override {}
+    void insertItem(std::shared_ptr<MediaItem>, const std::shared_ptr<MediaItem>&) override {}
+    void removeItem(const std::shared_ptr<MediaItem>&) override {}
+    void removeAllItems() override {}
+    void replaceCurrentItem(std::shared_ptr<MediaItem>) override {}
+    void setAudioSession(AudioSession&) override {}
+    AudioSession* audioSession() const override { return nullptr; }
+
+private:
+    MediaStatus status_;
+    std::optional<Error> error_;
+};
+
+/// Of an item; that of a queue player in the same state is the same.
+auto statusOf(MediaStatus status, const std::optional<Error>& error,
+              const std::optional<std::string>& identifier = "a") {
+    const auto ofItem =
+        VLProtoAudioFilePlayerStatus::statusMessageFromPlayerItem(FixedItem(status, error), identifier);
+    const auto ofPlayer =
+        VLProtoAudioFilePlayerStatus::statusMessageFromPlayer(FixedPlayer(status, error), identifier);
+    EXPECT_TRUE(ofItem->isEqual(*ofPlayer));
+    return ofItem;
 }
 
-TEST(StatusMessage, OfAReadyItemHasNoError) {
+TEST(StatusMessage, OfWhatIsReadyHasNoError) {
     EXPECT_EQ(statusOf(MediaStatus::readyToPlay, std::nullopt)->serialize(), bytesFromHex("0A 01 61 10 01"));
-    const auto unnamed = VLProtoAudioFilePlayerStatus::statusMessageFromPlayerItem(
-        FixedItem(MediaStatus::unknown, std::nullopt), std::nullopt);
-    EXPECT_EQ(unnamed->serialize(), bytesFromHex("10 00"));
+    EXPECT_EQ(statusOf(MediaStatus::unknown, std::nullopt, std::nullopt)->serialize(), bytesFromHex("10 00"));
 }
 
-TEST(StatusMessage, OfAFailedItemCarriesTheTextsForAPersonAndNothingElse) {
+TEST(StatusMessage, OfWhatFailedCarriesTheTextsForAPersonAndNothingElse) {
     const Error error{
         "d",
         -1,
@@ -133,7 +165,7 @@ TEST(StatusMessage, LosesOnlyTheTextsThatCannotBeSerialized) {
     const auto message = statusOf(MediaStatus::failed, Error{"d", 7, {{localizedDescriptionKey, "\xFF"}}});
     EXPECT_EQ(message->errorCode(), 7);
     EXPECT_FALSE(message->hasErrorDict());
-    ASSERT_EQ(log.errors().size(), 1U);
+    ASSERT_EQ(log.errors().size(), 2U) << "of the item and of the player";
     EXPECT_TRUE(log.errors().front().starts_with(
         "_VLMakeDataFromErrorUserInfo:61: Error serializing audio file player "
         "item status error: "))
