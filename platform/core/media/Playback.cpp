@@ -62,11 +62,14 @@ void Playback::run() {
     if (!openPlace(0))
         return scheduleLocking();
     bool more = false;
-    if (prepareOutput()) {
+    if (!prepareOutput()) {
+        stopOutput();
+    } else if (!sounding_ && output_->writeIndex() > output_->heardFrame()) {
+        startOutput(); // what is there sounds before more is rendered
+        more = true;
+    } else {
         more = renderPiece();
         startOutput();
-    } else {
-        stopOutput();
     }
     setTimer();
     if (more || !openPlace(1))
@@ -218,13 +221,13 @@ void Playback::append(const PlayQueue::Head& head, RenderedSpan span) {
 }
 
 void Playback::startOutput() {
+    if (!std::exchange(sounding_, true))
+        output_->start();
     if (auto place = places()[0]; place.item && std::exchange(described_, place.entry) != place.entry) {
         const MediaAsset& asset = *place.item->asset();
         output_->setDescription(firstText(asset, MediaMetadataItem::commonKeyTitle),
                                 firstText(asset, MediaMetadataItem::commonKeyArtist));
     }
-    if (!std::exchange(sounding_, true))
-        output_->start();
 }
 
 void Playback::stopOutput() {
