@@ -41,6 +41,7 @@ private:
 #else
     static constexpr std::size_t capacity = 32;
 #endif
+    static constexpr bool isInUse = capacity > 0;
     static constexpr std::size_t batch = capacity / 2;
     static constexpr std::size_t depotCapacity = 8 * batch;
     static constexpr std::size_t closed = capacity + 1;
@@ -66,7 +67,7 @@ private:
 
     /// Fills an empty cache; false when it is closed or there is nothing to be had.
     static bool fetch() noexcept {
-        if (own.count != 0 || depot.count == 0)
+        if (!isInUse || own.count != 0 || depot.count == 0)
             return false;
         std::lock_guard lock(depot.mutex);
         own.count = std::min(batch, depot.count.load());
@@ -77,7 +78,7 @@ private:
 
     /// Makes room in a full cache; false when it is closed or the depot is full.
     static bool leave() noexcept {
-        if (own.count == closed || depot.count == depotCapacity)
+        if (!isInUse || own.count == closed || depot.count == depotCapacity)
             return false;
         std::lock_guard lock(depot.mutex);
         const std::size_t count = std::min(batch, depotCapacity - depot.count);
