@@ -162,7 +162,7 @@ private:
     }
 
     std::filesystem::path makeTrack() const {
-        writeWav(folder_ / "track.wav", makeSweep(180 * 44'100, 44'100, 2));
+        writeWav(folder_ / "track.wav", makeSweep(std::size_t{180} * 44'100, 44'100, 2));
         return folder_ / "track.wav";
     }
 

@@ -45,6 +45,7 @@ TEST(Clients, EveryCommandSentAheadOfAReplacementEndsOnce) {
     ServiceUnderTest service;
     Client first(service.options());
     std::vector<std::future<client::Completion>> ends;
+    ends.reserve(commands);
     for (int i = 0; i < commands; ++i)
         ends.push_back(first.destroyAsset("none"));
     Client second(service.options());
