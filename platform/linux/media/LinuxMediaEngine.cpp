@@ -11,4 +11,11 @@ LinuxMediaEngine::LinuxMediaEngine(NotificationCenter& notifications, FileAccess
 
 LinuxMediaEngine::~LinuxMediaEngine() { LinuxMediaParts::loop.stop(); }
 
+MediaAssetOutcome LinuxMediaEngine::openAsset(const std::string& URL) {
+    MediaAssetOutcome outcome = opener_.open(URL);
+    if (outcome.asset)
+        outcome.asset = heap_.counted(std::move(outcome.asset));
+    return outcome;
+}
+
 } // namespace tarn

@@ -3,6 +3,7 @@
 #include "platform/core/media/CoreMediaEngine.h"
 #include "platform/linux/FileAccess.h"
 #include "platform/linux/media/AssetOpener.h"
+#include "platform/linux/media/IdleHeap.h"
 #include "platform/linux/media/LinuxAudioSession.h"
 #include "platform/linux/media/LinuxRendering.h"
 #include "platform/linux/media/SystemOutput.h"
@@ -28,10 +29,11 @@ public:
     /// Silences what still plays.
     ~LinuxMediaEngine() override;
 
-    MediaAssetOutcome openAsset(const std::string& URL) override { return opener_.open(URL); }
+    MediaAssetOutcome openAsset(const std::string& URL) override;
 
 private:
     const AssetOpener opener_;
+    IdleHeap heap_{LinuxMediaParts::loop};
 };
 
 } // namespace tarn
