@@ -14,7 +14,7 @@ class RemoteRendering final : public Rendering {
 public:
     struct Options {
         std::chrono::nanoseconds limit{std::chrono::seconds(10)};
-        std::optional<std::chrono::nanoseconds> length{};        ///< of the media, when it is known
+        std::optional<std::chrono::nanoseconds> length{}; ///< of the media, when it is known
     };
 
     /// `open` runs on the rendering's thread and owns what it needs. `goesOn` is called as the factory's
