@@ -6,8 +6,11 @@ std::string textsOf(const Error& error) {
     std::string text;
     for (const char* key : {localizedDescriptionKey, localizedFailureReasonKey}) {
         auto entry = error.userInfo.find(key);
-        if (entry != error.userInfo.end())
-            text += (text.empty() ? "" : " ") + entry->second;
+        if (entry == error.userInfo.end())
+            continue;
+        if (!text.empty())
+            text += ' ';
+        text += entry->second;
     }
     return text;
 }
