@@ -162,7 +162,8 @@ void merge(std::shared_ptr<Embedded>& value, const std::shared_ptr<Embedded>& ot
 
 template <std::derived_from<ProtoCodable> Embedded>
 void merge(WireList<std::shared_ptr<Embedded>>& value, const WireList<std::shared_ptr<Embedded>>& other) {
-    const auto added = *other; // the two may be one list
+    // The two may be one list. NOLINTNEXTLINE(performance-unnecessary-copy-initialization)
+    const auto added = *other;
     if (!value)
         value.emplace();
     value->insert(value->end(), added.begin(), added.end());

@@ -13,7 +13,8 @@ TextList::TextList(const std::vector<std::string>& texts) {
 }
 
 void TextList::append(const TextList& other) {
-    const TextList added = other; // the two may be one list
+    // The two may be one list. NOLINTNEXTLINE(performance-unnecessary-copy-initialization)
+    const TextList added = other;
     for (std::size_t index = 0; index < added.size(); ++index)
         push_back(added.at(index));
 }

@@ -11,7 +11,7 @@ namespace {
 constexpr int secondsPerMinute = 60;
 constexpr int secondsPerHour = 3'600;
 
-std::string twoDigits(long number) { return (number < 10 ? "0" : "") + std::to_string(number); }
+std::string twoDigits(long number) { return std::string(number < 10 ? 1 : 0, '0') + std::to_string(number); }
 
 } // namespace
 
@@ -21,7 +21,7 @@ std::string timeText(double seconds) {
     const long whole = std::lround(std::floor(std::fabs(seconds)));
     const long hours = whole / secondsPerHour;
     const long minutes = whole % secondsPerHour / secondsPerMinute;
-    const auto rest = ":" + twoDigits(whole % secondsPerMinute);
+    const auto rest = std::string(1, ':') + twoDigits(whole % secondsPerMinute);
     const std::string sign = seconds <= -1 ? "-" : "";
     return sign + (hours > 0 ? std::to_string(hours) + ":" + twoDigits(minutes) : std::to_string(minutes)) +
            rest;

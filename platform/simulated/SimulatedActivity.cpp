@@ -26,7 +26,7 @@ namespace tarn {
 
 /// Where a stack lies and where it was left. The sanitizers have to be told whenever the stack changes.
 struct SimulatedActivity::Stack {
-    static constexpr std::size_t ownSize = 256 * 1024;
+    static constexpr std::size_t ownSize = std::size_t{256} * 1024;
 
     std::unique_ptr<std::byte[]> memory; // none for the caller's
     ucontext_t context{};
@@ -87,6 +87,7 @@ void SimulatedActivity::switchTo(SimulatedActivity& next) {
 
 void SimulatedActivity::begin(unsigned high, unsigned low) {
     auto address = static_cast<std::uintptr_t>(high) << 32 | low;
+    // NOLINTNEXTLINE(performance-no-int-to-ptr): makecontext passes integers only
     auto& activity = *reinterpret_cast<SimulatedActivity*>(address);
     activity.stack_->afterEntering();
     activity.run();

@@ -66,7 +66,7 @@ std::shared_ptr<SimulatedQueue> SimulatedScheduler::createQueue(std::string labe
     return std::make_shared<SimulatedQueue>(*this, std::move(label));
 }
 
-RegistrationHandle SimulatedScheduler::at(Time time, std::shared_ptr<SimulatedQueue> queue,
+RegistrationHandle SimulatedScheduler::at(Time time, const std::shared_ptr<SimulatedQueue>& queue,
                                           std::function<void()> work) {
     auto wanted = std::make_shared<TimedWork>(std::move(work));
     auto timer = addTimer(time, [this, lane = queue->lane_, weak = std::weak_ptr(wanted)] {

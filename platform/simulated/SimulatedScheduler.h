@@ -45,7 +45,7 @@ public:
 
     /// Submits `work` to `queue` when it is `time`; not any more once the registration is gone, and then
     /// `work` does not run even if it was submitted.
-    [[nodiscard]] RegistrationHandle at(Time time, std::shared_ptr<SimulatedQueue> queue,
+    [[nodiscard]] RegistrationHandle at(Time time, const std::shared_ptr<SimulatedQueue>& queue,
                                         std::function<void()> work);
 
     Time now() const { return now_; }

@@ -24,7 +24,7 @@ class ConnectionSocket final : public Burst::Deferred, public std::enable_shared
 public:
     static constexpr std::size_t mostQueuedBytes = 1'048'576;
     static constexpr std::uint32_t mostUnfinishedCalls = 1'024;
-    static constexpr std::size_t mostUnfinishedBytes = 4 * 1'048'576;
+    static constexpr std::size_t mostUnfinishedBytes = std::size_t{4} * 1'048'576;
 
     /// The poller outlives close().
     ConnectionSocket(FileDescriptor socket, Poller& poller, std::uint64_t key);

@@ -24,7 +24,7 @@ public:
     static constexpr std::size_t mostConnections = 64;
 
     /// Parts of frames that all clients together may leave unfinished; who goes beyond is cut off.
-    static constexpr std::size_t mostUnfinishedBytes = 16 * 1'048'576;
+    static constexpr std::size_t mostUnfinishedBytes = std::size_t{16} * 1'048'576;
 
     /// The token table outlives the listener. Throws std::system_error.
     SocketListener(FileDescriptor listeningSocket, TokenTable& tokens);

@@ -197,13 +197,12 @@ std::unique_ptr<RemoteRendering> RemoteRendering::create(PlayerLoop& loop,
     const auto worker = std::make_shared<Worker>(loop, goesOn);
     if (!startDetached([worker, open = std::move(open)] { worker->run(open); }))
         return nullptr;
-    return std::unique_ptr<RemoteRendering>(
-        new RemoteRendering(loop, worker, std::move(goesOn), std::move(options)));
+    return std::unique_ptr<RemoteRendering>(new RemoteRendering(loop, worker, std::move(goesOn), options));
 }
 
 RemoteRendering::RemoteRendering(PlayerLoop& loop, std::shared_ptr<Worker> worker,
                                  std::function<void()> goesOn, Options options)
-    : loop_(loop), goesOn_(std::move(goesOn)), options_(std::move(options)), worker_(std::move(worker)) {}
+    : loop_(loop), goesOn_(std::move(goesOn)), options_(options), worker_(std::move(worker)) {}
 
 RemoteRendering::~RemoteRendering() { worker_->close(); }
 

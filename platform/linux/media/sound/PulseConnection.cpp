@@ -36,8 +36,9 @@ struct PulseConnection::FormatQuery {
             query.format = formatOf(sink->sample_spec);
         if (end == 0)
             return;
+        const auto* const place = &query;
         const FormatQuery answer = std::move(query);
-        answer.connection.queries_.remove_if([&](const FormatQuery& other) { return &other == &query; });
+        answer.connection.queries_.remove_if([place](const FormatQuery& other) { return &other == place; });
         answer.done(answer.format);
     }
 };
