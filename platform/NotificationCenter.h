@@ -29,8 +29,8 @@ public:
 
     static constexpr std::size_t mostNames = 3;
 
-    /// `handler` runs on the posting thread, for notifications of these names, at most three, from that sender
-    /// only. The names are literals, or outlive the registration otherwise.
+    /// `handler` runs on the posting thread, for notifications of these names, at most three, from that
+    /// sender only. The names are literals, or outlive the registration otherwise.
     [[nodiscard]] virtual RegistrationHandle addObserver(std::initializer_list<std::string_view> names,
                                                          const void* sender, Handler handler) = 0;
 
