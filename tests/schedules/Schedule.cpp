@@ -3,19 +3,11 @@
 #include <chrono>
 #include <utility>
 
-#include "proto/VelmoMessage.h"
-
 namespace tarn {
 
 namespace {
 
 using namespace std::chrono_literals;
-
-Data envelopeOf(const commands::Command& command) {
-    VLProtoVelmoMessage envelope;
-    envelope.setAudioFilePlayerMessage(command);
-    return envelope.serialize();
-}
 
 } // namespace
 
@@ -89,9 +81,9 @@ void Schedule::command() {
     commands::Command command = mix_.next();
     std::size_t before = client->deliveries().size();
     if (random(8) == 0)
-        client->send(envelopeOf(command));
+        client->send(commands::encoded(command));
     else
-        checks.sent(client->call(envelopeOf(command)), command, before);
+        checks.sent(client->call(commands::encoded(command)), command, before);
 }
 
 void Schedule::passTime() {

@@ -8,9 +8,9 @@
 #include "assets/PlayerItemManager.h"
 #include "queueplayer/QueuePlayerManager.h"
 #include "service/AudioFilePlayerServer.h"
-#include "tests/service/Commands.h"
 #include "tests/service/World.h"
 #include "tests/support/CapturedLog.h"
+#include "tests/support/ClientCommands.h"
 
 namespace tarn {
 namespace {
@@ -63,9 +63,9 @@ TEST_F(RouterTest, AManagerMadeAfterTheServiceIsGoneHasNone) {
 TEST_F(RouterTest, OnlyTheFirstPartOfAMessageIsServed) {
     CapturedLog log;
     auto message = std::make_shared<VLProtoAudioFilePlayerMessage>(); // all three parts
-    for (const auto& envelope : {commands::upsertAsset("a", "file:///none"), commands::getCurrentTime("a"),
-                                 commands::appendItem("a", "a")})
-        message->mergeFrom(*VLProtoVelmoMessage::fromData(envelope)->audioFilePlayerMessage());
+    for (const auto& part : {commands::upsertAsset({.identifier = "a", .URL = "file:///none"}),
+                             commands::getCurrentTime("a"), commands::appendItem("a", "a")})
+        message->mergeFrom(*part);
     router_->handleMessage(message, std::make_shared<Reply>());
     platform_.scheduler.runReady();
     EXPECT_THAT(log.errors(), testing::ElementsAre(testing::HasSubstr("QueuePlayerManager")));

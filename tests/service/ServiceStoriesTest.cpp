@@ -7,10 +7,11 @@
 #include <string>
 
 #include "platform/core/LiveObjects.h"
+#include "proto/VelmoMessage.h"
 #include "service/AudioFilePlayerServer.h"
-#include "tests/service/Commands.h"
 #include "tests/service/World.h"
 #include "tests/support/CapturedLog.h"
+#include "tests/support/ClientCommands.h"
 
 namespace tarn {
 namespace {
@@ -19,6 +20,13 @@ using testing::AnyOf;
 using testing::Each;
 using testing::ElementsAre;
 using testing::IsEmpty;
+
+/// Not for this service; never answered.
+Data nothingButAPlist() {
+    VLProtoVelmoMessage envelope;
+    envelope.setPlist(std::make_shared<VLProtoVelmoPlist>());
+    return envelope.serialize();
+}
 
 /// The stories of a connection, each in many interleavings on the scheduler and some on real threads. After
 /// each, nothing of it is left.
@@ -75,12 +83,13 @@ TYPED_TEST(ServiceStory, EveryCallEndsOnceAndInOrderPerManager) {
     this->inEveryWorld([this](auto& world) {
         SimulatedClient client(world.listeners());
         for (int round = 0; round < 2; ++round) {
-            client.call(commands::getCurrentTime("unknown"));
-            client.call(commands::appendItem("unknown", "unknown"));
-            client.call(commands::upsertAsset("asset", "file:///none"));
-            client.call(commands::destroyAsset("asset"));
-            client.call(commands::nothingButAPlist());
-            client.send(commands::getCurrentTime("unknown"));
+            client.call(commands::encoded(commands::getCurrentTime("unknown")));
+            client.call(commands::encoded(commands::appendItem("unknown", "unknown")));
+            client.call(
+                commands::encoded(commands::upsertAsset({.identifier = "asset", .URL = "file:///none"})));
+            client.call(commands::encoded(commands::destroyAsset("asset")));
+            client.call(nothingButAPlist());
+            client.send(commands::encoded(commands::getCurrentTime("unknown")));
             world.linger();
         }
         world.settle();
@@ -104,13 +113,13 @@ TYPED_TEST(ServiceStory, ANewClientReplacesTheOldOneWhichIsLeftOpen) {
     this->inEveryWorld([this](auto& world) {
         SimulatedClient first(world.listeners());
         for (int i = 0; i < 4; ++i)
-            first.call(commands::getCurrentTime("unknown"));
+            first.call(commands::encoded(commands::getCurrentTime("unknown")));
         world.linger();
         SimulatedClient second(world.listeners());
         for (int i = 0; i < 4; ++i)
-            second.call(commands::getCurrentTime("unknown"));
+            second.call(commands::encoded(commands::getCurrentTime("unknown")));
         world.settle();
-        first.call(commands::getCurrentTime("unknown"));
+        first.call(commands::encoded(commands::getCurrentTime("unknown")));
         world.settle();
         // Nothing is lost, and nothing of the one reaches the other.
         EXPECT_THAT(this->outcomes(first, 5), Each(AnyOf("error 26", "error 25")));
@@ -125,16 +134,16 @@ TYPED_TEST(ServiceStory, ANewClientReplacesTheOldOneWhichIsLeftOpen) {
 TYPED_TEST(ServiceStory, CommandsThatWaitWhenTheirClientIsReplacedAreCancelled) {
     this->inEveryWorld([this](auto& world) {
         SimulatedClient first(world.listeners());
-        first.call(commands::getCurrentTime("unknown"));
+        first.call(commands::encoded(commands::getCurrentTime("unknown")));
         world.settle();
         auto gate = world.clock().makeSignal();
         world.service().commandServiceQueue()->async(
             [gate] { EXPECT_TRUE(gate->wait(std::chrono::seconds(60))); });
         for (int i = 0; i < 3; ++i)
-            first.call(commands::getCurrentTime("unknown"));
+            first.call(commands::encoded(commands::getCurrentTime("unknown")));
         world.settleIntake();
         SimulatedClient second(world.listeners());
-        second.call(commands::getCurrentTime("unknown"));
+        second.call(commands::encoded(commands::getCurrentTime("unknown")));
         while (world.service()._connectionIsValid())
             world.progress();
         gate->signal();
@@ -148,18 +157,18 @@ TYPED_TEST(ServiceStory, ALateAnswerGoesToTheConnectionThatItsCallCameFrom) {
     this->inEveryWorld([this](auto& world) {
         auto& service = world.service();
         SimulatedClient first(world.listeners());
-        first.call(commands::getCurrentTime("unknown"));
+        first.call(commands::encoded(commands::getCurrentTime("unknown")));
         world.settle();
         std::shared_ptr<SerialQueue> items;
         service.commandServiceQueue()->sync(
             [&] { items = service.audioFilePlayerServer()->playerItemManagerQueue(); });
         auto gate = world.clock().makeSignal();
         items->async([gate] { EXPECT_TRUE(gate->wait(std::chrono::seconds(60))); });
-        first.call(commands::getCurrentTime("unknown"));
+        first.call(commands::encoded(commands::getCurrentTime("unknown")));
         world.settleIntake();
         service.commandServiceQueue()->sync([] {});
         SimulatedClient second(world.listeners());
-        second.call(commands::getCurrentTime("unknown"));
+        second.call(commands::encoded(commands::getCurrentTime("unknown")));
         while (second.outcome(1).empty())
             world.progress(); // the replacement does not wait for the manager
         EXPECT_EQ(first.outcome(2), "");
@@ -174,11 +183,11 @@ TYPED_TEST(ServiceStory, AClientThatIsBackAtOnceIsServed) {
     this->inEveryWorld([this](auto& world) {
         for (int round = 0; round < 3; ++round) {
             SimulatedClient ghost(world.listeners());
-            ghost.call(commands::getCurrentTime("unknown"));
+            ghost.call(commands::encoded(commands::getCurrentTime("unknown")));
             world.linger();
             ghost.hangUp();
             SimulatedClient back(world.listeners());
-            back.call(commands::getCurrentTime("unknown"));
+            back.call(commands::encoded(commands::getCurrentTime("unknown")));
             world.settle();
             EXPECT_EQ(back.outcome(1), "error 26");
         }
@@ -194,7 +203,7 @@ TYPED_TEST(ServiceStory, ALossAtAnyStepLeavesNothingBehindAndTheNextClientIsServ
             if (auto step = static_cast<int>(world.random(6)); step > 0)
                 client.connection().loseAtStep(step, loss);
             for (int i = 0; i < 4; ++i)
-                client.call(commands::getCurrentTime("unknown"));
+                client.call(commands::encoded(commands::getCurrentTime("unknown")));
             world.linger();
             world.nowPlaying().setParentApplication(NowPlayingService::Origin::local, "application");
             client.connection().lose(loss);
@@ -202,7 +211,7 @@ TYPED_TEST(ServiceStory, ALossAtAnyStepLeavesNothingBehindAndTheNextClientIsServ
             EXPECT_EQ(this->stateOf(world), this->idle);
         }
         SimulatedClient next(world.listeners());
-        next.call(commands::getCurrentTime("unknown"));
+        next.call(commands::encoded(commands::getCurrentTime("unknown")));
         world.settle();
         EXPECT_EQ(next.outcome(1), "error 26");
     });
@@ -212,14 +221,14 @@ TYPED_TEST(ServiceStory, TheLossOfAReplacedConnectionTearsDownTheCurrentOne) {
     this->inEveryWorld([this](auto& world) {
         SimulatedClient first(world.listeners());
         SimulatedClient second(world.listeners());
-        second.call(commands::getCurrentTime("unknown"));
+        second.call(commands::encoded(commands::getCurrentTime("unknown")));
         world.settle();
         world.nowPlaying().setParentApplication(NowPlayingService::Origin::local, "application");
         first.breakOff();
         world.settle();
         EXPECT_EQ(this->stateOf(world), this->idle);
         EXPECT_EQ(world.nowPlaying().parentApplication(), std::nullopt);
-        second.call(commands::getCurrentTime("unknown"));
+        second.call(commands::encoded(commands::getCurrentTime("unknown")));
         world.settle();
         EXPECT_THAT(this->outcomes(second, 2), ElementsAre("error 26", "error 25"));
     });
@@ -230,7 +239,7 @@ TYPED_TEST(ServiceStory, DataThatIsNoEnvelopeCostsOneLineAndIsLetGo) {
         CapturedLog log;
         SimulatedClient client(world.listeners());
         client.call(Data{0x12, 0x05, 0x00});
-        client.call(commands::getCurrentTime("unknown"));
+        client.call(commands::encoded(commands::getCurrentTime("unknown")));
         world.settle();
         EXPECT_THAT(this->outcomes(client, 2), ElementsAre("released", "error 26"));
         auto line = testing::MatchesRegex(
@@ -289,15 +298,15 @@ private:
 TYPED_TEST(ServiceStory, AnExceptionWhileRoutingAnswersItsCommandOnly) {
     this->inEveryWorld([this](auto& world) {
         SimulatedClient client(world.listeners());
-        client.call(commands::getCurrentTime("unknown"));
+        client.call(commands::encoded(commands::getCurrentTime("unknown")));
         world.settle();
         auto& service = world.service();
         service.commandServiceQueue()->sync([&] {
             service.audioFilePlayerServer()->setQueuePlayerManagerQueue(std::make_shared<FullQueue>());
         });
-        client.call(commands::appendItem("unknown", "unknown"));
-        client.send(commands::appendItem("unknown", "unknown"));
-        client.call(commands::getCurrentTime("unknown"));
+        client.call(commands::encoded(commands::appendItem("unknown", "unknown")));
+        client.send(commands::encoded(commands::appendItem("unknown", "unknown")));
+        client.call(commands::encoded(commands::getCurrentTime("unknown")));
         world.settle();
         EXPECT_THAT(this->outcomes(client, 3), ElementsAre("error 26", "error 24", "error 26"));
         for (const auto& delivery : client.deliveries()) {

@@ -1,5 +1,7 @@
 #include "tests/support/ClientCommands.h"
 
+#include "proto/VelmoMessage.h"
+
 namespace tarn::commands {
 
 namespace {
@@ -116,6 +118,12 @@ Command removeItem(const Identifier& identifier, const Identifier& item) {
 
 Command removeAllItems(const Identifier& identifier) {
     return player(&Player::setRemoveAllItems, object(identifier));
+}
+
+Data encoded(const Command& command) {
+    VLProtoVelmoMessage envelope;
+    envelope.setAudioFilePlayerMessage(command);
+    return envelope.serialize();
 }
 
 } // namespace tarn::commands

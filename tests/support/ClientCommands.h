@@ -5,6 +5,7 @@
 #include <string>
 #include <vector>
 
+#include "platform/Data.h"
 #include "proto/AudioFilePlayerMessage.h"
 
 /// The commands that a client can send, as the router takes them. An absent identifier is one that the client
@@ -40,5 +41,8 @@ Command advanceToNextItem(const Identifier& identifier);
 Command appendItem(const Identifier& identifier, const Identifier& item);
 Command removeItem(const Identifier& identifier, const Identifier& item);
 Command removeAllItems(const Identifier& identifier);
+
+/// In its envelope, as it goes over the wire.
+Data encoded(const Command& command);
 
 } // namespace tarn::commands
