@@ -7,6 +7,7 @@
 #include <array>
 #include <cstring>
 
+#include "platform/linux/FileDescriptor.h"
 #include "platform/linux/log/JournalSink.h"
 #include "platform/linux/log/StandardErrorSink.h"
 #include "tests/support/TemporaryFolder.h"
@@ -156,6 +157,18 @@ TEST_P(AStandardErrorSink, LosesWholeLinesRatherThanWaitForItsReader) {
     EXPECT_THAT(channel.readAll(),
                 AllOf(StartsWith("<3>"), HasSubstr(std::to_string(lost) + " lines are missing"),
                       EndsWith("\n" + line)));
+}
+
+TEST(AStandardErrorSinkOnATerminal, WritesNoPriority) {
+    const FileDescriptor terminal(posix_openpt(O_RDWR | O_NOCTTY | O_CLOEXEC));
+    ASSERT_EQ(grantpt(terminal.get()), 0);
+    ASSERT_EQ(unlockpt(terminal.get()), 0);
+    const FileDescriptor side(open(ptsname(terminal.get()), O_RDWR | O_NOCTTY | O_CLOEXEC));
+    StandardErrorSink sink(side.get());
+    sink.write(failure);
+    std::array<char, 256> text{};
+    ASSERT_GT(read(terminal.get(), text.data(), text.size() - 1), 0);
+    EXPECT_STREQ(text.data(), "-[Player play]:7: broken\r\n");
 }
 
 INSTANTIATE_TEST_SUITE_P(PipesAndSockets, AStandardErrorSink, testing::Bool());

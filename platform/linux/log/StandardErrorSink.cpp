@@ -31,8 +31,11 @@ ssize_t writeWithoutWaiting(int descriptor, const std::string& line) {
 
 } // namespace
 
+StandardErrorSink::StandardErrorSink(int descriptor)
+    : descriptor_(descriptor), isTerminal_(isatty(descriptor) == 1) {}
+
 bool StandardErrorSink::take(const LogRecord& record) {
-    const std::string line = standardErrorLine(record);
+    const std::string line = isTerminal_ ? std::string(record.message) + '\n' : standardErrorLine(record);
     return writeWithoutWaiting(descriptor_, line) == static_cast<ssize_t>(line.size());
 }
 
