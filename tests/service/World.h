@@ -18,7 +18,12 @@ namespace tarn {
 /// The service on the scheduler: a seed is one interleaving.
 class SimulatedWorld {
 public:
+#ifdef __SANITIZE_THREAD__
+    static constexpr int rounds =
+        50; // one thread at a time: the other world is what the thread sanitizer looks at
+#else
     static constexpr int rounds = 1050; // of each of the ten stories
+#endif
 
     explicit SimulatedWorld(std::uint64_t seed);
     ~SimulatedWorld();
