@@ -87,6 +87,7 @@ void Recorder::run() {
             std::lock_guard lock(mutex_);
             samples_.insert(samples_.end(), piece.begin(), piece.end());
         }
+        grown_.notify_all();
         started_ = true;
         started_.notify_one();
     }
@@ -101,11 +102,15 @@ std::vector<std::int16_t> Recorder::samples() const {
     return samples_;
 }
 
+std::size_t Recorder::frames() const {
+    std::lock_guard lock(mutex_);
+    return samples_.size() / 2;
+}
+
 void Recorder::waitFrames(std::size_t frames) const {
-    const std::size_t target = this->frames() + frames;
-    const auto limit = std::chrono::steady_clock::now() + std::chrono::seconds(20);
-    while (this->frames() < target && std::chrono::steady_clock::now() < limit)
-        std::this_thread::yield();
+    std::unique_lock lock(mutex_);
+    const std::size_t target = samples_.size() + 2 * frames;
+    grown_.wait_for(lock, std::chrono::seconds(20), [&] { return samples_.size() >= target; });
 }
 
 } // namespace tarn

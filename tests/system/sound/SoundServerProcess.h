@@ -1,6 +1,7 @@
 #pragma once
 
 #include <atomic>
+#include <condition_variable>
 #include <memory>
 #include <mutex>
 #include <string>
@@ -43,7 +44,7 @@ public:
     /// All samples until now.
     std::vector<std::int16_t> samples() const;
 
-    std::size_t frames() const { return samples().size() / 2; }
+    std::size_t frames() const;
 
     /// Waits until so many more frames have been recorded.
     void waitFrames(std::size_t frames) const;
@@ -53,6 +54,7 @@ private:
 
     std::atomic<bool> ending_{false};
     mutable std::mutex mutex_;
+    mutable std::condition_variable grown_;
     std::vector<std::int16_t> samples_;
     std::atomic<bool> started_{false};
     std::thread thread_;
