@@ -86,9 +86,6 @@ class Mpd(Player):
     def pause(self):
         self.ask("pause 1")
 
-    def wait_for_end(self):
-        self.ask("idle player")
-
     def positions(self, count: int):
         self.socket.sendall(b"status\n" * count)
         while count > 0:
@@ -124,10 +121,6 @@ class Mpv(Player):
 
     def rate(self, rate: float):
         self.ask("set_property", "speed", rate)
-
-    def wait_for_end(self):
-        while b'"end-file"' not in self.line():
-            pass
 
     def positions(self, count: int):
         self.socket.sendall(b'{"command":["get_property","time-pos"]}\n' * count)
