@@ -16,6 +16,7 @@ public:
     Work() = default;
     Work(std::nullptr_t) {}
 
+    // NOLINTBEGIN(bugprone-forwarding-reference-overload): the check does not see that it is constrained
     template <class Callable>
     requires(!std::same_as<std::remove_cvref_t<Callable>, Work> &&
              std::invocable<std::remove_cvref_t<Callable>&>) Work(Callable&& callable) {
@@ -27,6 +28,7 @@ public:
             *this = Work([held = std::make_unique<Held>(std::forward<Callable>(callable))] { (*held)(); });
         }
     }
+    // NOLINTEND(bugprone-forwarding-reference-overload)
 
     Work(Work&& other) noexcept { take(other); }
     Work& operator=(Work&& other) noexcept {
@@ -51,10 +53,12 @@ private:
         void (*destroy)(void* held) noexcept;
     };
 
+    // NOLINTBEGIN(misc-redundant-expression): it takes the size and the alignment for one
     template <class Held>
     static constexpr bool
         fitsInside = sizeof(Held) <= size &&
                      alignof(Held) <= alignof(std::max_align_t) && std::is_nothrow_move_constructible_v<Held>;
+    // NOLINTEND(misc-redundant-expression)
 
     template <class Held>
     static constexpr Operations operationsOf{[](void* held) { (*static_cast<Held*>(held))(); },
