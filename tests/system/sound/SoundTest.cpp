@@ -87,6 +87,7 @@ TEST_F(SoundTest, AnItemShorterThanTheDevicesBufferMovesAndEndsWhenItIsHeard) {
         const std::chrono::duration<double> length = std::chrono::steady_clock::now() - beginning;
         EXPECT_GT(length.count(), 0.49);
         EXPECT_LT(length.count(), 0.7);
+        registrations.clear(); // the next item may be where this one was
     }
 }
 
