@@ -146,8 +146,8 @@ int endingInChild(const Story& story, long failing, const std::vector<std::strin
 
 class AllocationFailureTest : public testing::TestWithParam<Story> {};
 
-// Routing answers with an error where it allocates at all, all other work ends the process: a half-made change
-// that goes on would be worse than a new start.
+// Routing answers with an error where it allocates at all, all other work ends the process: a half-made
+// change that goes on would be worse than a new start.
 TEST_P(AllocationFailureTest, IsAnsweredWithAnErrorOrEndsTheProcess) {
     SystemLog::setSink(std::make_shared<SilentLog>());
     play(GetParam(), -1); // what is made once for the process is made now
