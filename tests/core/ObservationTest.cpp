@@ -3,6 +3,7 @@
 
 #include <atomic>
 #include <barrier>
+#include <new>
 #include <thread>
 
 #include "platform/core/LocalNotificationCenter.h"
@@ -79,6 +80,19 @@ TEST(ObservationTest, TheBlockMayEndItsOwnRegistrationOrOutliveItsObject) {
     auto orphan = subject->observe("value", [](Observable&, const ChangeDescription&) {});
     subject.reset();
     orphan.reset();
+}
+
+TEST(ObservationTest, ABlockThatThrowsHearsOfTheNextChange) {
+    Subject subject;
+    std::int64_t last = 0;
+    auto registration = subject.observe("value", [&](Observable&, const ChangeDescription& change) {
+        if (newValue(change) == 1)
+            throw std::bad_alloc();
+        last = newValue(change);
+    });
+    EXPECT_THROW(subject.setValue(1), std::bad_alloc);
+    subject.setValue(2);
+    EXPECT_EQ(last, 2);
 }
 
 // A stale value reported last would stay with the client for ever.

@@ -124,6 +124,9 @@ TEST(List, IsReplacedByCopyToUnlessEmptyAndAppendedByMerge) {
     target.mergeFrom(target);
     EXPECT_EQ(target.playerItemIdentifiersCount(), 2U);
     EXPECT_THROW(target.playerItemIdentifiersAtIndex(2), std::out_of_range);
+    target.clearPlayerItemIdentifiers();
+    target.addPlayerItemIdentifiers("c");
+    EXPECT_EQ(*target.playerItemIdentifiers(), TextList{"c"});
 }
 
 TEST(FloatingPoint, ComparesAsNumbersDo) {
