@@ -1,6 +1,7 @@
 #include "tests/service/World.h"
 
 #include "platform/MediaEngine.h"
+#include "platform/core/LiveObjects.h"
 #include "service/AudioFilePlayerServer.h"
 
 namespace tarn {
@@ -78,10 +79,13 @@ void ThreadedWorld::settle() {
     settleIntake();
     std::shared_ptr<VLTorviAudioFilePlayerServer> router;
     service_->commandServiceQueue()->sync([&] { router = service_->audioFilePlayerServer(); });
-    if (router == nullptr)
-        return;
-    router->playerItemManagerQueue()->sync([] {});
-    router->queuePlayerManagerQueue()->sync([] {});
+    if (router != nullptr) {
+        router->playerItemManagerQueue()->sync([] {});
+        router->queuePlayerManagerQueue()->sync([] {});
+    }
+    // Commands keep their router: those of the clients before have run when no other router is left.
+    while (LiveObjects::counts()["router"] > (router != nullptr ? 1 : 0))
+        std::this_thread::yield();
 }
 
 } // namespace tarn
