@@ -1,5 +1,6 @@
 #pragma once
 
+#include <atomic>
 #include <memory>
 #include <string>
 #include <string_view>
@@ -93,6 +94,7 @@ private:
     void _updateTelecueSupportedCommandsForCurrentItem();
     void _updateTelecueForCurrentItem();
     void _updateTelecueNowPlayingInfoForCurrentItem();
+    void publishNowPlayingInfo();
     NowPlayingInfo nowPlayingInfo(const MediaItem& item) const;
 
     // Released from the last to the first: everything that calls in ends while what it reads is still held.
@@ -107,6 +109,7 @@ private:
     const std::shared_ptr<VLTorviAudioFilePlayerAssetManager> assetManager_;
     RegistrationHandle interruptions_;
     std::vector<RegistrationHandle> remoteCommandTargets_;
+    std::atomic<int> nowPlayingUpdates_{0}; // asked for and not made yet
     LiveObject<"queue player"> live_;
 };
 

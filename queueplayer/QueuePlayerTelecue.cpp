@@ -57,7 +57,17 @@ void VLTorviAudioFileQueuePlayer::_updateTelecueForCurrentItem() {
     _updateTelecueNowPlayingInfoForCurrentItem();
 }
 
+/// Rate and item may change on two threads at once. Who comes in between leaves the publication to the one
+/// that is at it, so that what is published last is never out of date.
 void VLTorviAudioFileQueuePlayer::_updateTelecueNowPlayingInfoForCurrentItem() {
+    if (nowPlayingUpdates_++ > 0)
+        return;
+    do
+        publishNowPlayingInfo();
+    while (--nowPlayingUpdates_ > 0);
+}
+
+void VLTorviAudioFileQueuePlayer::publishNowPlayingInfo() {
     auto item = queuePlayer_->currentItem();
     NowPlayingInfo info = item ? nowPlayingInfo(*item) : NowPlayingInfo{};
 

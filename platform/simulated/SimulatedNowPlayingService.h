@@ -1,7 +1,9 @@
 #pragma once
 
+#include <functional>
 #include <optional>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "platform/NowPlayingService.h"
@@ -18,6 +20,8 @@ public:
     };
 
     void setParentApplication(Origin, const std::optional<std::string>& applicationIdentifier) override {
+        if (auto act = std::exchange(act_, nullptr))
+            act();
         parentApplication_ = applicationIdentifier;
     }
 
@@ -31,7 +35,11 @@ public:
     /// Forgets the publications so far.
     void clear() { publications_.clear(); }
 
+    /// Runs `act` once, in the middle of the next publication, as another thread may come in between.
+    void duringNextPublication(std::function<void()> act) { act_ = std::move(act); }
+
 private:
+    std::function<void()> act_; // null when nothing is to happen
     std::optional<std::string> parentApplication_;
     std::vector<Publication> publications_;
 };

@@ -1,5 +1,6 @@
 #include <gmock/gmock.h>
 
+#include "platform/MediaQueuePlayer.h"
 #include "tests/support/ClientStory.h"
 
 namespace tarn {
@@ -50,6 +51,18 @@ TEST_F(NowPlayingTest, IsPublishedTwiceWhenAPlayerIsMadeAndAtEveryChangeOfRateOr
     EXPECT_EQ(publications(), 5u);
     tell(destroyPlayer("x,y,ostrel.watch.music"));
     EXPECT_EQ(publications(), 5u);
+}
+
+TEST_F(NowPlayingTest, ShowsWhatHoldsWhenRateAndItemChangeAtOnce) {
+    tell(upsertAsset({.identifier = "b", .URL = "file:///plain.wav"}));
+    tell(upsertItem("j", "b"));
+    tell(upsertPlayer("p", {"i", "j"}));
+    auto before = publications();
+    device.nowPlaying.duringNextPublication(
+        [player = client->players->queuePlayerWithIdentifier("p")] { player->advanceToNextItem(); });
+    tell(setRate("p", 1));
+    EXPECT_EQ(shown(), info("plain.wav", 3, 0, 1));
+    EXPECT_EQ(publications(), before + 2);
 }
 
 TEST_F(NowPlayingTest, HasOnlyWhatTheRecordHas) {
