@@ -162,6 +162,26 @@ TEST(TwoPlayers, TheNewestOneDrivesTheItemsTheyShare) {
     EXPECT_EQ(test.reports(), "4.000: rate 2\n7.000: a played to its end\n7.000: current b\n");
 }
 
+TEST(TwoPlayers, TheOneBeforeDrivesWhatTheNewestLetsGo) {
+    Listening test;
+    auto a = test.item("a", 10s), b = test.item("b", 10s);
+    test.play({a, b});
+    auto oldest = test.player;
+    test.advance(4s);
+    test.play({a}, 0);
+    auto middle = test.player;
+    test.play({a}, 0);
+    middle.reset();
+    test.player.reset();
+    test.advance(1s);
+    EXPECT_EQ(a->currentTime().seconds(), 5.0);
+    test.reports();
+    a->seekToTime({9, 1});
+    test.advance(2s);
+    EXPECT_EQ(test.reports(), "5.000: a jumped\n6.000: a played to its end\n6.000: current b\n");
+    EXPECT_EQ(b->currentTime().seconds(), 1.0);
+}
+
 TEST(LastReference, SilencesThePlayerWhereverItIsDropped) {
     auto before = LiveObjects::counts();
     {

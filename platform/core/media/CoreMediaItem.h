@@ -15,7 +15,8 @@ class PlayQueue;
 /// An item of every engine: what it knows of itself, and which queue knows its position.
 ///
 /// A player may be replaced by another one that holds the same items. The queue that an item entered last
-/// drives it: it alone tells its position and reports how it ends.
+/// drives it: it alone tells its position and reports how it ends. When that one lets it go, the one before
+/// drives it again.
 class CoreMediaItem final : public MediaItem {
 public:
     CoreMediaItem(PlayerEnvironment& environment, std::shared_ptr<MediaAsset> asset);

@@ -29,7 +29,7 @@ bool PlayQueue::insert(std::shared_ptr<CoreMediaItem> item, const CoreMediaItem*
         return false;
     auto behind = byItem_.find(after);
     auto where = behind == byItem_.end() ? entries_.end() : std::next(behind->second);
-    auto entry = entries_.insert(where, Entry{++lastId_, std::move(item), {}, false});
+    auto entry = entries_.insert(where, Entry{++lastId_, std::move(item), {}, false, nullptr});
     byItem_.emplace(entry->item.get(), entry);
     enter(*entry);
     changed_();
@@ -41,15 +41,22 @@ void PlayQueue::enter(Entry& entry) {
     CoreMediaItem::State& state = entry.item->state();
     if (!std::exchange(state.playedToEnd, false))
         entry.position = state.driver ? state.driver->positionOf(*entry.item) : state.position;
-    state.driver = this;
+    entry.driverBefore = std::exchange(state.driver, this);
+}
+
+/// The item's position stays with it when no other queue holds it.
+void PlayQueue::leave(Entry& entry) {
+    CoreMediaItem::State& state = entry.item->state();
+    if (state.driver == this)
+        state.position = positionOf(*entry.item);
+    PlayQueue** driver = &state.driver;
+    while (*driver != this)
+        driver = &(*driver)->byItem_.at(entry.item.get())->driverBefore;
+    *driver = std::exchange(entry.driverBefore, nullptr);
 }
 
 PlayQueue::Entries PlayQueue::take(Entries::iterator entry) {
-    CoreMediaItem::State& state = entry->item->state();
-    if (state.driver == this) {
-        state.position = positionOf(*entry->item);
-        state.driver = nullptr;
-    }
+    leave(*entry);
     byItem_.erase(entry->item.get());
     Entries taken;
     taken.splice(taken.end(), entries_, entry);
@@ -204,7 +211,7 @@ PlayQueue::Ending PlayQueue::end(Entries::iterator entry, Timeline::End how,
     ending.driven = state.driver == this;
     ending.currentItemChanged = entry == entries_.begin();
     ending.left = take(entry);
-    state.playedToEnd = ending.driven && how == Timeline::End::completed;
+    state.playedToEnd = ending.driven && !state.driver && how == Timeline::End::completed;
     if (how == Timeline::End::failed && state.status != MediaStatus::failed) {
         state.status = MediaStatus::failed;
         state.error = error;

@@ -26,6 +26,7 @@ public:
         std::shared_ptr<CoreMediaItem> item;
         std::chrono::nanoseconds position; ///< where it begins, or goes on, when no span tells
         bool moved;                        ///< a seek that has not been rendered yet
+        PlayQueue* driverBefore;           ///< drives the item again when this queue lets it go, if any
     };
 
     /// Entries that have left the queue. To be destroyed after the mutex was let go.
@@ -106,6 +107,7 @@ private:
     Entries take(Entries::iterator entry);
     Ending end(Entries::iterator entry, Timeline::End how, const std::optional<Error>& error);
     void enter(Entry& entry);
+    void leave(Entry& entry);
     std::optional<Rewind> dropDiverged(std::int64_t firstReplaceable);
 
     const std::function<void()> changed_;
