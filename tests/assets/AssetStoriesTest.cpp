@@ -42,6 +42,34 @@ TEST_F(AssetStoriesTest, WhatTheClientGivesComesBeforeWhatTheFileTells) {
               "upsertWithMetaData: albumTitle=Album artist=Band duration=200 identifier=a\n");
 }
 
+TEST_F(AssetStoriesTest, TheFirstTagOfAKeyCountsAlsoWhenItHoldsNoText) {
+    using Tag = MediaMetadataItem;
+    device.media.addFile("file:///many.mp3",
+                         {.firstTags = {Tag(Tag::commonKeyTitle, "other", "First"),
+                                        Tag(Tag::commonKeyTitle, Tag::commonKeySpace, "Second"),
+                                        Tag(Tag::commonKeyAlbumName, Tag::commonKeySpace, std::nullopt)},
+                          .title = "Third",
+                          .albumTitle = "Album",
+                          .artist = "",
+                          .duration = 1s});
+    EXPECT_EQ(tell(upsertAsset({.identifier = "a", .URL = "file:///many.mp3"})),
+              "upsertWithMetaData: duration=1 identifier=a title=Second\n");
+
+    // The name of the file is for one that has no title at all.
+    device.media.addFile(
+        "file:///odd.mp3",
+        {.firstTags = {Tag(Tag::commonKeyTitle, Tag::commonKeySpace, std::nullopt)}, .duration = 1s});
+    EXPECT_EQ(tell(upsertAsset({.identifier = "a", .URL = "file:///odd.mp3"})),
+              "upsertWithMetaData: duration=1 identifier=a\n");
+}
+
+TEST_F(AssetStoriesTest, AnUpsertComesBeforeADestroyOfTheSameMessage) {
+    auto command = upsertAsset({.identifier = "a", .URL = "file:///tagged.flac"});
+    command->mergeFrom(*destroyAsset("a"));
+    EXPECT_EQ(tell(command), "destroy: albumTitle=Album artist=Band duration=200 identifier=a title=Song\n");
+    EXPECT_NE(client->assets->assetWithIdentifier("a"), nullptr);
+}
+
 TEST_F(AssetStoriesTest, AnUpsertWithAURLReplacesTheRecordWhole) {
     tell(upsertAsset({"a", "file:///tagged.flac", "Mine", "My album", "Me"}));
     auto before = client->assets->assetWithIdentifier("a");
@@ -62,6 +90,10 @@ TEST_F(AssetStoriesTest, AnUpdateWithoutAURLChangesOnlyWhatItGives) {
     EXPECT_EQ(record->title, "New");
     EXPECT_EQ(record->albumTitle, "Album");
     EXPECT_EQ(record->artist, "Band");
+    tell(upsertAsset({.identifier = "a", .artist = "Duo"}));
+    record = client->assets->vlAssetWithAsset(asset.get());
+    EXPECT_EQ(record->title, "New");
+    EXPECT_EQ(record->artist, "Duo");
 
     EXPECT_EQ(tell(upsertAsset({.identifier = "unknown", .title = "New"})), "upsertWithMetaData: nothing\n");
     EXPECT_EQ(client->assets->assetWithIdentifier("unknown"), nullptr);

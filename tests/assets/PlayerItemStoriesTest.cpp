@@ -76,6 +76,24 @@ TEST_F(PlayerItemStoriesTest, ADestroyedItemReportsNoMoreThoughItPlaysOn) {
     EXPECT_EQ(tell(destroyItem("a")), "destroy: no answer\n");
 }
 
+TEST_F(PlayerItemStoriesTest, OnlyTheFirstCommandOfAMessageIsServedInTheOrderOfTheTable) {
+    mirror({"i"});
+    tell(setCurrentTime("i", 2));
+    // A line is named after the alphabetically first command of its message.
+    auto query = getCurrentTime("i");
+    query->mergeFrom(*setCurrentTime("i", 1));
+    EXPECT_EQ(tell(query), "getCurrentTime: currentTime=2\n");
+    auto destroy = destroyItem("i");
+    destroy->mergeFrom(*query);
+    EXPECT_EQ(tell(destroy), "destroy: no answer\n");
+    EXPECT_EQ(client->items->playerItemWithIdentifier("i"), nullptr);
+    auto upsert = upsertItem("i", "i");
+    upsert->mergeFrom(*destroyItem("i"));
+    EXPECT_EQ(tell(upsert), "push playerItem.setStatus identifier=i status=0\n"
+                            "destroy: status=0\n");
+    EXPECT_NE(client->items->playerItemWithIdentifier("i"), nullptr);
+}
+
 TEST_F(PlayerItemStoriesTest, WhatOnlyTheServiceSendsIsIgnored) {
     song("a");
     tell(upsertItem("i", "a"));

@@ -6,6 +6,7 @@
 #include <vector>
 
 #include "platform/Error.h"
+#include "platform/MediaMetadataItem.h"
 
 namespace tarn {
 
@@ -16,6 +17,8 @@ struct MediaScript {
         std::chrono::nanoseconds duration;
     };
 
+    /// Tags that come before the next three; in a file anything may be a tag.
+    std::vector<MediaMetadataItem> firstTags{};
     std::optional<std::string> title{};
     std::optional<std::string> albumTitle{};
     std::optional<std::string> artist{};

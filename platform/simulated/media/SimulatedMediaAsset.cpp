@@ -8,7 +8,8 @@ namespace tarn {
 
 SimulatedMediaAsset::SimulatedMediaAsset(std::string URL, std::shared_ptr<const MediaScript> script)
     : URL_(std::move(URL)), script_(std::move(script)) {
-    metadata_.reserve(3);
+    metadata_.reserve(script_->firstTags.size() + 3);
+    metadata_ = script_->firstTags;
     auto add = [this](std::string_view key, const std::optional<std::string>& text) {
         if (text)
             metadata_.emplace_back(key, MediaMetadataItem::commonKeySpace, text);
