@@ -29,8 +29,10 @@ bool PlayQueue::insert(std::shared_ptr<CoreMediaItem> item, const CoreMediaItem*
         return false;
     auto behind = byItem_.find(after);
     auto where = behind == byItem_.end() ? entries_.end() : std::next(behind->second);
-    auto entry = entries_.insert(where, Entry{++lastId_, std::move(item), {}, false, nullptr});
+    Entries added; // so that it is in both places or, when memory runs out, in neither
+    auto entry = added.insert(added.end(), Entry{++lastId_, std::move(item), {}, false, nullptr});
     byItem_.emplace(entry->item.get(), entry);
+    entries_.splice(where, added);
     enter(*entry);
     changed_();
     return true;
