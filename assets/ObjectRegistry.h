@@ -6,6 +6,7 @@
 #include <string>
 #include <unordered_map>
 #include <utility>
+#include <vector>
 
 #include "platform/core/MutexProtected.h"
 
@@ -69,6 +70,16 @@ public:
             displaced = std::move(entry->second);
             maps.identifierToObjectMap.erase(entry);
         });
+    }
+
+    /// What was in it.
+    std::vector<std::shared_ptr<Object>> removeAllObjects() {
+        const Maps displaced = maps_.withLocked([](Maps& maps) { return std::exchange(maps, {}); });
+        std::vector<std::shared_ptr<Object>> objects;
+        objects.reserve(displaced.identifierToObjectMap.size());
+        for (const auto& [identifier, object] : displaced.identifierToObjectMap)
+            objects.push_back(object);
+        return objects;
     }
 
 private:

@@ -160,6 +160,15 @@ void VLTorviAudioFilePlayerQueuePlayerManager::destroyQueuePlayerWithIdentifier(
     identifierToObjectMap_.removeObject(identifier);
 }
 
+void VLTorviAudioFilePlayerQueuePlayerManager::destroyAllQueuePlayers() {
+    for (auto& player : identifierToObjectMap_.removeAllObjects()) {
+        const std::weak_ptr<VLTorviAudioFileQueuePlayer> held = player;
+        player.reset();
+        if (auto left = held.lock())
+            left->pause();
+    }
+}
+
 std::shared_ptr<MediaQueuePlayer> VLTorviAudioFilePlayerQueuePlayerManager::queuePlayerWithIdentifier(
     const std::optional<std::string>& identifier) const {
     auto wrapper = identifierToObjectMap_.objectWithIdentifier(identifier);

@@ -41,6 +41,10 @@ public:
 
     void destroyQueuePlayerWithIdentifier(const std::string& identifier);
 
+    /// Any thread: lets every queue player go at once, also from under commands that wait. What these or an
+    /// activation still hold is paused.
+    void destroyAllQueuePlayers();
+
     /// Null when there is none, or no identifier.
     std::shared_ptr<MediaQueuePlayer>
     queuePlayerWithIdentifier(const std::optional<std::string>& identifier) const;

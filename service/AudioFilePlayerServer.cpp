@@ -44,6 +44,12 @@ void VLTorviAudioFilePlayerServer::submit(SerialQueue& queue,
     });
 }
 
+void VLTorviAudioFilePlayerServer::destroyAllQueuePlayers() {
+    if (auto manager =
+            managers_.withLocked([](const Managers& managers) { return managers.queuePlayerManager; }))
+        manager->destroyAllQueuePlayers();
+}
+
 std::shared_ptr<VLTorviAudioFilePlayerAssetManager>
 VLTorviAudioFilePlayerServer::assetManagerCreateIfNeeded() {
     return createIfNeeded(&Managers::assetManager);

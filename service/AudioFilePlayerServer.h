@@ -31,6 +31,10 @@ public:
     /// routed, or none at all, is dropped: its reply goes unanswered.
     void handleMessage(std::shared_ptr<VLProtoAudioFilePlayerMessage> message, std::shared_ptr<Reply> reply);
 
+    /// The client is gone: its queue players go at once, though work that waits may keep the router and its
+    /// other objects for a while.
+    void destroyAllQueuePlayers();
+
     std::shared_ptr<VLTorviAudioFilePlayerAssetManager> assetManagerCreateIfNeeded();
     std::shared_ptr<VLTorviAudioFilePlayerItemManager> playerItemManagerCreateIfNeeded();
     std::shared_ptr<VLTorviAudioFilePlayerQueuePlayerManager> queuePlayerManagerCreateIfNeeded();

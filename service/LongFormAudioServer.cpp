@@ -75,7 +75,8 @@ void VLLongFormAudioServer::_replaceCurrentConnectionWithConnection(
     waitForIntake();
     _setConnectionIsValid(false); // cancels the commands that have not begun
     commandServiceQueue_->sync([&] {
-        audioFilePlayerServer_ = nullptr;
+        if (auto router = std::exchange(audioFilePlayerServer_, nullptr))
+            router->destroyAllQueuePlayers();
         install(connection);
     });
     // The connection that was displaced goes here, on none of the queues.

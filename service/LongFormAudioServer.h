@@ -16,9 +16,10 @@ namespace tarn {
 /// The service: the listener, the one current client connection, the queue of its commands, and the way back
 /// to it for events.
 ///
-/// Every change of connection drops the router, and so all objects of the client before. The new connection
-/// is installed behind the commands that were submitted earlier; those that have not begun by then are
-/// cancelled. Connection callbacks come on the I/O thread; see each operation for the rest.
+/// Every change of connection drops the router, and so all objects of the client before; its queue players go
+/// at once, also from under work that waits. The new connection is installed behind the commands that were
+/// submitted earlier; those that have not begun by then are cancelled. Connection callbacks come on the I/O
+/// thread; see each operation for the rest.
 class VLLongFormAudioServer final : public ServiceListenerDelegate,
                                     public VLLongFormAudioServerProtocol,
                                     public EventSink,

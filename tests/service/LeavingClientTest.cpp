@@ -1,0 +1,62 @@
+#include <gtest/gtest.h>
+
+#include "platform/simulated/SimulatedClient.h"
+#include "platform/simulated/SimulatedPlatform.h"
+#include "service/LongFormAudioServer.h"
+#include "tests/support/CapturedLog.h"
+#include "tests/support/ClientCommands.h"
+
+namespace tarn {
+namespace {
+
+using namespace std::chrono_literals;
+
+/// One of two queue players sounds, and a rate of one of them waits for the audio session, when their client
+/// leaves.
+class LeavingClientTest : public testing::TestWithParam<const char*> {
+protected:
+    LeavingClientTest() {
+        service->run();
+        device.media.addFile("file:///a");
+        device.media.speaker().listen();
+        client = std::make_unique<SimulatedClient>(device.listeners);
+        send(commands::upsertAsset({.identifier = "a", .URL = "file:///a"}));
+        send(commands::upsertItem("a", "a"));
+        send(commands::upsertPlayer("sounding", {"a"}));
+        send(commands::upsertPlayer("other", {}));
+        send(commands::setRate("sounding", 1));
+        device.scheduler.advance(2s);
+        EXPECT_EQ(device.media.speaker().soundingOutputs(), 1u);
+    }
+
+    void send(const commands::Command& command) {
+        client->send(commands::encoded(command));
+        device.scheduler.runReady();
+    }
+
+    CapturedLog log;
+    SimulatedPlatform device{1};
+    const std::shared_ptr<VLLongFormAudioServer> service =
+        std::make_shared<VLLongFormAudioServer>(device.roles());
+    std::unique_ptr<SimulatedClient> client;
+};
+
+TEST_P(LeavingClientTest, IsSilentAtOnceAndStaysSo) {
+    for (auto late : {10s, 30s}) {
+        device.audioSession.willActivate({.after = late});
+    }
+    send(commands::setRate(GetParam(), 2));
+    send(commands::setRate("sounding", 1));
+    client->hangUp();
+    device.scheduler.runReady();
+    EXPECT_EQ(device.media.speaker().soundingOutputs(), 0u);
+    device.scheduler.runUntilIdle();
+    ASSERT_EQ(device.media.speaker().heard().size(), 1u);
+    EXPECT_EQ(device.media.speaker().heard().front().text(), "0.000-2.000 file:///a 0.000..2.000");
+    EXPECT_EQ(device.media.speaker().outputs(), 0u);
+}
+
+INSTANTIATE_TEST_SUITE_P(TheRateThatWaits, LeavingClientTest, testing::Values("sounding", "other"));
+
+} // namespace
+} // namespace tarn
