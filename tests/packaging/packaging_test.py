@@ -41,15 +41,21 @@ class Root:
         for name in ("info", "updates"):
             (database / name).mkdir(parents=True)
         (database / "status").touch()
+        # What the packages ask of it is done in the root, not on the machine, for which it takes no rights.
+        self.programs = path / "programs"
+        self.programs.mkdir()
+        ldconfig = self.programs / "ldconfig"
+        ldconfig.write_text(f"#!/bin/sh\nexec {shutil.which('ldconfig', path='/usr/sbin:/sbin')} -N -r {path}\n")
+        ldconfig.chmod(0o755)
 
     def dpkg(self, *arguments):
         run("dpkg", f"--root={self.path}", f"--log={self.path}/log", "--force-depends", "--force-not-root",
             "--force-script-chrootless", *arguments,
-            env={**os.environ, "PATH": os.environ["PATH"] + ":/usr/local/sbin:/usr/sbin:/sbin"})
+            env={**os.environ, "PATH": f"{self.programs}:{os.environ['PATH']}:/usr/local/sbin:/usr/sbin:/sbin"})
 
     def files(self):
         found = {path.relative_to(self.path) for path in self.path.rglob("*") if not path.is_dir()}
-        return {str(path) for path in found if not path.is_relative_to("var/lib/dpkg")} - {"log"}
+        return {str(path) for path in found if not path.is_relative_to("var/lib/dpkg")} - {"log", "programs/ldconfig"}
 
 
 def make_song(path):
