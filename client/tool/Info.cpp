@@ -3,6 +3,7 @@
 #include <iostream>
 
 #include "client/tool/OutputLine.h"
+#include "client/tool/ServiceCheck.h"
 #include "client/tool/Terminal.h"
 #include "client/tool/TimeText.h"
 
@@ -40,6 +41,7 @@ void printJSON(const Track& track) {
 
 int runInfo(const InfoOptions& options) {
     client::Client client({.socketPath = options.socketPath});
+    checkThatServiceAnswers(client);
     int status = 0;
     const auto tracks = openTracks(client, options.paths, options.access,
                                    [&](const std::string& path, const std::string& reason) {

@@ -15,6 +15,7 @@
 
 #include "client/tool/EventInbox.h"
 #include "client/tool/LiveLine.h"
+#include "client/tool/ServiceCheck.h"
 #include "client/tool/Terminal.h"
 #include "client/tool/TimeText.h"
 
@@ -33,15 +34,32 @@ constexpr float fastestRate = 4;
 constexpr std::chrono::milliseconds liveInterval = 250ms;
 constexpr std::chrono::milliseconds plainInterval = 1000ms;
 
-/// SIGINT and SIGTERM as something to wait for. To be made before any thread.
-FileDescriptor waitForSignals() {
+sigset_t stopSignals() {
     sigset_t set;
     sigemptyset(&set);
     sigaddset(&set, SIGINT);
     sigaddset(&set, SIGTERM);
+    return set;
+}
+
+/// The stop signals as something to wait for. To be made before any thread.
+FileDescriptor waitForSignals() {
+    const auto set = stopSignals();
     pthread_sigmask(SIG_BLOCK, &set, nullptr);
     return FileDescriptor(::signalfd(-1, &set, SFD_CLOEXEC | SFD_NONBLOCK));
 }
+
+/// While it lives, a stop signal ends the tool at once. For its first thread, while that waits for answers.
+class StoppingAtOnce {
+public:
+    StoppingAtOnce() { pthread_sigmask(SIG_UNBLOCK, &signals_, nullptr); }
+    ~StoppingAtOnce() { pthread_sigmask(SIG_BLOCK, &signals_, nullptr); }
+    StoppingAtOnce(const StoppingAtOnce&) = delete;
+    StoppingAtOnce& operator=(const StoppingAtOnce&) = delete;
+
+private:
+    const sigset_t signals_ = stopSignals();
+};
 
 template <class... Handlers>
 struct Overloaded : Handlers... {
@@ -55,14 +73,20 @@ public:
     explicit PlaySession(const PlayOptions& options) : options_(options), usualRate_(options.rate) {}
 
     int run() {
-        tracks_ = openTracks(client_, options_.paths, options_.access,
-                             [&](const auto& path, const auto& reason) { fail(path + ": " + reason); });
-        if (!tracks_.empty() && makePlayer())
+        if (open())
             play();
         return status_;
     }
 
 private:
+    bool open() {
+        const StoppingAtOnce whileItTakes;
+        checkThatServiceAnswers(client_);
+        tracks_ = openTracks(client_, options_.paths, options_.access,
+                             [&](const auto& path, const auto& reason) { fail(path + ": " + reason); });
+        return !tracks_.empty() && makePlayer();
+    }
+
     bool makePlayer() {
         std::vector<std::string> items;
         std::vector<std::future<client::Result<client::Status>>> made;
@@ -82,6 +106,7 @@ private:
     }
 
     void play() {
+        terminal_.takeKeys();
         if (terminal_.hasKeys())
             std::cout << "space pause   n next   left/right seek   [ ] rate   q quit\n";
         while (!ended_) {

@@ -62,8 +62,10 @@ Shown shownOf(std::string_view text) {
 
 Terminal::Terminal()
     : isLive_(::isatty(STDOUT_FILENO) == 1 && environment("TERM") != "dumb"),
-      hasKeys_(isLive_ && ::isatty(STDIN_FILENO) == 1 && ::tcgetattr(STDIN_FILENO, &before_) == 0),
-      hasColor_(isLive_ && environment("NO_COLOR").empty()) {
+      hasColor_(isLive_ && environment("NO_COLOR").empty()) {}
+
+void Terminal::takeKeys() {
+    hasKeys_ = isLive_ && ::isatty(STDIN_FILENO) == 1 && ::tcgetattr(STDIN_FILENO, &before_) == 0;
     if (!hasKeys_)
         return;
     termios single = before_;

@@ -10,7 +10,7 @@ namespace tarn::tool {
 /// What a person can press while something plays.
 enum class Key { pause, next, seekBack, seekForward, slower, faster, quit };
 
-/// The terminal that the tool runs on, if it does. Keys are read one by one while this lives.
+/// The terminal that the tool runs on, if it does.
 class Terminal {
 public:
     Terminal();
@@ -20,7 +20,9 @@ public:
 
     /// Is standard output a terminal that a line can be redrawn on?
     bool isLive() const { return isLive_; }
-    /// Can keys be read?
+    /// From now on, as long as this lives, keys come one by one, if they can be read.
+    void takeKeys();
+    /// Do they?
     bool hasKeys() const { return hasKeys_; }
     bool hasColor() const { return hasColor_; }
     int columns() const;
