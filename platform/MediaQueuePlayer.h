@@ -16,9 +16,9 @@ class AudioSession;
 /// "currentItem" (item).
 ///
 /// Any thread may call, and what a call changes is to be read back at once; sound follows. The changes that a
-/// call makes are reported on its thread before it returns, those of playing itself (an item ends or fails)
-/// on the player thread. Letting the last reference go, on any thread, silences the player without waiting
-/// for it.
+/// call makes are reported on its thread before it returns, unless another thread is reporting that property
+/// just then and goes on with them; those of playing itself (an item ends or fails) on the player thread.
+/// Letting the last reference go, on any thread, silences the player without waiting for it.
 ///
 /// An item that ends leaves the queue, and it is reported in this order: the item's status if it failed, its
 /// notification, "currentItem", and "rate" if the queue is empty then and the rate has become 0. Playing
