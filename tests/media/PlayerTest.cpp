@@ -195,6 +195,27 @@ TEST(Player, SeeksWhilePlaying) {
                             "7.200-9.100 b 0.000..1.900\n");
 }
 
+TEST(Player, SeeksAwayFromAnEndThatIsHeardButNotReported) {
+    int inTime = 0;
+    for (std::uint64_t seed = 1; seed <= 20; ++seed) {
+        Listening test(seed);
+        auto a = test.item("a", 10s);
+        test.play({a, test.item("b", 10s)});
+        bool isInTime = false;
+        auto thread = test.platform.scheduler.createQueue("thread");
+        auto seek = test.platform.scheduler.at(10s, thread, [&] {
+            a->seekToTime({2, 1});
+            isInTime = test.player->currentItem() == a;
+        });
+        test.advance(11s);
+        inTime += isInTime ? 1 : 0;
+        EXPECT_EQ(test.nameOf(test.player->currentItem()), isInTime ? "a" : "b") << seed;
+        EXPECT_EQ(test.player->currentTime().seconds(), isInTime ? 3.0 : 1.0) << seed;
+    }
+    EXPECT_GT(inTime, 0);
+    EXPECT_LT(inTime, 20);
+}
+
 TEST(Player, SeeksBeforePlaying) {
     Listening test;
     auto a = test.item("a", 60s), b = test.item("b", 10s), c = test.item("c", 10s),

@@ -162,6 +162,26 @@ TEST(TwoPlayers, TheNewestOneDrivesTheItemsTheyShare) {
     EXPECT_EQ(test.reports(), "4.000: rate 2\n7.000: a played to its end\n7.000: current b\n");
 }
 
+TEST(TwoPlayers, OnlyTheNewestOneReportsHowAnItemEnds) {
+    Listening test;
+    auto a = test.item("a", 10s);
+    test.play({a});
+    auto old = test.player;
+    test.advance(4s);
+    test.play({a}, 0);
+    test.reports();
+    test.advance(10s);
+    EXPECT_EQ(old->currentItem(), nullptr);
+    EXPECT_EQ(test.reports(), "10.000: current none\n10.000: rate 0\n");
+    EXPECT_EQ(a->currentTime().seconds(), 4.0);
+    test.player->play();
+    test.advance(10s);
+    EXPECT_EQ(test.reports(), "14.000: rate 1\n"
+                              "20.000: a played to its end\n"
+                              "20.000: current none\n"
+                              "20.000: rate 0\n");
+}
+
 TEST(TwoPlayers, TheOneBeforeDrivesWhatTheNewestLetsGo) {
     Listening test;
     auto a = test.item("a", 10s), b = test.item("b", 10s);

@@ -111,8 +111,11 @@ TEST_F(ActivationTest, APendingActivationKeepsAQueuePlayerAndNothingElseDoes) {
     EXPECT_EQ(pass(17s), "setRate: no answer\n");
     tell(destroyPlayer("player"));
     EXPECT_EQ(LiveObjects::counts()["queue player"], 1);
-    pass(13s);
+    client.reset();
+    EXPECT_EQ(LiveObjects::counts()["object manager"], 2) << "those that the queue player was made with";
+    device.scheduler.advance(13s);
     EXPECT_EQ(LiveObjects::counts()["queue player"], 0);
+    EXPECT_EQ(LiveObjects::counts()["object manager"], 0);
 }
 
 } // namespace

@@ -20,7 +20,14 @@ protected:
         tell(upsertItem("i", "a"));
     }
 
-    NowPlayingInfo shown() { return device.nowPlaying.publications().back().info; }
+    /// What was published last, as it is always published: for the application of the moment, in place of
+    /// what was there.
+    NowPlayingInfo shown() {
+        const auto& last = device.nowPlaying.publications().back();
+        EXPECT_EQ(last.parentApplication, application());
+        EXPECT_EQ(last.mergePolicy, 1);
+        return last.info;
+    }
     std::size_t publications() { return device.nowPlaying.publications().size(); }
     std::optional<std::string> application() { return device.nowPlaying.parentApplication(); }
 
@@ -51,6 +58,18 @@ TEST_F(NowPlayingTest, IsPublishedTwiceWhenAPlayerIsMadeAndAtEveryChangeOfRateOr
     EXPECT_EQ(publications(), 5u);
     tell(destroyPlayer("x,y,ostrel.watch.music"));
     EXPECT_EQ(publications(), 5u);
+}
+
+TEST_F(NowPlayingTest, IsPublishedBeforeTheClientIsToldOfTheChange) {
+    tell(upsertPlayer("p", {"i"}));
+    for (const auto& [report, command] : {std::pair("queuePlayer.setRate", setRate("p", 1)),
+                                          std::pair("queuePlayer.setCurrentItem", removeAllItems("p"))}) {
+        auto before = publications();
+        std::size_t atReport = 0;
+        client->transcript().whenPushed(report, [&] { atReport = publications(); });
+        tell(command);
+        EXPECT_EQ(atReport, before + 1) << report;
+    }
 }
 
 TEST_F(NowPlayingTest, ShowsWhatHoldsWhenRateAndItemChangeAtOnce) {

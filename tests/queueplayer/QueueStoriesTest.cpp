@@ -83,6 +83,18 @@ TEST_F(QueueStoriesTest, APlayerKeepsTheManagersThatItWasMadeWith) {
                                                 "appendItem: no answer\n");
 }
 
+TEST_F(QueueStoriesTest, SetsTheSessionUpForEveryPlayerAndGoesOnWhenThatFails) {
+    mirror({"a"});
+    tell(upsertPlayer("other", {}));
+    using Session = AudioSession;
+    const SimulatedAudioSession::CategorySetting longForm{
+        Session::Category::playback, Session::Mode::standard, Session::RouteSharingPolicy::longForm, 0};
+    EXPECT_THAT(device.audioSession.categorySettings(), ElementsAre(longForm, longForm));
+    device.audioSession.setCategoryError(Error{"test", 7, {}});
+    EXPECT_THAT(tell(upsertPlayer("player", {"a"})), HasSubstr("upsertWithItems: identifier=a status=1\n"));
+    EXPECT_THAT(errors(), ElementsAre("Could not set audio session category due to error: (test, code 7)."));
+}
+
 TEST_F(QueueStoriesTest, AnEmptyQueueHasNoCurrentItem) {
     EXPECT_EQ(tell(upsertPlayer("player", {})), "push queuePlayer.setStatus identifier=player status=1\n"
                                                 "push queuePlayer.setRate identifier=player rate=0\n"

@@ -1,6 +1,7 @@
 #include <gtest/gtest.h>
 
 #include <atomic>
+#include <string>
 #include <thread>
 
 #include "assets/PlayerItem.h"
@@ -9,6 +10,67 @@
 
 namespace tarn {
 namespace {
+
+/// Writes down when it goes.
+class Noted final : public Registration {
+public:
+    Noted(std::string& journal, const char* name) : journal_(journal), name_(name) {}
+    ~Noted() override { journal_.append(name_).append(" "); }
+
+private:
+    std::string& journal_;
+    const char* const name_;
+};
+
+/// What an item is given, writing down when it is let go.
+class NotedItem final : public MediaItem {
+public:
+    explicit NotedItem(std::string& journal) : journal_(journal), end_(journal, "item") {}
+    RegistrationHandle observe(std::string_view, Block) override {
+        return std::make_unique<Noted>(journal_, "observation");
+    }
+    MediaStatus status() const override { return MediaStatus::unknown; }
+    std::optional<Error> error() const override { return std::nullopt; }
+    const std::shared_ptr<MediaAsset>& asset() const override { return asset_; }
+    MediaTime currentTime() const override { return MediaTime::zero(); }
+    void seekToTime(MediaTime) override {}
+
+private:
+    std::string& journal_;
+    const std::shared_ptr<MediaAsset> asset_;
+    Noted end_;
+};
+
+class NotedCenter final : public NotificationCenter {
+public:
+    explicit NotedCenter(std::string& journal) : journal_(journal) {}
+    RegistrationHandle addObserver(std::initializer_list<std::string_view>, const void*, Handler) override {
+        return std::make_unique<Noted>(journal_, "notifications");
+    }
+    void post(const Notification&) override {}
+
+private:
+    std::string& journal_;
+};
+
+class NotedSink final : public EventSink {
+public:
+    explicit NotedSink(std::string& journal) : end_(journal, "server") {}
+    void sendData(const Data&) override {}
+
+private:
+    Noted end_;
+};
+
+TEST(PlayerItemTest, EndsItsReportsBeforeItLetsGoOfWhatTheyAreAbout) {
+    std::string journal;
+    NotedCenter notifications(journal);
+    auto item = VLTorviAudioFilePlayerItem::initWithPlayerItem(
+        notifications, std::make_shared<NotedItem>(journal), "item", std::make_shared<NotedSink>(journal));
+    EXPECT_EQ(journal, "");
+    item.reset();
+    EXPECT_EQ(journal, "notifications server observation item ");
+}
 
 /// A media item whose status the test sets, on real threads.
 class ScriptedItem final : public MediaItem {
