@@ -52,6 +52,8 @@ public:
     /// Takes the place of the object that had the identifier, if there was one.
     void setObject(const std::string& identifier, std::shared_ptr<Object> object) {
         maps_.withLocked([&](Maps& maps) {
+            if (maps.closed)
+                return;
             auto& entry = *maps.identifierToObjectMap.try_emplace(identifier).first;
             maps.forgetMediaObjectOf(entry);
             maps.entryOfMediaObject[object->mediaObject()] = &entry;
@@ -72,12 +74,16 @@ public:
         });
     }
 
-    /// What was in it.
-    std::vector<std::shared_ptr<Object>> removeAllObjects() {
-        const Maps displaced = maps_.withLocked([](Maps& maps) { return std::exchange(maps, {}); });
+    /// Lets go of everything, and of whatever is set from now on. Returns what was in it.
+    std::vector<std::shared_ptr<Object>> close() {
+        const IdentifierToObjectMap displaced = maps_.withLocked([](Maps& maps) {
+            maps.closed = true;
+            maps.entryOfMediaObject.clear();
+            return std::exchange(maps.identifierToObjectMap, {});
+        });
         std::vector<std::shared_ptr<Object>> objects;
-        objects.reserve(displaced.identifierToObjectMap.size());
-        for (const auto& [identifier, object] : displaced.identifierToObjectMap)
+        objects.reserve(displaced.size());
+        for (const auto& [identifier, object] : displaced)
             objects.push_back(object);
         return objects;
     }
@@ -90,6 +96,7 @@ private:
         IdentifierToObjectMap identifierToObjectMap;
         /// Entries stay where they are when the map grows.
         std::unordered_map<const void*, Entry*> entryOfMediaObject;
+        bool closed = false;
 
         void forgetMediaObjectOf(const Entry& entry) {
             if (entry.second)

@@ -160,12 +160,12 @@ void VLTorviAudioFilePlayerQueuePlayerManager::destroyQueuePlayerWithIdentifier(
     identifierToObjectMap_.removeObject(identifier);
 }
 
-void VLTorviAudioFilePlayerQueuePlayerManager::destroyAllQueuePlayers() {
-    for (auto& player : identifierToObjectMap_.removeAllObjects()) {
+void VLTorviAudioFilePlayerQueuePlayerManager::close() {
+    for (auto& player : identifierToObjectMap_.close()) {
         const std::weak_ptr<VLTorviAudioFileQueuePlayer> held = player;
         player.reset();
         if (auto left = held.lock())
-            left->pause();
+            left->queuePlayer()->removeAllItems();
     }
 }
 

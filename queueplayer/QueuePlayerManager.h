@@ -41,9 +41,10 @@ public:
 
     void destroyQueuePlayerWithIdentifier(const std::string& identifier);
 
-    /// Any thread: lets every queue player go at once, also from under commands that wait. What these or an
-    /// activation still hold is paused.
-    void destroyAllQueuePlayers();
+    /// The client is gone. Any thread: lets every queue player go at once, also from under commands that
+    /// wait, and any that these make afterwards. What a command or an activation still holds has nothing to
+    /// play.
+    void close();
 
     /// Null when there is none, or no identifier.
     std::shared_ptr<MediaQueuePlayer>

@@ -44,10 +44,10 @@ void VLTorviAudioFilePlayerServer::submit(SerialQueue& queue,
     });
 }
 
-void VLTorviAudioFilePlayerServer::destroyAllQueuePlayers() {
+void VLTorviAudioFilePlayerServer::close() {
     if (auto manager =
             managers_.withLocked([](const Managers& managers) { return managers.queuePlayerManager; }))
-        manager->destroyAllQueuePlayers();
+        manager->close();
 }
 
 std::shared_ptr<VLTorviAudioFilePlayerAssetManager>

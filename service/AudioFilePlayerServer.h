@@ -33,7 +33,7 @@ public:
 
     /// The client is gone: its queue players go at once, though work that waits may keep the router and its
     /// other objects for a while.
-    void destroyAllQueuePlayers();
+    void close();
 
     std::shared_ptr<VLTorviAudioFilePlayerAssetManager> assetManagerCreateIfNeeded();
     std::shared_ptr<VLTorviAudioFilePlayerItemManager> playerItemManagerCreateIfNeeded();

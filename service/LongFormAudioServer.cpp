@@ -76,7 +76,7 @@ void VLLongFormAudioServer::_replaceCurrentConnectionWithConnection(
     _setConnectionIsValid(false); // cancels the commands that have not begun
     commandServiceQueue_->sync([&] {
         if (auto router = std::exchange(audioFilePlayerServer_, nullptr))
-            router->destroyAllQueuePlayers();
+            router->close();
         install(connection);
     });
     // The connection that was displaced goes here, on none of the queues.

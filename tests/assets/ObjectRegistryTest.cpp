@@ -74,6 +74,18 @@ TEST(ObjectRegistryTest, LetsADisplacedObjectLookIntoItWhileItIsDestroyed) {
     EXPECT_EQ(seen, (std::vector<std::optional<std::string>>{"a", std::nullopt}));
 }
 
+TEST(ObjectRegistryTest, KeepsNothingOnceItIsClosed) {
+    ObjectRegistry<Entry> registry;
+    auto first = entry(&media[0]);
+    registry.setObject("a", first);
+    EXPECT_EQ(registry.close(), std::vector{first});
+    registry.setObject("b", entry(&media[1]));
+    EXPECT_EQ(registry.objectWithIdentifier("a"), nullptr);
+    EXPECT_EQ(registry.objectWithIdentifier("b"), nullptr);
+    EXPECT_EQ(registry.identifierForMediaObject(&media[0]), std::nullopt);
+    EXPECT_EQ(registry.identifierForMediaObject(&media[1]), std::nullopt);
+}
+
 TEST(ObjectRegistryTest, AnswersReadersWhileItChanges) {
     constexpr int count = 64;
     constexpr int rounds = 50;

@@ -1,5 +1,6 @@
 #include <gtest/gtest.h>
 
+#include "platform/AudioSession.h"
 #include "platform/simulated/SimulatedClient.h"
 #include "platform/simulated/SimulatedPlatform.h"
 #include "service/LongFormAudioServer.h"
@@ -42,14 +43,17 @@ protected:
 };
 
 TEST_P(LeavingClientTest, IsSilentAtOnceAndStaysSo) {
-    for (auto late : {10s, 30s}) {
-        device.audioSession.willActivate({.after = late});
-    }
+    for (auto after : {10s, 0s, 10s})
+        device.audioSession.willActivate({.after = after});
     send(commands::setRate(GetParam(), 2));
-    send(commands::setRate("sounding", 1));
+    // What waits behind it is not heard either.
+    send(commands::upsertPlayer("late", {"a"}));
+    send(commands::setRate("late", 1));
+    send(commands::setRate("late", 2));
     client->hangUp();
     device.scheduler.runReady();
     EXPECT_EQ(device.media.speaker().soundingOutputs(), 0u);
+    device.audioSession.endInterruption(AudioSession::optionShouldResume);
     device.scheduler.runUntilIdle();
     ASSERT_EQ(device.media.speaker().heard().size(), 1u);
     EXPECT_EQ(device.media.speaker().heard().front().text(), "0.000-2.000 file:///a 0.000..2.000");
