@@ -72,7 +72,6 @@ void VLLongFormAudioServer::_connectionWasInvalidated() {
 void VLLongFormAudioServer::_replaceCurrentConnectionWithConnection(
     std::shared_ptr<ServiceConnection> connection) {
     assert(!commandServiceQueue_->isCurrent() && !platform_.queues.main().isCurrent());
-    waitForIntake();
     _setConnectionIsValid(false); // cancels the commands that have not begun
     commandServiceQueue_->sync([&] {
         if (auto router = std::exchange(audioFilePlayerServer_, nullptr))
@@ -98,21 +97,11 @@ void VLLongFormAudioServer::receiveData(std::vector<ReceivedCall> calls) {
             arrived.emplace_back(std::move(envelope), makeCached<Reply>(std::move(call.callback)));
     if (arrived.empty())
         return;
-    waitForIntake();
-    intakeIsDone_ = false;
-    platform_.queues.main().async([self = shared_from_this(), arrived = std::move(arrived)]() mutable {
+    platform_.queues.main().sync([&] {
         for (auto& [envelope, reply] : arrived)
-            self->_enqueueAudioCommand(makeCached<const VLLongFormAudioCommand>(
-                envelope->audioFilePlayerMessage(), std::move(reply)));
-        self->intakeIsDone_ = true;
+            _enqueueAudioCommand(makeCached<const VLLongFormAudioCommand>(envelope->audioFilePlayerMessage(),
+                                                                          std::move(reply)));
     });
-}
-
-/// The I/O thread waits for the main queue only when it has something else for the service to do. By then the
-/// step is usually long done, and the thread need not be woken for it.
-void VLLongFormAudioServer::waitForIntake() {
-    if (!intakeIsDone_)
-        platform_.queues.main().sync([] {});
 }
 
 void VLLongFormAudioServer::sendData(const Data& data) {

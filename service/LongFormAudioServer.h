@@ -1,6 +1,5 @@
 #pragma once
 
-#include <atomic>
 #include <memory>
 #include <vector>
 
@@ -40,8 +39,8 @@ public:
     bool listenerShouldAcceptNewConnection(ServiceListener& listener,
                                            const std::shared_ptr<ServiceConnection>& connection) override;
 
-    /// Data that is no envelope costs a log line; its callback is let go. The commands are submitted before
-    /// anything that the I/O thread does next here.
+    /// Data that is no envelope costs a log line; its callback is let go. The commands are submitted when
+    /// this returns.
     void receiveData(std::vector<ReceivedCall> calls) override;
 
     void sendData(const Data& data) override;
@@ -71,14 +70,12 @@ public:
 private:
     std::shared_ptr<ServiceConnection> validConnection() const;
     void install(std::shared_ptr<ServiceConnection>& connection);
-    void waitForIntake();
     void runCommand(const VLLongFormAudioCommand& command);
     void routeCommand(const VLLongFormAudioCommand& command);
     void createAudioFilePlayerServer();
 
     const Platform platform_;
-    std::atomic<bool> intakeIsDone_ = true; // cleared on the I/O thread, set on the main queue
-    bool connectionIsValid_ = false;        // guard queue only
+    bool connectionIsValid_ = false; // guard queue only
     std::unique_ptr<ServiceListener> zelConnectionListener_;
     std::shared_ptr<ServiceConnection> clientConnection_; // guard queue only, with the flag
     const std::shared_ptr<SerialQueue> commandServiceQueue_;

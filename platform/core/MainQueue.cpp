@@ -10,11 +10,16 @@ namespace tarn {
 void MainQueue::async(Work work) {
     std::unique_lock lock(mutex_);
     line_.push_back(std::move(work));
-    wakeIfItWaits(std::move(lock));
+    if (!isLent_)
+        wakeIfItWaits(std::move(lock));
 }
 
 void MainQueue::sync(const std::function<void()>& work) {
     QueueFrame::abortIfInside(this, label_);
+    if (lend()) {
+        QueueFrame::run(this, work);
+        return takeBack();
+    }
     QueueTurn turn;
     async([&] {
         work();
@@ -27,8 +32,8 @@ bool MainQueue::isCurrent() const { return QueueFrame::isInnermost(this); }
 
 void MainQueue::runLoop() {
     std::unique_lock lock(mutex_);
-    while (!ended_) {
-        if (line_.empty()) {
+    while (!ended_ || isLent_) {
+        if (line_.empty() || isLent_) {
             waits_ = true;
             lock.unlock();
             wake_.acquire();
@@ -47,7 +52,23 @@ void MainQueue::runLoop() {
 void MainQueue::end() {
     std::unique_lock lock(mutex_);
     ended_ = true;
-    wakeIfItWaits(std::move(lock));
+    if (!isLent_)
+        wakeIfItWaits(std::move(lock));
+}
+
+/// To the calling thread, when the main thread waits for work. False when it does not.
+bool MainQueue::lend() {
+    std::lock_guard lock(mutex_);
+    if (!waits_ || isLent_)
+        return false;
+    return isLent_ = true;
+}
+
+void MainQueue::takeBack() {
+    std::unique_lock lock(mutex_);
+    isLent_ = false;
+    if (!line_.empty() || ended_)
+        wakeIfItWaits(std::move(lock));
 }
 
 /// The main thread wants the lock as soon as it wakes up, so the lock is let go first.

@@ -63,7 +63,7 @@ TEST_F(SerialQueueTest, WorkOfManyThreadsRunsOneAtATimeAndInOrder) {
     EXPECT_THAT(inOrder, testing::Each(true));
 }
 
-TEST_F(SerialQueueTest, SyncOnAnIdleQueueRunsInPlaceButNeverOnTheMainQueue) {
+TEST_F(SerialQueueTest, SyncOnAnIdleQueueRunsInPlace) {
     auto queue = queues_.create("test.idle");
     std::thread::id ranOn;
     queue->sync([&] {
@@ -73,8 +73,37 @@ TEST_F(SerialQueueTest, SyncOnAnIdleQueueRunsInPlaceButNeverOnTheMainQueue) {
     EXPECT_EQ(ranOn, std::this_thread::get_id());
     EXPECT_FALSE(queue->isCurrent());
     EXPECT_EQ(queues_.pool().threads(), 0u);
-    queues_.main().sync([&] { ranOn = std::this_thread::get_id(); });
-    EXPECT_NE(ranOn, std::this_thread::get_id());
+}
+
+TEST_F(SerialQueueTest, TheMainQueueIsLentWhileItsThreadWaitsAndTakesUpWhatCameMeanwhile) {
+    const auto caller = std::this_thread::get_id();
+    std::thread::id ranOn;
+    std::promise<std::thread::id> cameMeanwhile;
+    while (ranOn != caller) // until the main thread has come to wait
+        queues_.main().sync([&] { ranOn = std::this_thread::get_id(); });
+    queues_.main().sync([&] {
+        EXPECT_TRUE(queues_.main().isCurrent());
+        queues_.main().async([&] { cameMeanwhile.set_value(std::this_thread::get_id()); });
+    });
+    EXPECT_NE(cameMeanwhile.get_future().get(), caller);
+}
+
+TEST_F(SerialQueueTest, TheMainQueueRunsOneThingAtATimeWhetherLentOrNot) {
+    constexpr int threads = 4;
+    constexpr int rounds = 20'000;
+    int ran = 0; // unguarded, but for the queue
+    {
+        std::array<std::jthread, threads> submitters;
+        for (auto& submitter : submitters)
+            submitter = std::jthread([&] {
+                for (int round = 0; round < rounds; ++round)
+                    if (round % 3 == 0)
+                        queues_.main().async([&] { ++ran; });
+                    else
+                        queues_.main().sync([&] { ++ran; });
+            });
+    }
+    queues_.main().sync([&] { EXPECT_EQ(ran, threads * rounds); });
 }
 
 TEST_F(SerialQueueTest, SyncWaitsForEverythingSubmittedBefore) {
