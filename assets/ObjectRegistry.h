@@ -6,7 +6,6 @@
 #include <string>
 #include <unordered_map>
 #include <utility>
-#include <vector>
 
 #include "platform/core/MutexProtected.h"
 
@@ -74,18 +73,13 @@ public:
         });
     }
 
-    /// Lets go of everything, and of whatever is set from now on. Returns what was in it.
-    std::vector<std::shared_ptr<Object>> close() {
-        const IdentifierToObjectMap displaced = maps_.withLocked([](Maps& maps) {
+    /// Lets go of everything, and of whatever is set from now on.
+    void close() {
+        Maps displaced;
+        maps_.withLocked([&](Maps& maps) {
+            std::swap(maps, displaced);
             maps.closed = true;
-            maps.entryOfMediaObject.clear();
-            return std::exchange(maps.identifierToObjectMap, {});
         });
-        std::vector<std::shared_ptr<Object>> objects;
-        objects.reserve(displaced.size());
-        for (const auto& [identifier, object] : displaced)
-            objects.push_back(object);
-        return objects;
     }
 
 private:

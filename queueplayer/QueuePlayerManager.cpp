@@ -143,9 +143,14 @@ void VLTorviAudioFilePlayerQueuePlayerManager::upsertQueuePlayerWithIdentifier(
     queuePlayer->setAudioSession(platform().audioSession);
     setupAudioSession(*queuePlayer->audioSession());
     auto items = playerItemManager();
-    identifierToObjectMap_.setObject(
-        identifier, VLTorviAudioFileQueuePlayer::initWithQueuePlayer(platform(), queuePlayer, identifier,
-                                                                     audioServer(), items, assetManager()));
+    auto player = VLTorviAudioFileQueuePlayer::initWithQueuePlayer(platform(), queuePlayer, identifier,
+                                                                   audioServer(), items, assetManager());
+    made_.withLocked([&](auto& players) {
+        if (players.size() == players.capacity()) // rather than grow for those that are gone
+            std::erase_if(players, [](const auto& made) { return made.expired(); });
+        players.push_back(player);
+    });
+    identifierToObjectMap_.setObject(identifier, std::move(player));
 
     // The answer names the current item, not the queue player.
     auto currentItem = queuePlayer->currentItem();
@@ -161,12 +166,10 @@ void VLTorviAudioFilePlayerQueuePlayerManager::destroyQueuePlayerWithIdentifier(
 }
 
 void VLTorviAudioFilePlayerQueuePlayerManager::close() {
-    for (auto& player : identifierToObjectMap_.close()) {
-        const std::weak_ptr<VLTorviAudioFileQueuePlayer> held = player;
-        player.reset();
-        if (auto left = held.lock())
-            left->queuePlayer()->removeAllItems();
-    }
+    identifierToObjectMap_.close();
+    for (const auto& made : made_.withLocked([](auto& players) { return std::exchange(players, {}); }))
+        if (auto held = made.lock())
+            held->queuePlayer()->removeAllItems();
 }
 
 std::shared_ptr<MediaQueuePlayer> VLTorviAudioFilePlayerQueuePlayerManager::queuePlayerWithIdentifier(

@@ -80,6 +80,8 @@ private:
     MutexProtected<std::shared_ptr<VLTorviAudioFilePlayerItemManager>> playerItemManager_;
     MutexProtected<std::shared_ptr<VLTorviAudioFilePlayerAssetManager>> assetManager_;
     ObjectRegistry<VLTorviAudioFileQueuePlayer> identifierToObjectMap_;
+    /// Those that live: also what was destroyed or replaced, while a command or an activation holds it.
+    MutexProtected<std::vector<std::weak_ptr<VLTorviAudioFileQueuePlayer>>> made_;
 };
 
 } // namespace tarn

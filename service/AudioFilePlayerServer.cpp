@@ -45,9 +45,8 @@ void VLTorviAudioFilePlayerServer::submit(SerialQueue& queue,
 }
 
 void VLTorviAudioFilePlayerServer::close() {
-    if (auto manager =
-            managers_.withLocked([](const Managers& managers) { return managers.queuePlayerManager; }))
-        manager->close();
+    // Made if need be: work that has not begun would make one that is not closed.
+    queuePlayerManagerCreateIfNeeded()->close();
 }
 
 std::shared_ptr<VLTorviAudioFilePlayerAssetManager>

@@ -76,9 +76,10 @@ TEST(ObjectRegistryTest, LetsADisplacedObjectLookIntoItWhileItIsDestroyed) {
 
 TEST(ObjectRegistryTest, KeepsNothingOnceItIsClosed) {
     ObjectRegistry<Entry> registry;
-    auto first = entry(&media[0]);
-    registry.setObject("a", first);
-    EXPECT_EQ(registry.close(), std::vector{first});
+    std::optional<std::string> seen = "unseen";
+    registry.setObject("a", entry(&media[0], [&] { seen = registry.identifierForMediaObject(&media[0]); }));
+    registry.close();
+    EXPECT_EQ(seen, std::nullopt);
     registry.setObject("b", entry(&media[1]));
     EXPECT_EQ(registry.objectWithIdentifier("a"), nullptr);
     EXPECT_EQ(registry.objectWithIdentifier("b"), nullptr);
