@@ -32,15 +32,29 @@ Command CommandMix::next() {
     return (this->*row->make)();
 }
 
+std::vector<Command> CommandMix::beginning() {
+    std::vector<Command> all;
+    for (std::size_t index = 0; index < assetCount; ++index)
+        all.push_back(commands::upsertAsset({.identifier = "asset" + std::to_string(index), .URL = file()}));
+    for (std::size_t index = 0; index < itemCount; ++index)
+        all.push_back(commands::upsertItem("item" + std::to_string(index), asset()));
+    for (std::size_t index = 0; index < playerCount; ++index) {
+        all.push_back(commands::upsertPlayer("player" + std::to_string(index), {}));
+        for (std::size_t count = 0; count < 3; ++count)
+            all.push_back(commands::appendItem("player" + std::to_string(index), item()));
+    }
+    for (std::size_t count = 0; count < 2; ++count)
+        all.push_back(setRate());
+    return all;
+}
+
 commands::Identifier CommandMix::identifier(const std::string& kind, std::size_t count) {
     if (random_(40) == 0)
         return std::nullopt;
     return kind + std::to_string(random_(count));
 }
 
-Command CommandMix::upsertAsset() {
-    return commands::upsertAsset({.identifier = asset(), .URL = files_[random_(files_.size())]});
-}
+Command CommandMix::upsertAsset() { return commands::upsertAsset({.identifier = asset(), .URL = file()}); }
 
 Command CommandMix::updateAsset() {
     return commands::upsertAsset({.identifier = asset(), .title = "title " + std::to_string(random_(9))});

@@ -21,6 +21,10 @@ public:
 
     commands::Command next();
 
+    /// What a client sends first: everything that it has, and that a part of it is to play. Without it,
+    /// hardly any of the commands that follow would come upon an object.
+    std::vector<commands::Command> beginning();
+
 private:
     using Identifier = commands::Identifier;
 
@@ -46,9 +50,14 @@ private:
     commands::Command removeItem();
     commands::Command removeAllItems();
 
-    Identifier asset() { return identifier("asset", 4); }
-    Identifier item() { return identifier("item", 6); }
-    Identifier player() { return identifier("player", 3); }
+    static constexpr std::size_t assetCount = 4;
+    static constexpr std::size_t itemCount = 6;
+    static constexpr std::size_t playerCount = 3;
+
+    std::string file() { return files_[random_(files_.size())]; }
+    Identifier asset() { return identifier("asset", assetCount); }
+    Identifier item() { return identifier("item", itemCount); }
+    Identifier player() { return identifier("player", playerCount); }
     Identifier identifier(const std::string& kind, std::size_t count);
 
     Random random_;

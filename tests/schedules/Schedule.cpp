@@ -21,7 +21,7 @@ const std::vector<Schedule::Row> Schedule::rows{
 Schedule::Schedule(std::uint64_t seed)
     : platform_(seed),
       mix_([this](std::size_t limit) { return random(limit); },
-           {"file:///good", "file:///good", "file:///tagged", "file:///short", "file:///broken",
+           {"file:///good", "file:///long", "file:///tagged", "file:///short", "file:///broken",
             "file:///unplayable", "file:///stalling", "file:///missing"}),
       service_(std::make_shared<VLLongFormAudioServer>(platform_.roles())) {
     addFiles();
@@ -32,6 +32,7 @@ void Schedule::addFiles() {
         platform_.media.addFile(URL, std::move(script));
     };
     add("file:///good", {.duration = 4s});
+    add("file:///long", {.duration = 60s});
     add("file:///tagged", {.title = "Song", .albumTitle = "Album", .artist = "Band", .duration = 3s});
     add("file:///short", {.duration = 20ms});
     add("file:///broken", {.duration = 4s, .breaksAt = 1s});
@@ -55,7 +56,7 @@ std::vector<std::string> Schedule::run() {
 }
 
 std::vector<std::string> Schedule::violations() {
-    std::vector<std::string> all;
+    std::vector<std::string> all = wrong_;
     for (std::size_t index = 0; index < connections_.size(); ++index)
         for (const std::string& violation :
              connections_[index].checks.violations(connections_[index].client->deliveries()))
@@ -74,11 +75,10 @@ void Schedule::step() {
     (this->*row->happen)();
 }
 
-void Schedule::command() {
+void Schedule::send(const commands::Command& command) {
     auto& [client, checks] = connections_.back();
     if (client->connection().isLost())
         return;
-    commands::Command command = mix_.next();
     std::size_t before = client->deliveries().size();
     if (random(8) == 0)
         client->send(commands::encoded(command));
@@ -126,6 +126,10 @@ void Schedule::connect() {
     for (Connection& connection : connections_)
         connection.checks.mayBeReplacedFrom(connection.client->deliveries().size());
     connections_.push_back({std::make_unique<SimulatedClient>(platform_.listeners), {}});
+    if (random(4) == 0)
+        return;
+    for (const auto& command : mix_.beginning())
+        send(command);
 }
 
 /// Sometimes an old one that has been replaced: its loss ends the current one too.
@@ -139,6 +143,15 @@ void Schedule::loseConnection() {
         client.breakOff();
     if (random(3) != 0)
         connect();
+    else
+        expectSilence();
+}
+
+/// Without a client nothing sounds, whatever the work of those that were there still waits for.
+void Schedule::expectSilence() {
+    platform_.scheduler.runReady();
+    if (service_->clientConnection() == nullptr && platform_.media.speaker().soundingOutputs() > 0)
+        wrong_.emplace_back("a client that left still sounds");
 }
 
 } // namespace tarn

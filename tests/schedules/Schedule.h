@@ -39,7 +39,8 @@ private:
     void addFiles();
     void step();
 
-    void command();
+    void send(const commands::Command& command);
+    void command() { send(mix_.next()); }
     void passTime();
     void linger() { platform_.scheduler.runReady(); }
     void scriptSession();
@@ -49,6 +50,7 @@ private:
     void sendGarbage();
     void connect();
     void loseConnection();
+    void expectSilence();
 
     std::vector<std::string> violations();
 
@@ -56,6 +58,7 @@ private:
     CommandMix mix_;
     std::shared_ptr<VLLongFormAudioServer> service_;
     std::vector<Connection> connections_; // the last one is current, if it has not been lost
+    std::vector<std::string> wrong_;
 };
 
 } // namespace tarn
