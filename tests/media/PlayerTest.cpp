@@ -195,6 +195,20 @@ TEST(Player, SeeksWhilePlaying) {
                             "7.200-9.100 b 0.000..1.900\n");
 }
 
+TEST(Player, BeginsAnItemThatHasPlayedToItsEndAnewUnlessItWasMoved) {
+    Listening test;
+    auto a = test.item("a", 10s);
+    test.play({a}, 10);
+    test.advance(1s);
+    test.player->insertItem(a, nullptr);
+    EXPECT_EQ(a->currentTime().seconds(), 0.0);
+    test.player->setRate(10);
+    test.advance(1s);
+    a->seekToTime({5, 1});
+    test.player->insertItem(a, nullptr);
+    EXPECT_EQ(a->currentTime().seconds(), 5.0);
+}
+
 TEST(Player, SeeksAwayFromAnEndThatIsHeardButNotReported) {
     int inTime = 0;
     for (std::uint64_t seed = 1; seed <= 20; ++seed) {

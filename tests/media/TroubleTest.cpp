@@ -63,6 +63,14 @@ TEST(Trouble, AFileThatBreaksIsHeardUpToThere) {
     EXPECT_EQ(test.heard(), "0.000-4.000 a 0.000..4.000\n4.000-6.000 b 0.000..2.000\n");
     EXPECT_EQ(a->error()->code, 1);
     EXPECT_EQ(a->currentTime().seconds(), 4.0);
+
+    // What has failed is not tried again, wherever it stands.
+    a->seekToTime({1, 1});
+    test.player->insertItem(a, nullptr);
+    EXPECT_EQ(test.reports(), "13.900: a jumped\n"
+                              "13.900: current a\n"
+                              "13.900: a did not play to its end\n"
+                              "13.900: current none\n");
 }
 
 TEST(Trouble, AStallHoldsThePositionAndDropsNothing) {
@@ -180,6 +188,21 @@ TEST(TwoPlayers, OnlyTheNewestOneReportsHowAnItemEnds) {
                               "20.000: a played to its end\n"
                               "20.000: current none\n"
                               "20.000: rate 0\n");
+}
+
+TEST(TwoPlayers, AnEndInOneIsNoEndForTheOtherThatHoldsTheItem) {
+    Listening test;
+    auto a = test.item("a", 10s);
+    test.play({a});
+    auto old = test.player;
+    test.advance(4s);
+    test.play({a}, 3);
+    test.advance(2s); // the newest one has come to its end
+    EXPECT_EQ(a->currentTime().seconds(), 6.0);
+    old->removeItem(a);
+    test.play({a});
+    test.advance(1s);
+    EXPECT_EQ(a->currentTime().seconds(), 7.0);
 }
 
 TEST(TwoPlayers, TheOneBeforeDrivesWhatTheNewestLetsGo) {

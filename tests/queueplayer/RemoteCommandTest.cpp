@@ -40,6 +40,11 @@ TEST_F(RemoteCommandTest, PlayPauseAndToggleDoWhatTheySay) {
     tell(setRate("player", -1));
     EXPECT_EQ(press(Kind::togglePlayPause), Result::success);
     EXPECT_EQ(seen, "push queuePlayer.setRate identifier=player rate=0\n");
+    // A rate that counts as zero is no playing.
+    client->players->queuePlayerWithIdentifier("player")->setRate(1e-8F);
+    now();
+    EXPECT_EQ(press(Kind::togglePlayPause), Result::success);
+    EXPECT_EQ(seen, "push queuePlayer.setRate identifier=player rate=1\n");
 }
 
 TEST_F(RemoteCommandTest, FailWhereThereIsNothingToPauseOrTheSessionFails) {
