@@ -122,7 +122,7 @@ TEST_F(AssetStoriesTest, AFileThatDoesNotOpenChangesNothing) {
     device.sandboxExtensions.issue("token");
     EXPECT_EQ(
         tell(upsertAsset({.identifier = "a", .URL = "file:///gone.flac", .sandboxExtensionToken = "token"})),
-        "upsertWithMetaData: error 24\n");
+        "upsertWithMetaData: error 24 because: There is no such file.\n");
     EXPECT_EQ(client->assets->assetWithIdentifier("a"), before);
     EXPECT_EQ(device.sandboxExtensions.held(), 0u);
     EXPECT_THAT(errors(), ElementsAre(HasSubstr("Could not open audio file asset")));

@@ -59,11 +59,16 @@ public:
 private:
     std::string outcome(const std::optional<Data>& data, const std::optional<Error>& error) const {
         if (error)
-            return "error " + std::to_string(error->code);
+            return "error " + std::to_string(error->code) + reasonOf(*error);
         if (!data)
             return "nothing";
         auto payload = decode_(*data);
         return payload ? oneLine(payload->dictionaryRepresentation()) : "undecodable";
+    }
+
+    static std::string reasonOf(const Error& error) {
+        auto reason = error.userInfo.find(localizedFailureReasonKey);
+        return reason == error.userInfo.end() ? "" : " because: " + reason->second;
     }
 
     const std::shared_ptr<Transcript> transcript_;

@@ -17,6 +17,7 @@ namespace tarn {
 ///     push playerItem.setStatus identifier=song status=1
 ///     upsertWithAsset: status=1
 ///     getCurrentTime: error 26
+///     upsertWithMetaData: error 24 because: There is no such file.
 ///     destroy: no answer
 ///
 /// Any thread may call.
