@@ -101,6 +101,12 @@ void VLTorviAudioFileQueuePlayer::send(const VLProtoVelmoMessage& envelope) {
         audioServer_->sendData(envelope.serialize());
 }
 
+void VLTorviAudioFileQueuePlayer::close() {
+    for (auto* observer : {&statusObserver_, &rateObserver_, &currentItemObserver_})
+        (*observer)->stopObservingObject();
+    queuePlayer_->removeAllItems();
+}
+
 bool VLTorviAudioFileQueuePlayer::play() { return setRate(1); }
 
 bool VLTorviAudioFileQueuePlayer::pause() {

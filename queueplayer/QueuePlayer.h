@@ -41,6 +41,10 @@ public:
                         std::shared_ptr<VLTorviAudioFilePlayerItemManager> playerItemManager,
                         std::shared_ptr<VLTorviAudioFilePlayerAssetManager> assetManager);
 
+    /// The client is gone: there is nothing to play any more and nobody to tell, though a command or an
+    /// activation may still hold the player. Once.
+    void close();
+
     /// setRate(1).
     bool play();
 

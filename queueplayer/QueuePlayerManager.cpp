@@ -169,7 +169,7 @@ void VLTorviAudioFilePlayerQueuePlayerManager::close() {
     identifierToObjectMap_.close();
     for (const auto& made : made_.withLocked([](auto& players) { return std::exchange(players, {}); }))
         if (auto held = made.lock())
-            held->queuePlayer()->removeAllItems();
+            held->close();
 }
 
 std::shared_ptr<MediaQueuePlayer> VLTorviAudioFilePlayerQueuePlayerManager::queuePlayerWithIdentifier(

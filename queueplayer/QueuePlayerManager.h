@@ -41,9 +41,8 @@ public:
 
     void destroyQueuePlayerWithIdentifier(const std::string& identifier);
 
-    /// The client is gone. Any thread: lets every queue player go at once, also from under commands that
-    /// wait, and any that these make afterwards. What a command or an activation still holds has nothing to
-    /// play.
+    /// The client is gone. Any thread, once: lets every queue player go at once, also from under commands
+    /// that wait, and any that these make afterwards; closes what a command or an activation still holds.
     void close();
 
     /// Null when there is none, or no identifier.

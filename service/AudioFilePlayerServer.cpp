@@ -45,6 +45,7 @@ void VLTorviAudioFilePlayerServer::submit(SerialQueue& queue,
 }
 
 void VLTorviAudioFilePlayerServer::close() {
+    setAppConnction({}); // what the work still makes is no business of the next client
     // Made if need be: work that has not begun would make one that is not closed.
     queuePlayerManagerCreateIfNeeded()->close();
 }

@@ -32,7 +32,7 @@ public:
     void handleMessage(std::shared_ptr<VLProtoAudioFilePlayerMessage> message, std::shared_ptr<Reply> reply);
 
     /// The client is gone: its queue players go at once, though work that waits may keep the router and its
-    /// other objects for a while.
+    /// other objects for a while, and what that still makes reports to nobody. Once.
     void close();
 
     std::shared_ptr<VLTorviAudioFilePlayerAssetManager> assetManagerCreateIfNeeded();

@@ -60,6 +60,17 @@ TEST_P(LeavingClientTest, IsSilentAtOnceAndStaysSo) {
     EXPECT_EQ(device.media.speaker().outputs(), 0u);
 }
 
+TEST_P(LeavingClientTest, IsNotHeardOfByTheNextOne) {
+    device.audioSession.willActivate({.after = 10s});
+    send(commands::setRate(GetParam(), 2));
+    // What waits behind it makes objects for nobody.
+    send(commands::upsertPlayer("late", {"a"}));
+    client->hangUp();
+    SimulatedClient next(device.listeners);
+    device.scheduler.runUntilIdle();
+    EXPECT_TRUE(next.deliveries().empty());
+}
+
 INSTANTIATE_TEST_SUITE_P(TheRateThatWaits, LeavingClientTest, testing::Values("sounding", "other"));
 
 } // namespace
