@@ -73,5 +73,30 @@ TEST_P(LeavingClientTest, IsNotHeardOfByTheNextOne) {
 
 INSTANTIATE_TEST_SUITE_P(TheRateThatWaits, LeavingClientTest, testing::Values("sounding", "other"));
 
+// Of what it sent last, any part may have been handed over, begun or done when it leaves.
+TEST(LeavingClientsTest, AreSilentWhicheverOfTheirWorkHasBegun) {
+    CapturedLog log;
+    for (std::uint64_t seed = 1; seed <= 500; ++seed) {
+        SimulatedPlatform device(seed);
+        device.media.addFile("file:///a");
+        auto service = std::make_shared<VLLongFormAudioServer>(device.roles());
+        service->run();
+        SimulatedClient client(device.listeners);
+        for (const auto& command : {commands::upsertAsset({.identifier = "a", .URL = "file:///a"}),
+                                    commands::upsertItem("a", "a")}) {
+            client.send(commands::encoded(command));
+            device.scheduler.runReady();
+        }
+        device.audioSession.willActivate({});
+        device.audioSession.willActivate({.after = 10s});
+        for (const auto& command :
+             {commands::upsertPlayer("p", {"a"}), commands::setRate("p", 1), commands::setRate("p", 2)})
+            client.send(commands::encoded(command));
+        client.hangUp();
+        device.scheduler.runReady();
+        EXPECT_EQ(device.media.speaker().soundingOutputs(), 0u) << seed;
+    }
+}
+
 } // namespace
 } // namespace tarn
