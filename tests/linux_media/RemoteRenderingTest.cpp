@@ -155,6 +155,20 @@ TEST_F(RemoteRenderingTest, WhatTheFileDoesNotDeliverIsWaitedForByNobody) {
     EXPECT_EQ(item->status(), MediaStatus::readyToPlay);
 }
 
+TEST_F(RemoteRenderingTest, AnItemIsReadyWhenItsFileIsOpen) {
+    const auto slow = std::make_shared<StallingAsset>(100ms, 0s);
+    const auto item = makeItem(slow);
+    registrations.push_back(item->observe(MediaItem::statusKeyPath, [this](Observable&, const auto& change) {
+        if (std::get<std::int64_t>(change.at("new")) == static_cast<std::int64_t>(MediaStatus::readyToPlay))
+            events.add("ready");
+    }));
+    const auto player = engine.makeQueuePlayer({item});
+    slow->stalled.acquire();
+    EXPECT_EQ(item->status(), MediaStatus::unknown);
+    slow->answer();
+    EXPECT_TRUE(events.wait("ready")) << "though nobody plays it";
+}
+
 TEST_F(RemoteRenderingTest, AFileThatDoesNotAnswerInTimeFailsAndTheQueueGoesOn) {
     engine.renderings.limit = 50ms;
     for (const nanoseconds stall : {0ns, nanoseconds(375ms)}) {

@@ -44,6 +44,42 @@ TEST(Trouble, AQueueOfItemsThatCannotBePlayedRunsOut) {
     EXPECT_EQ(test.reports(), "0.000: current a\n0.000: a did not play to its end\n0.000: current none\n");
 }
 
+TEST(Trouble, AnItemThatTakesItsTimeToOpenIsReadyThen) {
+    Listening test;
+    MediaScript slow;
+    slow.duration = 3s;
+    slow.readyAfter = 2s;
+    MediaScript slowAndBad = unplayable();
+    slowAndBad.readyAfter = 4s;
+    auto a = test.item("a", slow), b = test.item("b", slowAndBad), c = test.item("c", slow);
+    test.play({a, b, c});
+    test.advance(1900ms);
+    EXPECT_EQ(a->status(), MediaStatus::unknown);
+    EXPECT_EQ(test.player->rate(), 1.0F) << "it plays as soon as it can";
+    EXPECT_EQ(a->currentTime().seconds(), 0.0);
+    EXPECT_EQ(test.reports(), "0.000: rate 1\n");
+    test.advance(8s);
+    EXPECT_EQ(test.reports(), "2.000: a ready\n"
+                              "4.000: b failed\n"
+                              "4.000: b did not play to its end\n"
+                              "5.000: a played to its end\n"
+                              "5.000: current c\n"
+                              "6.000: c ready\n"
+                              "9.000: c played to its end\n"
+                              "9.000: current none\n"
+                              "9.000: rate 0\n");
+    EXPECT_EQ(test.heard(), "2.000-5.000 a 0.000..3.000\n6.000-9.000 c 0.000..3.000\n");
+}
+
+TEST(Trouble, APausedItemThatCannotBeOpenedFailsWhenThatIsKnown) {
+    Listening test;
+    MediaScript slow = unplayable();
+    slow.readyAfter = 2s;
+    test.play({test.item("a", slow)}, 0);
+    test.advance(3s);
+    EXPECT_EQ(test.reports(), "2.000: a failed\n2.000: a did not play to its end\n2.000: current none\n");
+}
+
 TEST(Trouble, AFileThatBreaksIsHeardUpToThere) {
     Listening test;
     MediaScript script;

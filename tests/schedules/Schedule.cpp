@@ -22,7 +22,7 @@ Schedule::Schedule(std::uint64_t seed)
     : platform_(seed),
       mix_([this](std::size_t limit) { return random(limit); },
            {"file:///good", "file:///long", "file:///tagged", "file:///short", "file:///broken",
-            "file:///unplayable", "file:///stalling", "file:///missing"}),
+            "file:///unplayable", "file:///stalling", "file:///slow", "file:///missing"}),
       service_(std::make_shared<VLLongFormAudioServer>(platform_.roles())) {
     addFiles();
 }
@@ -38,6 +38,7 @@ void Schedule::addFiles() {
     add("file:///broken", {.duration = 4s, .breaksAt = 1s});
     add("file:///unplayable", {.unplayable = Error{"test", 1, {}}});
     add("file:///stalling", {.duration = 4s, .stalls = {{1s, 3s}}});
+    add("file:///slow", {.duration = 4s, .readyAfter = 2s});
 }
 
 std::vector<std::string> Schedule::run() {

@@ -61,8 +61,9 @@ void CoreMediaItem::seekToTime(MediaTime time) {
 void CoreMediaItem::becomeReady() {
     {
         EngineLock lock(environment_);
-        if (std::exchange(state_.status, MediaStatus::readyToPlay) == MediaStatus::readyToPlay)
+        if (state_.status != MediaStatus::unknown)
             return;
+        state_.status = MediaStatus::readyToPlay;
     }
     reportStatus();
 }

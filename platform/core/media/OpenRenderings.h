@@ -23,6 +23,9 @@ public:
     /// Returns why it cannot be rendered, if so. There is a place: keepOnly() has been called.
     std::optional<Error> open(EntryId entry, const std::shared_ptr<MediaAsset>& asset);
 
+    /// How far open() has come with it.
+    Opening opening(EntryId entry) { return find(entry)->rendering->opening(); }
+
     /// Closes what is neither of the two.
     void keepOnly(EntryId first, EntryId second);
 

@@ -136,17 +136,11 @@ bool Playback::openPlace(std::size_t index) {
     auto both = places();
     renderings_.keepOnly(both[0].entry, both[1].entry);
     const Place& place = both.at(index);
-    if (!place.item || renderings_.has(place.entry))
+    if (!place.item)
         return true;
-    std::optional<Error> error = place.item->error();
+    const auto error = open(place);
     if (!error)
-        error = renderings_.open(place.entry, place.item->asset());
-    if (!error) {
-        place.item->becomeReady();
-        if (!output_)
-            environment_.outputs.prepare();
         return true;
-    }
     std::optional<PlayQueue::Ending> ending;
     {
         EngineLock lock(environment_);
@@ -155,6 +149,23 @@ bool Playback::openPlace(std::size_t index) {
     if (ending)
         report(*ending);
     return false;
+}
+
+/// The item is ready as soon as it is open, which may be later. Returns why it cannot be played, if so.
+std::optional<Error> Playback::open(const Place& place) {
+    if (!renderings_.has(place.entry)) {
+        auto error = place.item->error();
+        if (!error)
+            error = renderings_.open(place.entry, place.item->asset());
+        if (error)
+            return error;
+        if (!output_)
+            environment_.outputs.prepare();
+    }
+    Opening opening = renderings_.opening(place.entry);
+    if (opening.done && !opening.error)
+        place.item->becomeReady();
+    return std::move(opening.error);
 }
 
 /// What sounds is again what is to be heard; false when nothing is to sound.

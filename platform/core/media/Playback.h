@@ -3,6 +3,7 @@
 #include <array>
 #include <cstddef>
 #include <memory>
+#include <optional>
 
 #include "platform/core/LiveObjects.h"
 #include "platform/core/media/EndTimer.h"
@@ -62,6 +63,7 @@ private:
     void report(const PlayQueue::Ending& ending);
     std::array<Place, 2> places();
     bool openPlace(std::size_t index);
+    std::optional<Error> open(const Place& place);
     bool prepareOutput();
     bool renderPiece();
     void append(const PlayQueue::Head& head, RenderedSpan span);

@@ -33,6 +33,12 @@ struct RenderedSpan {
     std::optional<Error> error;
 };
 
+/// How far the opening of an item has come.
+struct Opening {
+    bool done = true;
+    std::optional<Error> error; ///< why the item cannot be rendered; it is done then, too
+};
+
 /// One item on its way to becoming output frames: decoding, conversion and time-stretching behind one
 /// interface.
 ///
@@ -40,6 +46,9 @@ struct RenderedSpan {
 class Rendering {
 public:
     virtual ~Rendering() = default;
+
+    /// Until it is done render() answers `waiting`, and the factory's `goesOn` is called when it is.
+    virtual Opening opening() const { return {}; }
 
     /// Goes on exactly at `position` of the media (clamped to its length) with the playback rate `rate`
     /// (finite, never 0; below 0 is backwards), in frames of `format`. Precedes the first render(), and comes
@@ -62,9 +71,10 @@ public:
 
     virtual ~RenderingFactory() = default;
 
-    /// Opens `asset`, which makes its item ready to play; nothing is decoded for the ear yet. `goesOn` is
-    /// called on the player thread, outside render(), each time that a rendering which answered `waiting` has
-    /// more; never after the rendering's end.
+    /// Opens `asset`, or begins to: its item is ready to play when opening() is done. Nothing is decoded for
+    /// the ear yet. `goesOn` is called on the player thread, outside render(), when the opening is done if it
+    /// was not, and each time that a rendering which answered `waiting` has more; never after the rendering's
+    /// end.
     virtual Outcome open(const std::shared_ptr<MediaAsset>& asset, std::function<void()> goesOn) = 0;
 };
 

@@ -31,7 +31,7 @@ public:
         PcmFormat format;
     };
     struct Hold {
-        std::optional<Error> openingError;
+        Opening opening;
         std::optional<nanoseconds> busySince; ///< when the call in progress began
     };
 
@@ -50,7 +50,7 @@ public:
 
     Hold hold() {
         std::lock_guard lock(mutex_);
-        return {openingError_, busySince_};
+        return {opening_, busySince_};
     }
 
 private:
@@ -77,17 +77,19 @@ private:
     bool filling_ = true;   // until there are enough of them
     bool complete_ = false; // nothing follows them
     bool wanted_ = false;   // the player waits for the next one
-    std::optional<Error> openingError_;
+    Opening opening_{.done = false, .error = std::nullopt};
     std::optional<nanoseconds> busySince_;
 };
 
 void RemoteRendering::Worker::run(const std::function<RenderingFactory::Outcome()>& open) {
     const RenderingFactory::Outcome outcome = open(); // goes on this thread too, which may take its time
     std::unique_lock lock(mutex_);
-    if (!outcome.rendering) {
-        openingError_ = outcome.error.value_or(Error{});
-        return tell();
-    }
+    opening_.done = true;
+    if (!outcome.rendering)
+        opening_.error = outcome.error.value_or(Error{});
+    tell();
+    if (opening_.error)
+        return;
     for (;;) {
         busySince_.reset();
         changed_.wait(lock, [this] { return closed_ || hasWork(); });
@@ -206,6 +208,8 @@ RemoteRendering::RemoteRendering(PlayerLoop& loop, std::shared_ptr<Worker> worke
 
 RemoteRendering::~RemoteRendering() { worker_->close(); }
 
+Opening RemoteRendering::opening() const { return worker_->hold().opening; }
+
 void RemoteRendering::seek(nanoseconds position, float rate, const PcmFormat& format) {
     position_ = std::clamp(position, 0ns, options_.length.value_or(nanoseconds::max()));
     worker_->seek({position_, rate, format});
@@ -223,9 +227,9 @@ RenderedSpan RemoteRendering::render(PcmBuffer& buffer, std::size_t maxFrames) {
     const Worker::Hold hold = worker_->hold();
     const nanoseconds now = loop_.now();
     const nanoseconds late = hold.busySince.value_or(now) + options_.limit;
-    if (hold.openingError || now >= late) {
+    if (hold.opening.error || now >= late) {
         nothing.state = RenderedSpan::State::failed;
-        nothing.error = hold.openingError.value_or(
+        nothing.error = hold.opening.error.value_or(
             mediaError(MediaErrorCode::timedOut, "The file did not answer in time."));
     } else {
         nothing.state = RenderedSpan::State::waiting;

@@ -25,6 +25,7 @@ public:
 
     ~RemoteRendering() override;
 
+    Opening opening() const override;
     void seek(std::chrono::nanoseconds position, float rate, const PcmFormat& format) override;
     RenderedSpan render(PcmBuffer& buffer, std::size_t maxFrames) override;
 

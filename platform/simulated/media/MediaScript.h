@@ -29,7 +29,10 @@ struct MediaScript {
     /// Opens only while the right that this token gave is held.
     std::optional<std::string> token{};
 
-    /// The asset opens, but its items cannot be played.
+    /// How long it takes to open an item, until it is ready to play.
+    std::chrono::nanoseconds readyAfter{0};
+
+    /// The asset opens, but its items cannot be played, as is known when they would be ready.
     std::optional<Error> unplayable{};
 
     /// Playing cannot get past this position.

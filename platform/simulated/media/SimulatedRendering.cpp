@@ -14,6 +14,19 @@ SimulatedRendering::SimulatedRendering(std::shared_ptr<SimulatedMediaAsset> asse
     : asset_(std::move(asset)), loop_(loop), goesOn_(std::move(goesOn)) {
     for (const MediaScript::Stall& stall : asset_->script().stalls)
         stalls_.push_back({stall, nullptr});
+    if (asset_->script().readyAfter <= std::chrono::nanoseconds(0))
+        return;
+    isOpen_ = false;
+    openingTimer_ = loop_.at(loop_.now() + asset_->script().readyAfter, [this] {
+        isOpen_ = true;
+        goesOn_();
+    });
+}
+
+Opening SimulatedRendering::opening() const {
+    if (!isOpen_)
+        return {.done = false, .error = std::nullopt};
+    return {.done = true, .error = asset_->script().unplayable};
 }
 
 void SimulatedRendering::seek(std::chrono::nanoseconds position, float rate, const PcmFormat&) {
@@ -56,6 +69,11 @@ void SimulatedRendering::meet(Stall& stall) {
 RenderedSpan SimulatedRendering::render(PcmBuffer& buffer, std::size_t maxFrames) {
     RenderedSpan span;
     span.start = position();
+    if (!isOpen_) {
+        span.end = span.start;
+        span.state = RenderedSpan::State::waiting;
+        return span;
+    }
     Obstacle obstacle = nextObstacle();
     auto distance = static_cast<double>((obstacle.position - origin_).count());
     double frames = std::ceil(distance / (rate_ * static_cast<double>(simulatedFrame.count()))) - rendered_;
@@ -83,8 +101,6 @@ RenderedSpan SimulatedRendering::render(PcmBuffer& buffer, std::size_t maxFrames
 RenderingFactory::Outcome SimulatedRenderingFactory::open(const std::shared_ptr<MediaAsset>& asset,
                                                           std::function<void()> goesOn) {
     auto simulated = std::static_pointer_cast<SimulatedMediaAsset>(asset);
-    if (const auto& error = simulated->script().unplayable)
-        return {nullptr, *error};
     return {std::make_unique<SimulatedRendering>(std::move(simulated), loop_, std::move(goesOn)),
             std::nullopt};
 }

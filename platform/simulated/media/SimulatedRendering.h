@@ -16,6 +16,7 @@ public:
     SimulatedRendering(std::shared_ptr<SimulatedMediaAsset> asset, PlayerLoop& loop,
                        std::function<void()> goesOn);
 
+    Opening opening() const override;
     void seek(std::chrono::nanoseconds position, float rate, const PcmFormat& format) override;
     RenderedSpan render(PcmBuffer& buffer, std::size_t maxFrames) override;
 
@@ -40,6 +41,8 @@ private:
     const std::shared_ptr<SimulatedMediaAsset> asset_;
     PlayerLoop& loop_;
     const std::function<void()> goesOn_;
+    bool isOpen_ = true;
+    RegistrationHandle openingTimer_;
     std::vector<Stall> stalls_;
     std::chrono::nanoseconds origin_{0};
     double rate_ = 1;
