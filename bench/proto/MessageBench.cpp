@@ -84,6 +84,7 @@ const Mix& mix() {
 template <class Library, class Message>
 std::vector<typename Library::template Held<Message>> decodeAll(const std::vector<Data>& encoded) {
     std::vector<typename Library::template Held<Message>> messages;
+    messages.reserve(encoded.size());
     for (const Data& bytes : encoded)
         messages.push_back(Library::template decode<Message>(bytes));
     return messages;

@@ -56,6 +56,7 @@ int compareWithPeers(int argc, char** argv, std::span<const Goal> goals) {
     std::vector<std::string> defaults{argv[0], "--benchmark_repetitions=15", "--benchmark_min_time=0.02",
                                       "--benchmark_enable_random_interleaving=true"};
     std::vector<char*> arguments;
+    arguments.reserve(defaults.size());
     for (auto& argument : defaults)
         arguments.push_back(argument.data());
     arguments.insert(arguments.end(), argv + 1, argv + argc); // what the caller says wins

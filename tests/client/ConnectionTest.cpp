@@ -126,6 +126,7 @@ TEST(AConnection, ServesManyCallingThreads) {
     std::atomic<int> answered = 0;
     {
         std::vector<std::jthread> callers;
+        callers.reserve(threads);
         for (int i = 0; i < threads; ++i)
             callers.emplace_back([&] {
                 for (int k = 0; k < calls; ++k)

@@ -12,19 +12,28 @@ public:
     void receiveData(std::vector<ReceivedCall> calls) override {
         for (auto& call : calls) {
             const std::string body(call.data.begin(), call.data.end());
-            {
-                std::lock_guard lock(service_.mutex_);
-                ++service_.callCount_;
-                if (!service_.answer_)
-                    service_.kept_.push_back(std::move(call));
-            }
-            if (service_.answer_)
+            if (service_.answer_) {
+                count();
                 service_.answer_(std::move(call));
+            } else {
+                keep(std::move(call));
+            }
             service_.note("call " + body);
         }
     }
 
 private:
+    void count() {
+        std::lock_guard lock(service_.mutex_);
+        ++service_.callCount_;
+    }
+
+    void keep(ReceivedCall call) {
+        std::lock_guard lock(service_.mutex_);
+        ++service_.callCount_;
+        service_.kept_.push_back(std::move(call));
+    }
+
     FakeService& service_;
 };
 

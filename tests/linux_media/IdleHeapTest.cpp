@@ -33,7 +33,7 @@ public:
 
 private:
     const std::string URL_;
-    const std::vector<MediaMetadataItem> metadata_;
+    const std::vector<MediaMetadataItem> metadata_{};
 };
 
 TEST(IdleHeap, IsTidiedOnlyWhenTheLastAssetHasGone) {

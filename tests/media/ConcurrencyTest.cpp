@@ -89,6 +89,7 @@ TEST_P(SeededPlayer, SaysWhatIsHeard) {
     Meddler meddler(scheduler.random(1U << 30), items, test.platform.audioSession,
                     test.platform.notifications, test.platform.media.speaker());
     std::vector<std::shared_ptr<SimulatedQueue>> threads;
+    threads.reserve(3);
     for (int i = 0; i < 3; ++i)
         threads.push_back(scheduler.createQueue("thread"));
     for (int round = 0; round < 60; ++round) {
@@ -131,6 +132,7 @@ TEST(Threads, ShareItemsAndPlayers) {
         engine.addFile("file", script);
         auto asset = engine.openAsset("file").asset;
         std::vector<std::shared_ptr<MediaItem>> items;
+        items.reserve(6);
         for (int i = 0; i < 6; ++i)
             items.push_back(engine.makeItem(asset));
         auto meddle = [&](std::uint64_t seed) {

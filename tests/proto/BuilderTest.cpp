@@ -129,7 +129,7 @@ private:
 /// Of an item; that of a queue player in the same state is the same.
 auto statusOf(MediaStatus status, const std::optional<Error>& error,
               const std::optional<std::string>& identifier = "a") {
-    const auto ofItem =
+    auto ofItem =
         VLProtoAudioFilePlayerStatus::statusMessageFromPlayerItem(FixedItem(status, error), identifier);
     const auto ofPlayer =
         VLProtoAudioFilePlayerStatus::statusMessageFromPlayer(FixedPlayer(status, error), identifier);

@@ -49,7 +49,7 @@ TEST(PropertyList, IsReadByAnIndependentReader) {
     for (const auto& list : lists) {
         std::string expected;
         for (const auto& [key, value] : list)
-            expected += key + "=" + value + "\n";
+            expected.append(key).append("=").append(value).append("\n");
         const auto outcome = binaryPropertyList(list);
         ASSERT_TRUE(outcome.data);
         EXPECT_EQ(readByPython(*outcome.data), expected);

@@ -95,7 +95,7 @@ TYPED_TEST(ServiceStory, EveryCallEndsOnceAndInOrderPerManager) {
         world.settle();
         auto outcomes = this->outcomes(client, 10);
         ASSERT_EQ(outcomes.size(), 10u);
-        for (std::size_t i = 0; i < 10; i += 5)
+        for (std::ptrdiff_t i = 0; i < 10; i += 5)
             EXPECT_THAT(std::vector(outcomes.begin() + i, outcomes.begin() + i + 5),
                         ElementsAre("error 26", "error 26", "error 24", "released", "released"));
         std::map<bool, std::uint64_t> last; // by manager queue
@@ -180,7 +180,7 @@ TYPED_TEST(ServiceStory, ALateAnswerGoesToTheConnectionThatItsCallCameFrom) {
 }
 
 TYPED_TEST(ServiceStory, AClientThatIsBackAtOnceIsServed) {
-    this->inEveryWorld([this](auto& world) {
+    this->inEveryWorld([](auto& world) {
         for (int round = 0; round < 3; ++round) {
             SimulatedClient ghost(world.listeners());
             ghost.call(commands::encoded(commands::getCurrentTime("unknown")));

@@ -30,7 +30,7 @@ TEST(HostileClients, WhoSplitsFramesAtEveryByteIsAnsweredAllTheSame) {
     ServiceUnderTest service;
     auto client = service.connectRaw();
     Data stream;
-    for (const std::uint64_t id : {1, 2, 3}) {
+    for (const std::uint64_t id : {1U, 2U, 3U}) {
         const auto query = positionQuery(id);
         stream.insert(stream.end(), query.begin(), query.end());
     }
