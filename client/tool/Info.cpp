@@ -13,11 +13,11 @@ namespace {
 
 void printLine(const char* name, const std::optional<std::string>& text) {
     if (text && !text->empty())
-        std::cout << "  " << name << fitColumns(*text, static_cast<int>(text->size())) << "\n";
+        std::cout << "  " << name << printable(*text) << "\n";
 }
 
 void print(const Track& track) {
-    std::cout << track.path << "\n";
+    std::cout << printable(track.path) << "\n";
     printLine("title     ", track.info.title);
     printLine("artist    ", track.info.artist);
     printLine("album     ", track.info.albumTitle);
@@ -46,7 +46,7 @@ int runInfo(const InfoOptions& options) {
     const auto tracks = openTracks(client, options.paths, options.access,
                                    [&](const std::string& path, const std::string& reason) {
                                        status = 1;
-                                       std::cerr << "tarnctl: " << path << ": " << reason << "\n";
+                                       std::cerr << "tarnctl: " << printable(path) << ": " << reason << "\n";
                                    });
     for (const auto& track : tracks)
         options.asJSON ? printJSON(track) : print(track);

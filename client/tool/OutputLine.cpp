@@ -1,9 +1,12 @@
 #include "client/tool/OutputLine.h"
 
+#include <algorithm>
 #include <array>
 #include <charconv>
 #include <cmath>
 #include <type_traits>
+
+#include "platform/core/Utf8.h"
 
 namespace tarn::tool {
 
@@ -12,14 +15,18 @@ namespace {
 std::string inQuotes(std::string_view text) {
     constexpr std::string_view digits = "0123456789abcdef";
     std::string out = "\"";
-    for (const char character : text) {
-        const auto code = static_cast<unsigned char>(character);
-        if (character == '"' || character == '\\')
-            out.append({'\\', character});
+    while (!text.empty()) {
+        const auto length = utf8CharacterLength(text);
+        const auto code = static_cast<unsigned char>(text.front());
+        if (length == 0) // as in the name of a file, which may be any bytes
+            out.append("\\ufffd");
+        else if (code == '"' || code == '\\')
+            out.append({'\\', text.front()});
         else if (code < 0x20 || code == 0x7F)
             out.append("\\u00").append({digits[code >> 4U], digits[code & 0xFU]});
         else
-            out += character;
+            out.append(text.substr(0, length));
+        text.remove_prefix(std::max<std::size_t>(length, 1));
     }
     return out + "\"";
 }

@@ -99,8 +99,9 @@ private:
         const auto player = client_.upsertQueuePlayer(playerIdentifier, items).get();
         if (player.outcome != client::Outcome::answered)
             return fail("cannot play: " + player.problem());
-        if (options_.from > 0)
-            client_.setCurrentTime(items.front(), options_.from).wait();
+        const bool fromTheEnd = options_.rate < 0 && options_.from == 0;
+        if (const auto from = fromTheEnd ? tracks_.front().info.duration : options_.from; from > 0)
+            client_.setCurrentTime(items.front(), from).wait();
         starting_ = client_.setRate(playerIdentifier, options_.rate);
         return true;
     }
@@ -157,6 +158,11 @@ private:
     }
 
     void takeRate(float rate) {
+        const bool wentBack = rate_ < 0 && rate == 0;
+        if (wentBack)
+            readPosition();
+        if (wentBack && position_ == 0)
+            return stop("Played back to the start.", status_);
         if (!terminal_.isLive() && rate == 0 && rate_ != 0 && current_ != nullptr)
             std::cout << "Paused at " << timeText(position_) << "." << std::endl;
         rate_ = rate;
@@ -175,8 +181,8 @@ private:
         if (current_ == nullptr && had)
             stop(status_ == 0 ? "Played everything." : "Stopped at the end.", status_);
         else if (current_ != nullptr && !terminal_.isLive())
-            std::cout << "Playing " << current_->title() << " (" << timeText(current_->info.duration) << ")"
-                      << std::endl;
+            std::cout << "Playing " << printable(current_->title()) << " ("
+                      << timeText(current_->info.duration) << ")" << std::endl;
         position_ = 0;
     }
 
@@ -260,7 +266,7 @@ private:
 
     bool fail(const std::string& problem) {
         clearLine();
-        std::cerr << "tarnctl: " << problem << "\n";
+        std::cerr << "tarnctl: " << printable(problem) << "\n";
         status_ = 1;
         return false;
     }

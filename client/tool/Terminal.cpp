@@ -3,6 +3,7 @@
 #include <sys/ioctl.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <array>
 #include <cstdlib>
 #include <cstring>
@@ -103,6 +104,18 @@ std::vector<Key> Terminal::readKeys() const {
         rest.remove_prefix(length);
     }
     return pressed;
+}
+
+std::string printable(std::string_view text) {
+    std::string out;
+    while (!text.empty()) {
+        const auto length = utf8CharacterLength(text);
+        const auto value = length == 0 ? U'\0' : utf8CharacterValue(text, length);
+        const bool controls = value < 0x20 || (value >= 0x7F && value < 0xA0);
+        out += controls ? "?" : text.substr(0, length);
+        text.remove_prefix(std::max<std::size_t>(length, 1));
+    }
+    return out;
 }
 
 int columnsOf(const std::string& text) {

@@ -1,6 +1,8 @@
 #include <CLI/CLI.hpp>
 
 #include <clocale>
+#include <cmath>
+#include <cstdlib>
 #include <exception>
 #include <iostream>
 #include <string>
@@ -41,6 +43,16 @@ std::string checkTime(const std::string& text) {
     return parseTime(text) ? "" : "a time is given as SECONDS, MINUTES:SECONDS or HOURS:MINUTES:SECONDS";
 }
 
+/// Accepts every rate that something is heard at.
+std::string checkRate(const std::string& text) {
+    char* end = nullptr;
+    const double rate = std::strtod(text.c_str(), &end);
+    const bool isNumber = !text.empty() && *end == '\0';
+    return isNumber && std::abs(rate) <= 4 && rate != 0
+               ? ""
+               : "a rate is a number from 0.25 to 4, or from -0.25 to -4 to play backwards";
+}
+
 struct Options {
     std::string socketPath = tarn::client::defaultSocketPath();
     PlayOptions play;
@@ -54,8 +66,9 @@ struct Options {
 CLI::App* addPlay(CLI::App& app, Options& options) {
     auto* play = app.add_subcommand("play", "Plays files one after the other.");
     play->footer(playHelp);
-    play->add_option("--rate", options.play.rate, "How fast: 1 as recorded, 0.25 to 4, below 0 backwards")
-        ->check(CLI::Range(-4.0, 4.0))
+    play->add_option("--rate", options.play.rate,
+                     "How fast: 1 as recorded, 0.25 to 4; below 0 backwards, one file")
+        ->check(checkRate, "RATE")
         ->capture_default_str();
     play->add_option("--from", options.from, "Where to begin in the first file: SECONDS or MINUTES:SECONDS")
         ->check(checkTime, "TIME");
@@ -103,6 +116,10 @@ int main(int argc, char** argv) {
     options.play.socketPath = options.info.socketPath = options.send.socketPath = options.socketPath;
     options.play.access = options.info.access = options.grant ? Access::granted : Access::service;
     options.play.from = *parseTime(options.from);
+    if (options.play.rate < 0 && options.play.paths.size() > 1) {
+        std::cerr << "tarnctl: only one file can be played backwards\n";
+        return 2;
+    }
     options.info.asJSON = options.asJSON;
     options.send.format = options.asJSON ? LineFormat::JSON : LineFormat::text;
     try {

@@ -76,16 +76,16 @@ TEST(DecodeEnvelope, NamesTheEventAndShowsAnErrorsTexts) {
 
 TEST(OutputLine, IsOneLineWhateverTheTextsHold) {
     Dictionary fields;
-    fields["text"].value = std::string("a\n\"b\" \\ \x01");
+    fields["text"].value = std::string("a\n\"b\" \\ \x01\xFFü");
     fields["number"].value = 0.1;
     fields["whole"].value = std::int64_t{-3};
     fields["bytes"].value = Data{0, 0xAB};
     fields["list"].value = DictionaryList{{std::string("x")}, {std::int32_t{1}}};
     EXPECT_EQ(
         outputLine(LineFormat::JSON, "answer", fields),
-        R"({"type":"answer","bytes":"00ab","list":["x",1],"number":0.1,"text":"a\u000a\"b\" \\ \u0001","whole":-3})");
+        R"({"type":"answer","bytes":"00ab","list":["x",1],"number":0.1,"text":"a\u000a\"b\" \\ \u0001\ufffdü","whole":-3})");
     EXPECT_EQ(outputLine(LineFormat::text, "answer", fields),
-              R"(answer bytes="00ab" list=["x",1] number=0.1 text="a\u000a\"b\" \\ \u0001" whole=-3)");
+              R"(answer bytes="00ab" list=["x",1] number=0.1 text="a\u000a\"b\" \\ \u0001\ufffdü" whole=-3)");
     EXPECT_THAT(describeCommands(),
                 HasSubstr("queuePlayer.upsertWithItems identifier= playerItemIdentifiers="));
 }

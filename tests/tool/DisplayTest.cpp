@@ -50,5 +50,10 @@ TEST(FitColumns, NeverLetsATitleCommandTheTerminal) {
     EXPECT_EQ(fitColumns("abc", 1), "…");
 }
 
+TEST(Printable, IsOneLineThatCommandsNothingAndCutsNothing) {
+    EXPECT_EQ(printable("a\x1b[2Jb\n\xFF\x7F\u009B c"), "a?[2Jb???? c");
+    EXPECT_EQ(printable("音楽 é"), "音楽 é");
+}
+
 } // namespace
 } // namespace tarn::tool
