@@ -40,7 +40,8 @@ void VLTorviAudioFilePlayerServer::submit(SerialQueue& queue,
                                           std::shared_ptr<VLProtoAudioFilePlayerMessage> message,
                                           std::shared_ptr<Reply> reply) {
     queue.async([self = shared_from_this(), message = std::move(message), reply = std::move(reply)] {
-        ((*self).*managerCreateIfNeeded)()->handleMessage(((*message).*part)(), std::move(*reply));
+        ((*self).*managerCreateIfNeeded)()->handleMessage(((*message).*part)(),
+                                                          reply ? std::move(*reply) : Reply());
     });
 }
 

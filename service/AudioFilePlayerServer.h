@@ -28,7 +28,7 @@ public:
     ~VLTorviAudioFilePlayerServer();
 
     /// On the command queue. Returns as soon as the work is submitted. A message without a part that can be
-    /// routed, or none at all, is dropped: its reply goes unanswered.
+    /// routed, or none at all, is dropped: its reply goes unanswered. Both may be null.
     void handleMessage(std::shared_ptr<VLProtoAudioFilePlayerMessage> message, std::shared_ptr<Reply> reply);
 
     /// The client is gone: its queue players go at once, though work that waits may keep the router and its

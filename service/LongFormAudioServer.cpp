@@ -136,6 +136,7 @@ void VLLongFormAudioServer::_setConnectionIsValid(bool isValid) {
 }
 
 void VLLongFormAudioServer::_enqueueAudioCommand(std::shared_ptr<const VLLongFormAudioCommand> command) {
+    assert(platform_.queues.main().isCurrent());
     commandServiceQueue_->async(
         [self = shared_from_this(), command = std::move(command)] { self->runCommand(*command); });
 }

@@ -71,6 +71,13 @@ TEST_F(RouterTest, OnlyTheFirstPartOfAMessageIsServed) {
     EXPECT_THAT(log.errors(), testing::ElementsAre(testing::HasSubstr("QueuePlayerManager")));
 }
 
+TEST_F(RouterTest, AMessageWithoutAWayToAnswerIsServed) {
+    CapturedLog log;
+    router_->handleMessage(commands::getCurrentTime("unknown"), nullptr);
+    platform_.scheduler.runReady();
+    EXPECT_THAT(log.errors(), testing::ElementsAre(testing::HasSubstr("unknown")));
+}
+
 // The managers' slots are filled from two queues.
 TEST(RouterRaceTest, ManagersMadeAtTheSameTimeAreOneOfAKindAndLinked) {
     constexpr int rounds = 2'000;
