@@ -135,6 +135,19 @@ TEST(SocketListener, EndsABrokenStreamWithOneLineAndServesTheOthers) {
     EXPECT_TRUE(good.receive());
 }
 
+TEST(SocketListener, LooksAtNothingBehindAnExtensionThatCannotBeDecoded) {
+    TestServer server(echo);
+    auto client = server.connect();
+    Data stream; // in one write, and so in one read
+    appendFrame(stream, FrameKind::call, 0, bytes("before"));
+    appendFrame(stream, FrameKind::extension, 0, bytes("?"));
+    appendFrame(stream, FrameKind::call, 0, bytes("behind"));
+    ASSERT_TRUE(client.sendWithFiles(stream, {STDERR_FILENO}));
+    EXPECT_TRUE(client.isCutOff());
+    EXPECT_THAT(server.service.journalOf(3), ElementsAre("offered", "call before", "interrupted"));
+    EXPECT_THAT(server.log.errors(), ElementsAre(HasSubstr("cannot be decoded")));
+}
+
 TEST(SocketListener, ClosesEveryFileThatAClientSends) {
     TestServer server(echo);
     server.connect().hangUp();

@@ -78,6 +78,8 @@ void SocketConnection::deliver(std::vector<Frame> frames) {
     for (auto& frame : frames) {
         if (frame.kind == FrameKind::extension) {
             takeExtension(std::move(frame));
+            if (loss_ == Loss::interruption)
+                break; // what came behind it is not looked at
             continue;
         }
         auto callback = std::make_unique<CallAnswer>(socket_, frame.callId, frame.body.size());
