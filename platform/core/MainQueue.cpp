@@ -1,5 +1,6 @@
 #include "platform/core/MainQueue.h"
 
+#include <cassert>
 #include <utility>
 
 #include "platform/core/QueueFrame.h"
@@ -32,12 +33,13 @@ bool MainQueue::isCurrent() const { return QueueFrame::isInnermost(this); }
 
 void MainQueue::runLoop() {
     std::unique_lock lock(mutex_);
-    while (!ended_ || isLent_) {
-        if (line_.empty() || isLent_) {
+    while (!ended_) {
+        if (line_.empty()) {
             waits_ = true;
             lock.unlock();
             wake_.acquire();
             lock.lock();
+            assert(!waits_ && !isLent_); // whoever holds the queue wakes nobody before it is back
             continue;
         }
         auto work = std::move(line_.front());
