@@ -95,8 +95,14 @@ public:
     }
 
     void reconnect() {
-        events_.clear();
-        connection_.reconnect();
+        connection_.disconnect(); // from here on no more events come of it
+        events_.begin();
+        try {
+            connection_.reconnect();
+        } catch (...) {
+            events_.end();
+            throw;
+        }
     }
 
     EventQueue& events() { return events_; }

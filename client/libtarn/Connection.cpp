@@ -80,8 +80,14 @@ public:
 
     ~Implementation() { disconnect(); }
 
+    void disconnect() {
+        std::lock_guard lock(changing_);
+        close();
+    }
+
     void reconnect() {
-        disconnect();
+        std::lock_guard lock(changing_);
+        close();
         connect();
     }
 
@@ -130,7 +136,7 @@ private:
         thread_ = std::thread([this] { run(); });
     }
 
-    void disconnect() {
+    void close() {
         assert(thread_.get_id() != std::this_thread::get_id());
         {
             std::lock_guard lock(state_);
@@ -195,10 +201,11 @@ private:
     const SocketAddress address_;
     const std::string path_;
 
-    std::mutex writing_; // held for one frame; taken before state_
+    std::mutex changing_; // held while the connection is ended and made; taken before the others
+    std::mutex writing_;  // held for one frame; taken before state_
     FileDescriptor socket_;
 
-    mutable std::mutex state_; // guards what follows, up to the thread
+    mutable std::mutex state_; // guards what follows, up to the next blank line
     bool connected_ = false;
     bool closing_ = false; // by the program: no loss to tell of
     std::uint64_t nextCallId_ = 1;
@@ -225,6 +232,8 @@ bool Connection::grant(const std::string& token, const std::string& path, int fi
 }
 
 bool Connection::isConnected() const { return implementation_->isConnected(); }
+
+void Connection::disconnect() { implementation_->disconnect(); }
 
 void Connection::reconnect() { implementation_->reconnect(); }
 

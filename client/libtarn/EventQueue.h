@@ -22,7 +22,7 @@ public:
         if (events_.size() == mostEvents)
             events_.pop_front();
         events_.push_back(std::move(event));
-        changed_.notify_one();
+        changed_.notify_all(); // it may be the last one
     }
 
     /// None when the time came first, or when the last event was ConnectionLost.
@@ -40,10 +40,18 @@ public:
         return event;
     }
 
-    void clear() {
+    /// For a new connection: drops what waits.
+    void begin() {
         std::lock_guard lock(mutex_);
         events_.clear();
         ended_ = false;
+    }
+
+    /// There is no connection after all: whoever waits gets none.
+    void end() {
+        std::lock_guard lock(mutex_);
+        ended_ = true;
+        changed_.notify_all();
     }
 
 private:

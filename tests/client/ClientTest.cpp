@@ -5,6 +5,7 @@
 
 #include <chrono>
 #include <future>
+#include <system_error>
 
 #include "proto/AudioFilePlayerCurrentTime.h"
 #include "proto/Envelope.h"
@@ -88,6 +89,32 @@ TEST(AClient, HandsOutEventsInOrderUntilTheConnectionIsLost) {
     EXPECT_EQ(std::get<client::ItemPlayedToEnd>(*client.nextEvent()).item, "b");
     EXPECT_TRUE(std::holds_alternative<client::ConnectionLost>(*client.nextEvent()));
     EXPECT_EQ(client.nextEvent(), std::nullopt);
+}
+
+TEST(AClient, StartsAfreshWhenItConnectsAnew) {
+    FakeService* service = nullptr;
+    TestServer server([&](ReceivedCall) { // tells an event, and then that the command is done with
+        service->connection()->remoteObjectProxy().receiveData(itemEnded("old"));
+    });
+    service = &server.service;
+    Client client;
+    ASSERT_EQ(client.destroyAsset("none").get().outcome, Outcome::released);
+    client.reconnect();
+    EXPECT_EQ(client.nextEvent(1ms), std::nullopt);
+    server.service.journalOf(3);
+    server.service.connection()->remoteObjectProxy().receiveData(itemEnded("new"));
+    EXPECT_EQ(std::get<client::ItemPlayedToEnd>(*client.nextEvent()).item, "new");
+}
+
+// Nothing that waits for an event may wait for ever.
+TEST(AClient, HasNoEventsWhileThereIsNoConnection) {
+    auto server = std::make_unique<TestServer>();
+    Client client;
+    server.reset();
+    EXPECT_TRUE(std::holds_alternative<client::ConnectionLost>(*client.nextEvent()));
+    EXPECT_THROW(client.reconnect(), std::system_error);
+    EXPECT_EQ(client.nextEvent(), std::nullopt);
+    EXPECT_EQ(client.setRate("player", 1).get().outcome, Outcome::connectionLost);
 }
 
 TEST(AClient, GrantsAFileUnderATokenForThePathOfItsURL) {

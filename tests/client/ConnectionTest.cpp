@@ -91,6 +91,33 @@ TEST(AConnection, EndsPendingCallsWhenTheProgramEndsIt) {
     EXPECT_EQ(ended, 2);
 }
 
+TEST(AConnection, MayBeMadeAnewByManyThreadsWhileOthersCall) {
+    constexpr int rounds = 50;
+    const TestServer server(answerAsAsked);
+    Connection connection({});
+    std::atomic<int> ended = 0;
+    {
+        std::vector<std::jthread> threads;
+        for (int i = 0; i < 2; ++i) {
+            threads.emplace_back([&] {
+                for (int k = 0; k < rounds; ++k)
+                    connection.reconnect();
+            });
+            threads.emplace_back([&] {
+                for (int k = 0; k < rounds; ++k) {
+                    ask(connection, "answer");
+                    ++ended;
+                }
+            });
+        }
+    }
+    EXPECT_EQ(ended, 2 * rounds);
+    EXPECT_EQ(ask(connection, "answer").outcome, Outcome::answered);
+    connection.disconnect();
+    EXPECT_FALSE(connection.isConnected());
+    EXPECT_EQ(ask(connection, "answer").outcome, Outcome::connectionLost);
+}
+
 TEST(AConnection, TellsEventsAndAnswersInTheServicesOrder) {
     constexpr int calls = 300;
     FakeService* service = nullptr;

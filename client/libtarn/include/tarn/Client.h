@@ -43,7 +43,8 @@ std::string fileURL(const std::string& path);
 /// Every command returns at once with a future of how it ends, so commands can be sent ahead. Commands about
 /// items run beside those about assets and queue players: wait for an answer before a command that builds on
 /// the other kind. A future that is let go lets the command run. Any thread may call, but a handler of events
-/// must not wait for a future or for nextEvent(). See Connection about losing the connection.
+/// must not wait for a future or for nextEvent(), nor throw. A command of more than 1 MiB throws
+/// std::length_error. See Connection about losing the connection.
 class Client {
 public:
     struct Options {
@@ -93,7 +94,8 @@ public:
     std::optional<Event> nextEvent();
 
     /// Connects anew; all objects have to be made again. Events of the old connection that still wait are
-    /// dropped. Throws std::system_error. Not from a handler.
+    /// dropped, and futures of it that are not ready end as `connectionLost`. Throws std::system_error; then
+    /// there is no connection. Not from a handler.
     void reconnect();
 
     /// The connection below, for commands of one's own encoding.

@@ -19,7 +19,8 @@ std::string defaultSocketPath();
 /// called by the program, which then builds its objects again.
 ///
 /// Any thread may call. Handlers run one at a time on a thread of the connection's own, in the order in which
-/// the service spoke; they may call anything here but reconnect() and the destructor, and should not block.
+/// the service spoke; they may call anything here but disconnect(), reconnect() and the destructor, should
+/// not block, and must not throw.
 class Connection {
 public:
     struct Handlers {
@@ -40,7 +41,8 @@ public:
     // An envelope over 1 MiB throws std::length_error; nothing is sent then.
 
     /// Sends a command and calls `handler` once with how it ended. Waits only while the
-    /// service is behind with what was sent before. Without a connection `handler` is called at once.
+    /// service is behind with what was sent before. Without a connection `handler` is called at once, on the
+    /// calling thread.
     void call(const Bytes& envelope, AnswerHandler handler);
 
     /// Sends a command whose end is of no interest. False when there is no connection.
@@ -53,8 +55,10 @@ public:
 
     bool isConnected() const;
 
-    /// Ends the connection if it lasts, as the destructor does, and connects anew. Throws std::system_error;
-    /// then there is no connection.
+    /// Ends the connection if it lasts, as the destructor does. No handler runs any more when this returns.
+    void disconnect();
+
+    /// disconnect(), and connects anew. Throws std::system_error; then there is no connection.
     void reconnect();
 
 private:
