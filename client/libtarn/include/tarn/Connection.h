@@ -16,7 +16,8 @@ std::string defaultSocketPath();
 ///
 /// The service serves one client at a time: whoever connects last takes over, and every change of connection
 /// makes the service forget all objects. Losing the connection is therefore never hidden: reconnect() is
-/// called by the program, which then builds its objects again.
+/// called by the program, which then builds its objects again. The connection itself outlasts being taken
+/// over: when commands fail with code 25, another client came, and reconnect() takes over again.
 ///
 /// Any thread may call. Handlers run one at a time on a thread of the connection's own, in the order in which
 /// the service spoke; they may call anything here but disconnect(), reconnect() and the destructor, should
