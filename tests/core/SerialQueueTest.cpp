@@ -106,6 +106,48 @@ TEST_F(SerialQueueTest, TheMainQueueRunsOneThingAtATimeWhetherLentOrNot) {
     queues_.main().sync([&] { EXPECT_EQ(ran, threads * rounds); });
 }
 
+TEST_F(SerialQueueTest, TheMainQueueIsLentToOneAtATime) {
+    for (int lent = 0; lent < 100;) {
+        std::atomic<bool> comes = false;
+        std::atomic<bool> ran = false;
+        std::jthread other;
+        queues_.main().sync([&, caller = std::this_thread::get_id()] {
+            if (std::this_thread::get_id() != caller)
+                return;
+            ++lent;
+            other = std::jthread([&] {
+                comes = true;
+                queues_.main().sync([&] { ran = true; });
+            });
+            while (!comes)
+                std::this_thread::yield();
+            for (int i = 0; i < 100; ++i)
+                std::this_thread::yield();
+            EXPECT_FALSE(ran);
+        });
+    }
+}
+
+TEST(MainQueueTest, TheRunLoopReturnsWhenNoWorkRunsInPlaceAnyMore) {
+    MainQueue queue;
+    std::atomic<bool> returned = false;
+    std::jthread loop([&] {
+        queue.runLoop();
+        returned = true;
+    });
+    bool isLent = false;
+    while (!isLent)
+        queue.sync([&, caller = std::this_thread::get_id()] {
+            isLent = std::this_thread::get_id() == caller;
+            if (!isLent)
+                return;
+            queue.end();
+            for (int i = 0; i < 100; ++i)
+                std::this_thread::yield();
+            EXPECT_FALSE(returned);
+        });
+}
+
 TEST_F(SerialQueueTest, SyncWaitsForEverythingSubmittedBefore) {
     auto queue = queues_.create("test.busy");
     std::latch release(1);

@@ -7,6 +7,8 @@
 #include <gtest/gtest.h>
 
 #include <filesystem>
+#include <future>
+#include <mutex>
 #include <thread>
 
 #include "platform/core/LiveObjects.h"
@@ -119,6 +121,30 @@ TEST(SocketListener, NoticesAHangUpBeforeTheClientThatComesBack) {
         EXPECT_THAT(std::vector(&journal[3 * i], &journal[3 * i] + 3),
                     ElementsAre("offered", "call ", "invalidated"));
     EXPECT_EQ(LiveObjects::counts()["connection"], 1) << "the service still holds the last one";
+}
+
+// The I/O thread is busy when a client waits to be accepted and another hangs up.
+TEST(SocketListener, NoticesAHangUpThatComesWhileAClientWaits) {
+    std::promise<void> held[2];
+    std::promise<void> letGo[2];
+    int call = 0;
+    TestServer server([&](ReceivedCall) {
+        held[call].set_value();
+        letGo[call].get_future().wait();
+        ++call;
+    });
+    auto leaving = server.connect();
+    auto busy = server.connect();
+    ASSERT_TRUE(busy.send(FrameKind::call, 0, "one"));
+    held[0].get_future().wait();
+    ASSERT_TRUE(busy.send(FrameKind::call, 0, "two"));
+    auto waiting = server.connect();
+    letGo[0].set_value(); // from here on, the call and the client are known of
+    held[1].get_future().wait();
+    leaving.hangUp();
+    letGo[1].set_value();
+    EXPECT_THAT(server.service.journalOf(6),
+                ElementsAre("offered", "offered", "call one", "call two", "invalidated", "offered"));
 }
 
 TEST(SocketListener, EndsABrokenStreamWithOneLineAndServesTheOthers) {
@@ -243,6 +269,73 @@ TEST(SocketListener, StopsReadingWhileTooManyCallsAreUnfinished) {
     }
     EXPECT_EQ(seen, count);
     EXPECT_LE(most, ConnectionSocket::mostUnfinishedCalls + 65'536 / 116 + 1);
+}
+
+TEST(SocketListener, StopsReadingWhileTooManyBytesAreUnfinishedAndServesTheOthers) {
+    constexpr std::size_t count = 100;
+    constexpr std::size_t size = 100'000;
+    constexpr std::size_t most = ConnectionSocket::mostUnfinishedBytes / size + 1;
+    std::mutex mutex;
+    std::vector<ReceivedCall> kept;
+    std::size_t seen = 0;
+    TestServer server([&](ReceivedCall call) {
+        if (call.data.size() != size)
+            return echo(std::move(call));
+        std::lock_guard lock(mutex);
+        ++seen;
+        kept.push_back(std::move(call));
+    });
+    auto other = server.connect();
+    auto client = server.connect();
+    std::jthread sender([&] {
+        for (std::size_t i = 0; i < count; ++i)
+            ASSERT_TRUE(client.send(FrameKind::call, 0, std::string(size, 'c')));
+    });
+    const auto takeTurns = [&] { // in each, the I/O thread could read from the client, too
+        for (int i = 0; i < 300; ++i)
+            ASSERT_TRUE(other.send(FrameKind::call, 1) && other.receive());
+    };
+    const auto isPaused = [&] {
+        std::lock_guard lock(mutex);
+        return seen >= most;
+    };
+    while (!isPaused())
+        takeTurns();
+    takeTurns();
+    std::vector<ReceivedCall> finished;
+    {
+        std::lock_guard lock(mutex);
+        EXPECT_EQ(seen, most);
+        finished.swap(kept);
+    }
+    finished.clear();
+    const auto rest = [&] {
+        std::lock_guard lock(mutex);
+        finished = std::exchange(kept, {});
+        return seen;
+    };
+    while (rest() < count) {
+        finished.clear();
+        std::this_thread::yield();
+    }
+}
+
+TEST(SocketListener, CutsOffWhoLeavesTooMuchUnfinishedWithTheOthers) {
+    constexpr std::size_t clients = 16; // of which any 15 stay below the limit
+    TestServer server(echo);
+    Data whole;
+    appendFrame(whole, FrameKind::call, 0, Data(FrameHeader::largestBody));
+    const auto part = std::span(whole).first(whole.size() - 1);
+    std::vector<RawClient> stalled;
+    for (std::size_t i = 0; i < clients; ++i) {
+        stalled.push_back(server.connect());
+        stalled.back().sendBytes(part);
+    }
+    EXPECT_EQ(server.service.journalOf(clients + 1).back(), "interrupted");
+    EXPECT_THAT(server.log.errors(), ElementsAre(HasSubstr("left too much unfinished")));
+    auto next = server.connect();
+    ASSERT_TRUE(next.send(FrameKind::call, 1));
+    EXPECT_TRUE(next.receive());
 }
 
 TEST(SocketListener, SeesAHangUpWhileItDoesNotRead) {
