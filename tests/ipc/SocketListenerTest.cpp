@@ -110,6 +110,42 @@ TEST(SocketListener, ReadsWhatAClientSentBeforeItHungUp) {
                 ElementsAre("offered", "call call", "call call", "call call", "invalidated"));
 }
 
+// More than one read brings.
+TEST(SocketListener, ReadsAllOfItWhenItSeesTheHangUpFirst) {
+    constexpr std::size_t count = 10;
+    std::promise<void> begun;
+    std::promise<void> hungUp;
+    TestServer server([&](ReceivedCall call) {
+        if (call.data != bytes("first"))
+            return;
+        begun.set_value();
+        hungUp.get_future().wait();
+    });
+    auto client = server.connect();
+    ASSERT_TRUE(client.send(FrameKind::call, 0, "first"));
+    begun.get_future().wait();
+    for (std::size_t i = 0; i < count; ++i)
+        ASSERT_TRUE(client.send(FrameKind::call, 0, std::string(8'000, 'c')));
+    client.hangUp();
+    hungUp.set_value();
+    const auto journal = server.service.journalOf(1 + 1 + count + 1);
+    EXPECT_THAT(journal, SizeIs(1 + 1 + count + 1));
+    EXPECT_EQ(journal.back(), "invalidated");
+}
+
+TEST(SocketListener, SendsNothingThatIsTooLongForAFrame) {
+    TestServer server(
+        [](ReceivedCall call) { call.callback->call(Data(FrameHeader::largestBody), std::nullopt); });
+    auto client = server.connect();
+    ASSERT_TRUE(client.send(FrameKind::call, 1));
+    EXPECT_EQ(client.receive()->kind, FrameKind::released);
+    auto& proxy = server.service.connection()->remoteObjectProxy();
+    proxy.receiveData(Data(FrameHeader::largestBody + 1));
+    proxy.receiveData(Data(FrameHeader::largestBody));
+    EXPECT_EQ(client.receive()->body.size(), FrameHeader::largestBody);
+    EXPECT_THAT(server.log.errors(), ElementsAre(HasSubstr("an answer of"), HasSubstr("an event of")));
+}
+
 TEST(SocketListener, NoticesAHangUpBeforeTheClientThatComesBack) {
     constexpr std::size_t rounds = 500;
     TestServer server(echo);

@@ -43,7 +43,10 @@ TEST_F(RouterTest, ManagersAreMadeOnceAndLinkedToThoseThatAreThere) {
     router_->setAudioServer(other);
     EXPECT_EQ(items->audioServer(), service);
     router_->setAppConnction(other);
+    EXPECT_EQ(router_->audioServer(), other);
+    EXPECT_EQ(assets->audioServer(), other);
     EXPECT_EQ(items->audioServer(), other);
+    EXPECT_EQ(players->audioServer(), other);
 }
 
 TEST_F(RouterTest, AManagerIsLinkedToOneThatIsMadeLater) {
