@@ -84,7 +84,8 @@ private:
         const FileDescriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
         if (!file)
             throw std::invalid_argument(path + ": " + std::strerror(errno));
-        connection_.grant(words[1].substr(6), path, file.get());
+        if (!connection_.grant(words[1].substr(6), path, file.get()))
+            throw std::runtime_error("there is no connection to hand the file over");
     }
 
     /// An event that came since the last wait counts.
