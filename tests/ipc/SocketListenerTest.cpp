@@ -20,7 +20,6 @@
 namespace tarn {
 namespace {
 
-using testing::Contains;
 using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::IsEmpty;
