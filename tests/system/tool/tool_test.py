@@ -14,7 +14,7 @@ import tempfile
 import unittest
 import wave
 
-SERVICE, TOOL = sys.argv[1:3]
+SERVICE, TOOL = (os.path.abspath(argument) for argument in sys.argv[1:3])
 DEADLINE = 30  # seconds
 
 
@@ -51,9 +51,14 @@ class TheTool(unittest.TestCase):
                 process.kill()
                 process.wait()
 
-    def start(self, *words, **options):
-        return subprocess.Popen([TOOL, *words], env=self.environment, cwd=self.folder, stdin=subprocess.DEVNULL,
-                                stdout=subprocess.PIPE, stderr=subprocess.STDOUT, **options)
+    @contextlib.contextmanager
+    def start(self, *words, stdin=subprocess.DEVNULL, stdout=subprocess.PIPE, stderr=subprocess.STDOUT):
+        with subprocess.Popen([TOOL, *words], env=self.environment, cwd=self.folder, stdin=stdin, stdout=stdout,
+                              stderr=stderr) as tool:
+            try:
+                yield tool
+            finally:
+                tool.kill()  # it has ended, unless something has failed
 
     def run_tool(self, *words):
         """How it ended, and its output."""
@@ -134,8 +139,8 @@ class TheTool(unittest.TestCase):
         with self.service():
             here, there = pty.openpty()
             with open(here, "r+b", buffering=0) as terminal, open(there, "r+b", buffering=0) as its_side, \
-                    subprocess.Popen([TOOL, "play", "long.wav", "short.wav"], env=self.environment, cwd=self.folder,
-                                     stdin=its_side, stdout=its_side, stderr=its_side) as tool:
+                    self.start("play", "long.wav", "short.wav", stdin=its_side, stdout=its_side,
+                               stderr=its_side) as tool:
                 shown = b""
 
                 def wait_for(pattern):
