@@ -2,6 +2,7 @@
 
 #include <poll.h>
 #include <sys/signalfd.h>
+#include <unistd.h>
 
 #include <algorithm>
 #include <array>
@@ -25,14 +26,16 @@ namespace {
 
 using namespace std::chrono_literals;
 
-// The last component names the tool to the system's media controls.
-constexpr char playerIdentifier[] = "tarnctl,ostrel.tarnctl";
 constexpr double seekStep = 10;
 constexpr float rateStep = 0.25F;
 constexpr float slowestRate = 0.25F;
 constexpr float fastestRate = 4;
 constexpr std::chrono::milliseconds liveInterval = 250ms;
 constexpr std::chrono::milliseconds plainInterval = 1000ms;
+constexpr int mostRestarts = 3;
+
+/// Of its own for each use of the tool; the last component names it to the system's media controls.
+std::string ownPlayerIdentifier() { return "tarnctl-" + std::to_string(::getpid()) + ",ostrel.tarnctl"; }
 
 sigset_t stopSignals() {
     sigset_t set;
@@ -82,28 +85,68 @@ private:
     bool open() {
         const StoppingAtOnce whileItTakes;
         checkThatServiceAnswers(client_);
-        tracks_ = openTracks(client_, options_.paths, options_.access,
-                             [&](const auto& path, const auto& reason) { fail(path + ": " + reason); });
-        return !tracks_.empty() && makePlayer();
+        openFiles();
+        if (tracks_.empty())
+            return false;
+        const bool fromTheEnd = options_.rate < 0 && options_.from == 0;
+        return makePlayer({tracks_.front().identifier,
+                           fromTheEnd ? tracks_.front().info.duration : options_.from, options_.rate});
     }
 
-    bool makePlayer() {
+    void openFiles() {
+        tracks_ = openTracks(client_, options_.paths, options_.access,
+                             [&](const auto& path, const auto& reason) { fail(path + ": " + reason); });
+    }
+
+    /// Where playing begins, or goes on.
+    struct Place {
+        std::string track;
+        double position;
+        float rate;
+    };
+
+    /// Of the tracks from that place on. False, with a line, when that cannot be.
+    bool makePlayer(const Place& place) {
         std::vector<std::string> items;
         std::vector<std::future<client::Result<client::Status>>> made;
         for (const auto& track : tracks_) {
+            if (items.empty() && track.identifier != place.track)
+                continue;
             items.push_back(track.identifier);
             made.push_back(client_.upsertItem(track.identifier, track.identifier));
         }
         for (auto& item : made)
             item.wait();
-        const auto player = client_.upsertQueuePlayer(playerIdentifier, items).get();
+        const auto player = client_.upsertQueuePlayer(playerIdentifier_, items).get();
+        place_ = place;
+        if (wasForgotten(player)) {
+            goOnIfNobodyElseIsServed();
+            return true;
+        }
         if (player.outcome != client::Outcome::answered)
             return fail("cannot play: " + player.problem());
-        const bool fromTheEnd = options_.rate < 0 && options_.from == 0;
-        if (const auto from = fromTheEnd ? tracks_.front().info.duration : options_.from; from > 0)
-            client_.setCurrentTime(items.front(), from).wait();
-        starting_ = client_.setRate(playerIdentifier, options_.rate);
+        if (place.position > 0)
+            client_.setCurrentTime(place.track, place.position).wait();
+        started_ = false;
+        starting_ = client_.setRate(playerIdentifier_, place.rate);
         return true;
+    }
+
+    /// The service has lost its client: the one before this, that left only now, or this one to another that
+    /// has come. The first is made good.
+    void goOnIfNobodyElseIsServed() {
+        if (++restarts_ > mostRestarts || !servesNobody(client_))
+            return stop("Stopped: another program has taken over the service.", 1);
+        if (current_ != nullptr && started_)
+            place_ = {current_->identifier, position_, rate_};
+        client_.reconnect();
+        inbox_.takeAll(); // of what is no more
+        current_ = nullptr;
+        openFiles();
+        const auto goesOn = std::any_of(tracks_.begin(), tracks_.end(),
+                                        [&](const Track& track) { return track.identifier == place_.track; });
+        if (!goesOn || !makePlayer(Place(place_)))
+            stop("Stopped.", 1);
     }
 
     void play() {
@@ -158,10 +201,7 @@ private:
     }
 
     void takeRate(float rate) {
-        const bool wentBack = rate_ < 0 && rate == 0;
-        if (wentBack)
-            readPosition();
-        if (wentBack && position_ == 0)
+        if (rate_ < 0 && rate == 0 && readPosition() && position_ == 0)
             return stop("Played back to the start.", status_);
         if (!terminal_.isLive() && rate == 0 && rate_ != 0 && current_ != nullptr)
             std::cout << "Paused at " << timeText(position_) << "." << std::endl;
@@ -191,12 +231,16 @@ private:
         if (!starting_.valid() || starting_.wait_for(0ms) != std::future_status::ready)
             return;
         const auto completion = starting_.get();
+        if (wasForgotten(completion))
+            return goOnIfNobodyElseIsServed();
         for (const auto& event : inbox_.takeAll())
             handle(event);
         if (!completion.succeeded())
-            stop("Stopped: " + completion.problem(), 1);
-        else if (rate_ == 0 && options_.rate != 0 && current_ != nullptr)
-            stop("Stopped: the service could not start to play.", 1);
+            return stop("Stopped: " + completion.problem(), 1);
+        const bool isSilent = rate_ == 0 && place_.rate != 0 && current_ != nullptr;
+        if (isSilent && readPosition())
+            return stop("Stopped: the service could not start to play.", 1);
+        started_ = !isSilent;
     }
 
     void takeSignals() {
@@ -206,12 +250,12 @@ private:
     }
 
     void handle(Key key) {
-        const auto setRate = [&](float rate) { client_.setRate(playerIdentifier, rate); };
+        const auto setRate = [&](float rate) { client_.setRate(playerIdentifier_, rate); };
         switch (key) {
         case Key::pause:
             return setRate(rate_ == 0 ? usualRate_ : 0);
         case Key::next:
-            client_.advanceToNextItem(playerIdentifier);
+            client_.advanceToNextItem(playerIdentifier_);
             return;
         case Key::seekBack:
             return seek(-seekStep);
@@ -231,14 +275,18 @@ private:
             client_.setCurrentTime(current_->identifier, std::max(0.0, position_ + seconds)).wait();
     }
 
-    void readPosition() {
+    /// False when nothing is known: also when the service has lost this client, which is seen to.
+    bool readPosition() {
         if (current_ == nullptr)
-            return;
+            return false;
         const auto time = client_.currentTime(current_->identifier).get();
-        if (time.outcome == client::Outcome::answered)
-            position_ = time.value;
-        else if (time.outcome == client::Outcome::failed)
-            stop("Stopped: another program has taken over the service.", 1);
+        if (time.outcome == client::Outcome::failed)
+            goOnIfNobodyElseIsServed();
+        if (time.outcome != client::Outcome::answered)
+            return false;
+        position_ = time.value;
+        restarts_ = 0;
+        return true;
     }
 
     void draw() const {
@@ -283,12 +331,16 @@ private:
     const FileDescriptor signals_ = waitForSignals(); // before the client's thread
     EventInbox inbox_;
     Terminal terminal_;
+    const std::string playerIdentifier_ = ownPlayerIdentifier();
     std::vector<Track> tracks_;
+    Place place_; // where the player in the service began
+    int restarts_ = 0;
     const Track* current_ = nullptr;
     double position_ = 0;
     float rate_ = 0;
     float usualRate_; // what to go on at after a pause
     std::future<client::Completion> starting_;
+    bool started_ = false;                                       // since then place_ is left behind
     std::map<std::string, std::optional<client::Error>> failed_; // by item
     std::set<std::string> reported_;
     bool keysWait_ = false;

@@ -20,8 +20,9 @@ struct Track {
 
 enum class Access { service, granted };
 
-/// Makes an asset of each file, those that the service can read; tells the others with the reason. A file is
-/// opened here and granted when the service has no right of its own to it.
+/// Makes an asset of each file, anew when the service forgets them meanwhile, those that the service can
+/// read; tells the others with the reason. A file is opened here and granted when the service has no right of
+/// its own to it.
 std::vector<Track>
 openTracks(client::Client& client, const std::vector<std::string>& paths, Access access,
            const std::function<void(const std::string& path, const std::string& reason)>& refused);

@@ -113,14 +113,21 @@ class TheTool(unittest.TestCase):
                 self.assertEqual(tool.returncode, 128 + number)
             with self.start("play", "long.wav") as tool:
                 tool.stdout.readline()
-                self.assertEqual(self.run_tool("info", "short.wav")[0], 0)  # takes the service over
-                self.assertIn(b"taken over", tool.communicate(timeout=DEADLINE)[0])
-            self.assertEqual(tool.returncode, 1)
-            with self.start("play", "long.wav") as tool:
-                tool.stdout.readline()
                 service.kill()
                 self.assertIn(b"connection to the service was lost", tool.communicate(timeout=DEADLINE)[0])
             self.assertEqual(tool.returncode, 1)
+
+    def test_goes_on_when_the_one_before_it_leaves_late(self):
+        with self.service(), self.start("play", "long.wav") as first:
+            first.stdout.readline()
+            with self.start("play", "--from", "20", "long.wav") as second:
+                self.assertEqual(second.stdout.readline(), b"Playing long.wav (1:00)\n")
+                # It sees that it was replaced, and its leaving makes the service forget the second one, too.
+                self.assertIn(b"taken over", first.communicate(timeout=DEADLINE)[0])
+                self.assertEqual(first.returncode, 1)
+                self.assertEqual(second.stdout.readline(), b"Playing long.wav (1:00)\n")
+                second.terminate()
+                self.assertEqual(second.communicate(timeout=DEADLINE)[0], b"Stopped.\n")
 
     def test_can_be_stopped_while_nothing_answers(self):
         with socket.socket(socket.AF_UNIX) as mute:
