@@ -46,7 +46,7 @@ int runInfo(const InfoOptions& options) {
     const auto tracks = openTracks(client, options.paths, options.access,
                                    [&](const std::string& path, const std::string& reason) {
                                        status = 1;
-                                       std::cerr << "tarnctl: " << printable(path) << ": " << reason << "\n";
+                                       std::cerr << "tarnctl: " << printable(path + ": " + reason) << "\n";
                                    });
     for (const auto& track : tracks)
         options.asJSON ? printJSON(track) : print(track);

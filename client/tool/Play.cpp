@@ -250,7 +250,11 @@ private:
     }
 
     void handle(Key key) {
-        const auto setRate = [&](float rate) { client_.setRate(playerIdentifier_, rate); };
+        const auto setRate = [&](float rate) {
+            starting_ = {}; // whatever became of that, this comes after it
+            started_ = true;
+            client_.setRate(playerIdentifier_, rate);
+        };
         switch (key) {
         case Key::pause:
             return setRate(rate_ == 0 ? usualRate_ : 0);

@@ -44,6 +44,16 @@ constexpr std::pair<std::string_view, Key> keys[] = {
     {"\x04", Key::quit},
 };
 
+/// Bytes of the key press that `text` begins with. Keys that have no character send a sequence, which is one
+/// press also when it means nothing here.
+std::size_t lengthOfPress(std::string_view text) {
+    if (!text.starts_with("\x1b[") && !text.starts_with("\x1bO"))
+        return 1;
+    const auto last = std::find_if(text.begin() + 2, text.end(),
+                                   [](char character) { return character >= '@' && character <= '~'; });
+    return static_cast<std::size_t>(last - text.begin()) + (last == text.end() ? 0 : 1);
+}
+
 /// Of one character, and its length in bytes. What cannot be shown is a question mark.
 struct Shown {
     std::string_view text;
@@ -93,7 +103,7 @@ std::vector<Key> Terminal::readKeys() const {
         return {Key::quit};
     std::vector<Key> pressed;
     for (std::string_view rest(bytes.data(), static_cast<std::size_t>(count)); !rest.empty();) {
-        std::size_t length = 1;
+        std::size_t length = lengthOfPress(rest);
         for (const auto& [text, key] : keys) {
             if (!rest.starts_with(text))
                 continue;

@@ -46,11 +46,11 @@ std::string checkTime(const std::string& text) {
 /// Accepts every rate that something is heard at.
 std::string checkRate(const std::string& text) {
     char* end = nullptr;
-    const double rate = std::strtod(text.c_str(), &end);
+    const float rate = std::strtof(text.c_str(), &end);
     const bool isNumber = !text.empty() && *end == '\0';
     return isNumber && std::abs(rate) <= 4 && rate != 0
                ? ""
-               : "a rate is a number from 0.25 to 4, or from -0.25 to -4 to play backwards";
+               : "a rate is a number up to 4 that is not 0, or down to -4 to play backwards";
 }
 
 struct Options {

@@ -157,6 +157,7 @@ class TheTool(unittest.TestCase):
                 wait_for(rb"> .*long\.wav")
                 terminal.write(b" ")
                 wait_for(rb"\|\| .*long\.wav")
+                terminal.write(b"\x1b[A\x1b[3~\x1bOH")  # keys that mean nothing change nothing
                 terminal.write(b"]")
                 wait_for(rb"1\.25x")
                 terminal.write(b"\x1b[C")
