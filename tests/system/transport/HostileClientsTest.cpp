@@ -16,7 +16,6 @@ namespace tarn {
 namespace {
 
 using client::Client;
-using client::Outcome;
 
 Data positionQuery(std::uint64_t callId) {
     auto item = std::make_shared<VLProtoObjectMessage>();
