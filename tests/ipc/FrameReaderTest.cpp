@@ -15,10 +15,10 @@ namespace {
 using Sender = FrameReader::Sender;
 using testing::HasSubstr;
 
-FileDescriptor anyFile() { return FileDescriptor(::open("/dev/null", O_RDONLY | O_CLOEXEC)); }
+ReceivedFile anyFile() { return ReceivedFile(FileDescriptor(::open("/dev/null", O_RDONLY | O_CLOEXEC))); }
 
-std::vector<FileDescriptor> files(int count) {
-    std::vector<FileDescriptor> made(static_cast<std::size_t>(count));
+std::vector<ReceivedFile> files(int count) {
+    std::vector<ReceivedFile> made(static_cast<std::size_t>(count));
     for (auto& file : made)
         file = anyFile();
     return made;

@@ -12,9 +12,10 @@ namespace {
 
 class ATokenTable : public testing::Test {
 protected:
-    FileDescriptor openSong(int flags = O_RDONLY) const {
-        return FileDescriptor(::open(song_.c_str(), flags | O_CLOEXEC));
+    static ReceivedFile open(const std::string& path, int flags) {
+        return ReceivedFile(FileDescriptor(::open(path.c_str(), flags | O_CLOEXEC)));
     }
+    ReceivedFile openSong(int flags = O_RDONLY) const { return open(song_, flags); }
 
     std::string read(const std::string& path) {
         const auto file = table_.open(path);
@@ -69,12 +70,9 @@ TEST_F(ATokenTable, PrefersTheNewestClientAndTheNewestGrant) {
 TEST_F(ATokenTable, RefusesWhatIsNoReadableRegularFile) {
     const auto fifo = (folder_ / "fifo").string();
     ASSERT_EQ(::mkfifo(fifo.c_str(), 0600), 0);
-    const auto opened = [](const std::string& path, int flags) {
-        return FileDescriptor(::open(path.c_str(), flags | O_CLOEXEC));
-    };
-    EXPECT_NE(table_.grant(1, "token", fifo, opened(fifo, O_RDWR)), "");
-    EXPECT_NE(table_.grant(1, "token", "/dev/zero", opened("/dev/zero", O_RDONLY)), "");
-    EXPECT_NE(table_.grant(1, "token", "/", opened("/", O_RDONLY | O_DIRECTORY)), "");
+    EXPECT_NE(table_.grant(1, "token", fifo, open(fifo, O_RDWR)), "");
+    EXPECT_NE(table_.grant(1, "token", "/dev/zero", open("/dev/zero", O_RDONLY)), "");
+    EXPECT_NE(table_.grant(1, "token", "/", open("/", O_RDONLY | O_DIRECTORY)), "");
     EXPECT_NE(table_.grant(1, "token", song_, openSong(O_WRONLY)), "");
     EXPECT_NE(table_.grant(1, "token", song_, openSong(O_PATH)), "");
     EXPECT_EQ(table_.consume("token"), -1);

@@ -7,7 +7,7 @@
 #include <span>
 
 #include "platform/Data.h"
-#include "platform/linux/FileDescriptor.h"
+#include "platform/linux/ipc/ReceivedFile.h"
 
 namespace tarn {
 
@@ -35,7 +35,7 @@ struct Frame {
     FrameKind kind = FrameKind::call;
     std::uint64_t callId = 0;
     Data body;
-    FileDescriptor file; // of an extension only
+    ReceivedFile file; // of an extension only
 };
 
 /// Appends a whole frame to `bytes`. The body is at most FrameHeader::largestBody long.

@@ -13,7 +13,7 @@ constexpr std::size_t keptCapacity = 4096;
 } // namespace
 
 std::optional<std::string_view> FrameReader::take(std::span<const std::uint8_t> bytes,
-                                                  std::vector<FileDescriptor> files,
+                                                  std::vector<ReceivedFile> files,
                                                   std::vector<Frame>& frames) {
     if (broken_)
         return broken_;

@@ -25,8 +25,8 @@ public:
 
     /// Takes the bytes and files of one read and appends the frames that are now whole to `frames`. Returns
     /// why the stream is broken, or nothing; frames before the break have been appended.
-    std::optional<std::string_view> take(std::span<const std::uint8_t> bytes,
-                                         std::vector<FileDescriptor> files, std::vector<Frame>& frames);
+    std::optional<std::string_view> take(std::span<const std::uint8_t> bytes, std::vector<ReceivedFile> files,
+                                         std::vector<Frame>& frames);
 
     /// Bytes of a frame that is not whole yet.
     std::size_t unfinishedBytes() const { return unfinished_.size(); }
@@ -40,7 +40,7 @@ private:
 
     Sender sender_;
     Data unfinished_;
-    std::deque<FileDescriptor> files_; // came with bytes of a frame that is not whole yet
+    std::deque<ReceivedFile> files_; // came with bytes of a frame that is not whole yet
     std::optional<std::string_view> broken_;
 };
 

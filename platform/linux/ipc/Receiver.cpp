@@ -2,7 +2,6 @@
 
 #include <sys/socket.h>
 
-#include <array>
 #include <cerrno>
 #include <cstring>
 
@@ -10,20 +9,22 @@ namespace tarn {
 
 namespace {
 
-/// More than any rightful read brings: one file belongs to one frame, and the system ends a read behind it.
-constexpr std::size_t mostFiles = 8;
+/// What the system lets through at once (SCM_MAX_FD), though a rightful read brings one: what there is no
+/// room for is closed by the system, and that may take for ever.
+constexpr std::size_t mostFiles = 253;
 
-std::vector<FileDescriptor> filesOf(msghdr& message) {
-    std::vector<FileDescriptor> files;
+std::vector<ReceivedFile> filesOf(msghdr& message) {
+    std::vector<ReceivedFile> files;
     for (cmsghdr* control = CMSG_FIRSTHDR(&message); control != nullptr;
          control = CMSG_NXTHDR(&message, control)) {
         if (control->cmsg_level != SOL_SOCKET || control->cmsg_type != SCM_RIGHTS)
             continue;
         const std::size_t count = (control->cmsg_len - CMSG_LEN(0)) / sizeof(int);
-        std::array<int, mostFiles> numbers{};
-        std::memcpy(numbers.data(), CMSG_DATA(control), count * sizeof(int));
-        for (std::size_t i = 0; i < count; ++i)
-            files.emplace_back(numbers[i]);
+        for (std::size_t i = 0; i < count; ++i) {
+            int number = -1;
+            std::memcpy(&number, CMSG_DATA(control) + i * sizeof(int), sizeof(int));
+            files.emplace_back(FileDescriptor(number));
+        }
     }
     return files;
 }
@@ -32,12 +33,12 @@ std::vector<FileDescriptor> filesOf(msghdr& message) {
 
 Received Receiver::receive(int socket, Wait wait) {
     iovec part{buffer_.get(), size};
-    alignas(cmsghdr) std::array<std::byte, CMSG_SPACE(mostFiles * sizeof(int))> control{};
+    alignas(cmsghdr) std::byte control[CMSG_SPACE(mostFiles * sizeof(int))]; // filled by the system
     msghdr message{};
     message.msg_iov = &part;
     message.msg_iovlen = 1;
-    message.msg_control = control.data();
-    message.msg_controllen = control.size();
+    message.msg_control = control;
+    message.msg_controllen = sizeof(control);
 
     const int flags = MSG_CMSG_CLOEXEC | (wait == Wait::never ? MSG_DONTWAIT : 0);
     ssize_t count = 0;
@@ -55,6 +56,13 @@ Received Receiver::receive(int socket, Wait wait) {
     else if (count == 0)
         received.state = Received::State::ended;
     return received;
+}
+
+void Receiver::drain(int socket) {
+    ::shutdown(socket, SHUT_RD);
+    Received::State state = Received::State::open;
+    while (state == Received::State::open || state == Received::State::truncatedFiles)
+        state = receive(socket).state;
 }
 
 } // namespace tarn

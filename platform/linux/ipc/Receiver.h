@@ -6,7 +6,7 @@
 #include <span>
 #include <vector>
 
-#include "platform/linux/FileDescriptor.h"
+#include "platform/linux/ipc/ReceivedFile.h"
 
 namespace tarn {
 
@@ -16,7 +16,7 @@ struct Received {
 
     State state = State::open;
     std::span<const std::uint8_t> bytes; // good until the next read
-    std::vector<FileDescriptor> files;   // close-on-exec
+    std::vector<ReceivedFile> files;     // close-on-exec
 };
 
 /// Reads sockets, with the files that come along. Belongs to one thread.
@@ -26,6 +26,10 @@ public:
 
     /// Whatever files came are in the result or closed.
     Received receive(int socket, Wait wait = Wait::never);
+
+    /// For a socket that is about to be closed: ends its receiving side and drops what came and was not read,
+    /// as the files among it would else be closed with the socket, by the thread that does that.
+    void drain(int socket);
 
 private:
     static constexpr std::size_t size = 65'536;

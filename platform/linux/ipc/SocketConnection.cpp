@@ -61,7 +61,7 @@ void SocketConnection::handleHangUp(Receiver& receiver) {
 void SocketConnection::read(Receiver& receiver) {
     auto received = receiver.receive(socket_->socket());
     if (received.state == Received::State::truncatedFiles)
-        return interrupt("too many files came at once");
+        return interrupt("its files could not be taken");
     if (received.state == Received::State::ended)
         loss_ = Loss::invalidation;
     if (received.bytes.empty())
@@ -105,14 +105,15 @@ void SocketConnection::interrupt(std::string_view reason) {
                          key_, reason);
 }
 
-void SocketConnection::reportLoss() {
+void SocketConnection::reportLoss(Receiver& receiver) {
     const auto handler = loss_ == Loss::interruption ? interruptionHandler_ : invalidationHandler_;
-    close();
+    close(receiver);
     if (handler)
         handler();
 }
 
-void SocketConnection::close() {
+void SocketConnection::close(Receiver& receiver) {
+    receiver.drain(socket_->socket());
     socket_->close();
     tokens_.forget(key_);
     // They hold the service, which may hold this connection.

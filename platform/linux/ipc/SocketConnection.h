@@ -36,10 +36,10 @@ public:
     void interrupt(std::string_view reason);
 
     /// Closes what is lost and runs the handler that it calls for.
-    void reportLoss();
+    void reportLoss(Receiver& receiver);
 
     /// Closes without a word.
-    void close();
+    void close(Receiver& receiver);
 
     std::size_t unfinishedBytes() const { return reader_.unfinishedBytes(); }
     int socket() const { return socket_->socket(); }

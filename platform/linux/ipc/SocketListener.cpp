@@ -30,7 +30,7 @@ SocketListener::~SocketListener() {
     if (thread_.joinable())
         thread_.join();
     for (const auto& [key, connection] : connections_)
-        connection->close();
+        connection->close(receiver_);
 }
 
 void SocketListener::resume() {
@@ -68,7 +68,7 @@ void SocketListener::serve(std::uint64_t key, std::uint32_t events) {
     if (lives)
         return;
     connections_.erase(found);
-    connection->reportLoss();
+    connection->reportLoss(receiver_);
 }
 
 void SocketListener::accept() {
@@ -76,8 +76,10 @@ void SocketListener::accept() {
     // A client that died and came straight back has hung up before it connected again. Its old connection
     // must be gone before the new one is offered, or its loss would take the new one down.
     serveHangUps();
-    if (!socket || !mayBeOffered(socket.get()))
+    if (!socket)
         return;
+    if (!mayBeOffered(socket.get()))
+        return receiver_.drain(socket.get());
     toldOfRefusal_ = false;
     offer(std::move(socket));
 }
@@ -137,7 +139,7 @@ void SocketListener::offer(FileDescriptor descriptor) {
     if (delegate_->listenerShouldAcceptNewConnection(*this, connection))
         return;
     connections_.erase(key);
-    connection->close();
+    connection->close(receiver_);
 }
 
 bool SocketListener::isOverLimit(SocketConnection& connection) {

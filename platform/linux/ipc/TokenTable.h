@@ -10,6 +10,7 @@
 #include "platform/SandboxExtension.h"
 #include "platform/core/MutexProtected.h"
 #include "platform/linux/FileAccess.h"
+#include "platform/linux/ipc/ReceivedFile.h"
 
 namespace tarn {
 
@@ -22,7 +23,7 @@ public:
     /// Makes `token` good for `path`, in place of what the same connection granted under it before. Returns
     /// why it does not, or nothing.
     std::string_view grant(std::uint64_t connection, const std::string& token, const std::string& path,
-                           FileDescriptor file);
+                           ReceivedFile file);
 
     /// The connection ended: its tokens are good for nothing; handles stay.
     void forget(std::uint64_t connection);
@@ -34,7 +35,7 @@ public:
 private:
     struct GrantedFile {
         std::string path;
-        FileDescriptor file;
+        ReceivedFile file;
     };
     using Waiting = std::map<std::string, GrantedFile, std::less<>>; // by token
 
