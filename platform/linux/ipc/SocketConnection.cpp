@@ -1,5 +1,8 @@
 #include "platform/linux/ipc/SocketConnection.h"
 
+#include <malloc.h>
+
+#include <algorithm>
 #include <utility>
 
 #include "platform/SystemLog.h"
@@ -7,6 +10,12 @@
 #include "platform/linux/ipc/TransportMessages.h"
 
 namespace tarn {
+
+namespace {
+
+constexpr std::size_t longFrame = 65'536; // no client of good will comes near
+
+} // namespace
 
 SocketConnection::SocketConnection(std::shared_ptr<ConnectionSocket> socket, std::uint64_t key,
                                    TokenTable& tokens)
@@ -75,7 +84,9 @@ void SocketConnection::read(Receiver& receiver) {
 
 void SocketConnection::deliver(std::vector<Frame> frames) {
     std::vector<ReceivedCall> calls;
+    std::size_t longest = 0;
     for (auto& frame : frames) {
+        longest = std::max(longest, frame.body.size());
         if (frame.kind == FrameKind::extension) {
             takeExtension(std::move(frame));
             if (loss_ == Loss::interruption)
@@ -87,6 +98,9 @@ void SocketConnection::deliver(std::vector<Frame> frames) {
     }
     if (!calls.empty() && exportedObject_)
         exportedObject_->receiveData(std::move(calls));
+    if (longest >= longFrame)
+        ::malloc_trim(
+            0); // the heap of a thread would keep up to 64 MiB of what such a frame was decoded into
 }
 
 void SocketConnection::takeExtension(Frame frame) {
