@@ -1,10 +1,10 @@
 #include "proto/AudioFilePlayerStatus.h"
 
-#include "platform/Error.h"
-#include "platform/MediaItem.h"
-#include "platform/MediaQueuePlayer.h"
 #include "proto/ErrorUserInfo.h"
 #include "proto/MessageRules.h"
+#include "roles/Error.h"
+#include "roles/MediaItem.h"
+#include "roles/MediaQueuePlayer.h"
 
 namespace tarn {
 

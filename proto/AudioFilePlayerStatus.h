@@ -6,8 +6,8 @@
 #include <string>
 #include <string_view>
 
-#include "platform/Data.h"
 #include "proto/Message.h"
+#include "roles/Data.h"
 
 namespace tarn {
 

@@ -1,8 +1,8 @@
 #include "proto/ErrorUserInfo.h"
 
-#include "platform/Error.h"
-#include "platform/SystemLog.h"
-#include "platform/core/PropertyList.h"
+#include "log/SystemLog.h"
+#include "roles/Error.h"
+#include "wire/PropertyList.h"
 
 namespace tarn {
 

@@ -4,7 +4,7 @@
 #include <optional>
 #include <string>
 
-#include "platform/Data.h"
+#include "roles/Data.h"
 
 namespace tarn {
 

@@ -10,10 +10,10 @@
 #include <type_traits>
 #include <vector>
 
-#include "platform/Data.h"
-#include "platform/core/Boxed.h"
-#include "platform/core/ProtoCodable.h"
 #include "proto/TextList.h"
+#include "roles/Data.h"
+#include "wire/Boxed.h"
+#include "wire/ProtoCodable.h"
 
 namespace tarn {
 

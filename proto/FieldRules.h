@@ -6,10 +6,10 @@
 #include <string>
 #include <vector>
 
-#include "platform/core/BlockCache.h"
-#include "platform/core/ProtoReader.h"
-#include "platform/core/ProtoWriter.h"
 #include "proto/FieldRow.h"
+#include "wire/BlockCache.h"
+#include "wire/ProtoReader.h"
+#include "wire/ProtoWriter.h"
 
 /// What each operation of a message does to one field: one overload for each kind of value.
 ///

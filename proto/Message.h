@@ -6,10 +6,10 @@
 #include <string>
 #include <string_view>
 
-#include "platform/core/ProtoCodable.h"
-#include "platform/core/ProtoReader.h"
 #include "proto/FieldRow.h"
 #include "proto/PresenceSet.h"
+#include "wire/ProtoCodable.h"
+#include "wire/ProtoReader.h"
 
 namespace tarn {
 

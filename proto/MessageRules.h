@@ -6,10 +6,10 @@
 #include <tuple>
 #include <typeinfo>
 
-#include "platform/core/ProtoReader.h"
-#include "platform/core/ProtoWriter.h"
 #include "proto/FieldRules.h"
 #include "proto/Message.h"
+#include "wire/ProtoReader.h"
+#include "wire/ProtoWriter.h"
 
 namespace tarn {
 

@@ -4,9 +4,9 @@
 #include <optional>
 #include <string_view>
 
-#include "platform/Data.h"
 #include "proto/Message.h"
 #include "proto/TransportError.h"
+#include "roles/Data.h"
 
 namespace tarn {
 

@@ -6,9 +6,9 @@
 #include <string>
 #include <string_view>
 
-#include "platform/Data.h"
-#include "platform/core/Boxed.h"
 #include "proto/Message.h"
+#include "roles/Data.h"
+#include "wire/Boxed.h"
 
 namespace tarn {
 

@@ -4,16 +4,16 @@
 #include <chrono>
 #include <utility>
 
-#include "assets/PlayerItemManager.h"
-#include "platform/AudioSession.h"
-#include "platform/Clock.h"
-#include "platform/SystemLog.h"
+#include "log/SystemLog.h"
+#include "objects/PlayerItemManager.h"
 #include "proto/AudioFilePlayerStatus.h"
 #include "proto/AudioFilePlayerUpdateContainedIdentifier.h"
 #include "proto/AudioFileQueuePlayerSetRate.h"
 #include "proto/Envelope.h"
 #include "proto/VelmoMessage.h"
 #include "queueplayer/RateThreshold.h"
+#include "roles/AudioSession.h"
+#include "roles/Clock.h"
 
 namespace tarn {
 

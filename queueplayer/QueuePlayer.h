@@ -6,15 +6,15 @@
 #include <string_view>
 #include <vector>
 
-#include "assets/KeyValueObserverHelper.h"
-#include "platform/MediaQueuePlayer.h"
-#include "platform/NotificationCenter.h"
-#include "platform/NowPlayingService.h"
-#include "platform/Platform.h"
-#include "platform/Registration.h"
-#include "platform/RemoteCommandCenter.h"
-#include "platform/core/LiveObjects.h"
+#include "objects/KeyValueObserverHelper.h"
 #include "reply/EventSink.h"
+#include "roles/MediaQueuePlayer.h"
+#include "roles/NotificationCenter.h"
+#include "roles/NowPlayingService.h"
+#include "roles/Platform.h"
+#include "roles/Registration.h"
+#include "roles/RemoteCommandCenter.h"
+#include "threads/LiveObjects.h"
 
 namespace tarn {
 

@@ -2,17 +2,17 @@
 
 #include <utility>
 
-#include "assets/AssetManager.h"
-#include "assets/CommandTable.h"
-#include "assets/PlayerItemManager.h"
-#include "platform/AudioSession.h"
-#include "platform/MediaEngine.h"
-#include "platform/SystemLog.h"
+#include "log/SystemLog.h"
+#include "objects/AssetManager.h"
+#include "objects/CommandTable.h"
+#include "objects/PlayerItemManager.h"
 #include "proto/AudioFilePlayerStatus.h"
 #include "proto/AudioFilePlayerUpdateContainedIdentifier.h"
 #include "proto/AudioFileQueuePlayerSetItems.h"
 #include "proto/AudioFileQueuePlayerSetRate.h"
 #include "proto/ObjectMessage.h"
+#include "roles/AudioSession.h"
+#include "roles/MediaEngine.h"
 
 namespace tarn {
 

@@ -6,8 +6,8 @@
 #include <string_view>
 #include <vector>
 
-#include "assets/ObjectManager.h"
-#include "assets/ObjectRegistry.h"
+#include "objects/ObjectManager.h"
+#include "objects/ObjectRegistry.h"
 #include "proto/AudioFileQueuePlayer.h"
 #include "queueplayer/QueuePlayer.h"
 

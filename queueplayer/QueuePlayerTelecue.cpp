@@ -1,10 +1,10 @@
 // The media controls of the system: which of them a queue player answers, and what it shows there.
 
-#include "assets/AssetManager.h"
-#include "assets/FileName.h"
-#include "platform/ApplicationRegistry.h"
-#include "platform/MediaItem.h"
+#include "objects/AssetManager.h"
+#include "objects/FileName.h"
 #include "queueplayer/QueuePlayer.h"
+#include "roles/ApplicationRegistry.h"
+#include "roles/MediaItem.h"
 
 namespace tarn {
 

@@ -4,8 +4,8 @@
 #include <optional>
 #include <string>
 
-#include "platform/Error.h"
-#include "platform/Localization.h"
+#include "roles/Error.h"
+#include "roles/Localization.h"
 
 namespace tarn {
 

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "platform/Data.h"
+#include "roles/Data.h"
 
 namespace tarn {
 

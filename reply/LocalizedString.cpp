@@ -1,6 +1,6 @@
 #include "reply/LocalizedString.h"
 
-#include "platform/SystemLog.h"
+#include "log/SystemLog.h"
 
 namespace tarn {
 

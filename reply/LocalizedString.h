@@ -2,7 +2,7 @@
 
 #include <string>
 
-#include "platform/Localization.h"
+#include "roles/Localization.h"
 
 namespace tarn {
 

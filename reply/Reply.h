@@ -4,9 +4,9 @@
 #include <optional>
 #include <utility>
 
-#include "platform/Data.h"
-#include "platform/Error.h"
-#include "platform/ServiceConnection.h"
+#include "roles/Data.h"
+#include "roles/Error.h"
+#include "roles/ServiceConnection.h"
 
 namespace tarn {
 

@@ -2,8 +2,8 @@
 
 #include <utility>
 
-#include "assets/AssetManager.h"
-#include "assets/PlayerItemManager.h"
+#include "objects/AssetManager.h"
+#include "objects/PlayerItemManager.h"
 #include "proto/AudioFilePlayerMessage.h"
 #include "queueplayer/QueuePlayerManager.h"
 

@@ -2,12 +2,12 @@
 
 #include <memory>
 
-#include "platform/Platform.h"
-#include "platform/SerialQueue.h"
-#include "platform/core/LiveObjects.h"
-#include "platform/core/MutexProtected.h"
 #include "reply/EventSink.h"
 #include "reply/Reply.h"
+#include "roles/Platform.h"
+#include "roles/SerialQueue.h"
+#include "threads/LiveObjects.h"
+#include "threads/MutexProtected.h"
 
 namespace tarn {
 

@@ -3,8 +3,8 @@
 #include <memory>
 #include <utility>
 
-#include "platform/Error.h"
 #include "reply/Reply.h"
+#include "roles/Error.h"
 
 namespace tarn {
 

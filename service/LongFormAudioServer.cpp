@@ -6,13 +6,13 @@
 #include <string>
 #include <utility>
 
-#include "platform/Localization.h"
-#include "platform/NowPlayingService.h"
-#include "platform/SystemLog.h"
-#include "platform/core/BlockCache.h"
+#include "log/SystemLog.h"
 #include "proto/VelmoMessage.h"
 #include "reply/Error.h"
+#include "roles/Localization.h"
+#include "roles/NowPlayingService.h"
 #include "service/AudioFilePlayerServer.h"
+#include "wire/BlockCache.h"
 
 namespace tarn {
 

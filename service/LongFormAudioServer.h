@@ -3,12 +3,12 @@
 #include <memory>
 #include <vector>
 
-#include "platform/Platform.h"
-#include "platform/SerialQueue.h"
-#include "platform/ServiceListener.h"
-#include "platform/core/LiveObjects.h"
 #include "reply/EventSink.h"
+#include "roles/Platform.h"
+#include "roles/SerialQueue.h"
+#include "roles/ServiceListener.h"
 #include "service/LongFormAudioCommand.h"
+#include "threads/LiveObjects.h"
 
 namespace tarn {
 

@@ -4,10 +4,10 @@
 #include <memory>
 #include <string_view>
 
-#include "platform/linux/LinuxPlatform.h"
-#include "platform/linux/Process.h"
-#include "platform/linux/log/SystemSink.h"
+#include "log/SystemSink.h"
+#include "service/LinuxPlatform.h"
 #include "service/LongFormAudioServer.h"
+#include "system/Process.h"
 
 namespace {
 

@@ -11,9 +11,9 @@
 
 #include "bench/controls/BusClient.h"
 #include "bench/controls/DeafBus.h"
-#include "platform/linux/controls/BusAddress.h"
-#include "platform/linux/controls/LinuxMediaControls.h"
-#include "platform/linux/controls/applications/DesktopApplicationRegistry.h"
+#include "controls/BusAddress.h"
+#include "controls/LinuxMediaControls.h"
+#include "controls/applications/DesktopApplicationRegistry.h"
 #include "tests/support/CapturedLog.h"
 #include "tests/support/TemporaryFolder.h"
 #include "tests/system/controls/BusListener.h"

@@ -2,7 +2,7 @@
 
 #include <string>
 
-#include "platform/linux/FileDescriptor.h"
+#include "system/FileDescriptor.h"
 
 namespace tarn {
 

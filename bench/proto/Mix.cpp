@@ -5,11 +5,11 @@
 #include <random>
 #include <string>
 
-#include "platform/Error.h"
 #include "proto/AudioFilePlayerCurrentTime.h"
 #include "proto/Envelope.h"
 #include "proto/ErrorUserInfo.h"
 #include "proto/VelmoMessage.h"
+#include "roles/Error.h"
 
 namespace tarn {
 

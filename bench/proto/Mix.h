@@ -2,7 +2,7 @@
 
 #include <vector>
 
-#include "platform/Data.h"
+#include "roles/Data.h"
 
 namespace tarn {
 

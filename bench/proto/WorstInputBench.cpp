@@ -9,8 +9,8 @@
 
 #include "bench/proto/WorstInputs.h"
 #include "bench/support/PeakMemory.h"
-#include "platform/linux/Process.h"
 #include "proto/VelmoMessage.h"
+#include "system/Process.h"
 
 namespace tarn {
 

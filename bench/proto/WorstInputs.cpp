@@ -2,7 +2,7 @@
 
 #include <initializer_list>
 
-#include "platform/core/ProtoReader.h"
+#include "wire/ProtoReader.h"
 
 namespace tarn {
 

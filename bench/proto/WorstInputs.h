@@ -3,7 +3,7 @@
 #include <string>
 #include <vector>
 
-#include "platform/Data.h"
+#include "roles/Data.h"
 
 namespace tarn {
 

@@ -17,8 +17,8 @@
 
 #include <tarn/Client.h>
 
-#include "bench/transport/ServiceProcess.h"
-#include "platform/linux/ipc/Frame.h"
+#include "bench/ipc/ServiceProcess.h"
+#include "ipc/Frame.h"
 #include "proto/Envelope.h"
 #include "proto/VelmoMessage.h"
 

@@ -1,6 +1,6 @@
 #include "tarn/Answer.h"
 
-#include "platform/Error.h"
+#include "roles/Error.h"
 
 namespace tarn::client {
 

@@ -11,9 +11,9 @@
 
 #include "client/libtarn/Decoding.h"
 #include "client/libtarn/EventQueue.h"
-#include "platform/linux/FileDescriptor.h"
 #include "proto/Envelope.h"
 #include "proto/VelmoMessage.h"
+#include "system/FileDescriptor.h"
 
 namespace tarn::client {
 

@@ -13,10 +13,10 @@
 #include <unordered_map>
 #include <utility>
 
-#include "platform/linux/ipc/FrameReader.h"
-#include "platform/linux/ipc/Receiver.h"
-#include "platform/linux/ipc/SocketAddress.h"
-#include "platform/linux/ipc/TransportMessages.h"
+#include "ipc/FrameReader.h"
+#include "ipc/Receiver.h"
+#include "ipc/SocketAddress.h"
+#include "ipc/TransportMessages.h"
 
 namespace tarn::client {
 

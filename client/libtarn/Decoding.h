@@ -4,7 +4,7 @@
 
 #include <tarn/Client.h>
 
-#include "platform/Data.h"
+#include "roles/Data.h"
 
 namespace tarn {
 

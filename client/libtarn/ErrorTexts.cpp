@@ -4,7 +4,7 @@
 #include <optional>
 #include <string_view>
 
-#include "platform/core/localization/TextEncoding.h"
+#include "localization/TextEncoding.h"
 
 namespace tarn {
 

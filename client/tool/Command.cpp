@@ -6,9 +6,9 @@
 #include <type_traits>
 
 #include "client/libtarn/ErrorTexts.h"
-#include "platform/core/ProtoWriter.h"
 #include "proto/AudioFilePlayerCurrentTime.h"
 #include "proto/VelmoMessage.h"
+#include "wire/ProtoWriter.h"
 
 namespace tarn::tool {
 

@@ -4,8 +4,8 @@
 #include <string_view>
 #include <vector>
 
-#include "platform/Data.h"
-#include "platform/core/Dictionary.h"
+#include "roles/Data.h"
+#include "wire/Dictionary.h"
 
 namespace tarn::tool {
 

@@ -8,7 +8,7 @@
 
 #include <tarn/Event.h>
 
-#include "platform/linux/FileDescriptor.h"
+#include "system/FileDescriptor.h"
 
 namespace tarn::tool {
 

@@ -14,7 +14,7 @@
 #include <tarn/Connection.h>
 
 #include "client/tool/Command.h"
-#include "platform/linux/FileDescriptor.h"
+#include "system/FileDescriptor.h"
 
 namespace tarn::tool {
 

@@ -6,7 +6,7 @@
 #include <cmath>
 #include <type_traits>
 
-#include "platform/core/Utf8.h"
+#include "wire/Utf8.h"
 
 namespace tarn::tool {
 

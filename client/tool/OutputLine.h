@@ -3,7 +3,7 @@
 #include <string>
 #include <string_view>
 
-#include "platform/core/Dictionary.h"
+#include "wire/Dictionary.h"
 
 namespace tarn::tool {
 

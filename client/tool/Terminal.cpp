@@ -11,7 +11,7 @@
 #include <string_view>
 #include <utility>
 
-#include "platform/core/Utf8.h"
+#include "wire/Utf8.h"
 
 namespace tarn::tool {
 

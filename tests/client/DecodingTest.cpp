@@ -4,9 +4,9 @@
 #include <gtest/gtest.h>
 
 #include "client/libtarn/ErrorTexts.h"
-#include "platform/core/PropertyList.h"
 #include "proto/Envelope.h"
 #include "proto/VelmoMessage.h"
+#include "wire/PropertyList.h"
 
 namespace tarn {
 namespace {

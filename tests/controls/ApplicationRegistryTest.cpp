@@ -1,4 +1,4 @@
-#include "platform/linux/controls/applications/DesktopApplicationRegistry.h"
+#include "controls/applications/DesktopApplicationRegistry.h"
 
 #include <algorithm>
 
@@ -7,8 +7,8 @@
 #include <sys/mman.h>
 #include <sys/stat.h>
 
-#include "platform/linux/FileDescriptor.h"
-#include "platform/linux/controls/applications/ApplicationFolders.h"
+#include "controls/applications/ApplicationFolders.h"
+#include "system/FileDescriptor.h"
 #include "tests/support/TemporaryFolder.h"
 
 namespace tarn {

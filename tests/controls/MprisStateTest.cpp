@@ -1,4 +1,4 @@
-#include "platform/linux/controls/MprisState.h"
+#include "controls/MprisState.h"
 
 #include <cmath>
 #include <limits>

@@ -1,4 +1,4 @@
-#include "platform/core/RemoteTargets.h"
+#include "controls/RemoteTargets.h"
 
 #include <string>
 #include <thread>

@@ -7,7 +7,7 @@
 #include <future>
 #include <vector>
 
-#include "platform/linux/ipc/SocketListener.h"
+#include "ipc/SocketListener.h"
 #include "tests/ipc/TestServer.h"
 
 namespace tarn {

@@ -7,7 +7,7 @@
 #include <string>
 #include <vector>
 
-#include "platform/ServiceListener.h"
+#include "roles/ServiceListener.h"
 
 namespace tarn {
 

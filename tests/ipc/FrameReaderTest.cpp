@@ -1,4 +1,4 @@
-#include "platform/linux/ipc/FrameReader.h"
+#include "ipc/FrameReader.h"
 #include "tests/ipc/RawClient.h"
 
 #include <fcntl.h>

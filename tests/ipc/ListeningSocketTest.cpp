@@ -1,4 +1,4 @@
-#include "platform/linux/ipc/ListeningSocket.h"
+#include "ipc/ListeningSocket.h"
 
 #include <fcntl.h>
 #include <sys/socket.h>
@@ -9,7 +9,7 @@
 #include <cstdlib>
 #include <stdexcept>
 
-#include "platform/linux/ipc/SocketAddress.h"
+#include "ipc/SocketAddress.h"
 #include "tests/support/TemporaryFolder.h"
 
 namespace tarn {

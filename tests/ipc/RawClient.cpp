@@ -8,9 +8,9 @@
 #include <array>
 #include <cstring>
 
-#include "platform/linux/ipc/Receiver.h"
-#include "platform/linux/ipc/SocketAddress.h"
-#include "platform/linux/ipc/TransportMessages.h"
+#include "ipc/Receiver.h"
+#include "ipc/SocketAddress.h"
+#include "ipc/TransportMessages.h"
 
 namespace tarn {
 

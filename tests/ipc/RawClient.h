@@ -7,8 +7,8 @@
 #include <string_view>
 #include <vector>
 
-#include "platform/Data.h"
-#include "platform/linux/ipc/FrameReader.h"
+#include "ipc/FrameReader.h"
+#include "roles/Data.h"
 
 namespace tarn {
 

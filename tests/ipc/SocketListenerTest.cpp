@@ -1,4 +1,4 @@
-#include "platform/linux/ipc/SocketListener.h"
+#include "ipc/SocketListener.h"
 
 #include <fcntl.h>
 #include <sys/socket.h>
@@ -10,12 +10,12 @@
 #include <mutex>
 #include <thread>
 
-#include "platform/core/LiveObjects.h"
-#include "platform/linux/ipc/SocketAddress.h"
-#include "platform/linux/ipc/TransportMessages.h"
+#include "ipc/SocketAddress.h"
+#include "ipc/TransportMessages.h"
 #include "tests/ipc/TestServer.h"
 #include "tests/ipc/WatchedFile.h"
 #include "tests/support/TemporaryFolder.h"
+#include "threads/LiveObjects.h"
 
 namespace tarn {
 namespace {

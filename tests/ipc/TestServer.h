@@ -5,7 +5,7 @@
 #include <string>
 #include <utility>
 
-#include "platform/linux/ipc/SocketListeners.h"
+#include "ipc/SocketListeners.h"
 #include "tests/ipc/FakeService.h"
 #include "tests/ipc/RawClient.h"
 #include "tests/support/CapturedLog.h"

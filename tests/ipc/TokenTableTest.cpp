@@ -1,4 +1,4 @@
-#include "platform/linux/ipc/TokenTable.h"
+#include "ipc/TokenTable.h"
 
 #include <fcntl.h>
 #include <sys/stat.h>

@@ -6,7 +6,7 @@
 
 #include <gtest/gtest.h>
 
-#include "platform/linux/FileDescriptor.h"
+#include "system/FileDescriptor.h"
 
 namespace tarn {
 

@@ -1,8 +1,8 @@
 #include <gmock/gmock.h>
 
-#include "platform/core/Utf8.h"
-#include "platform/core/log/LogFormat.h"
+#include "log/LogFormat.h"
 #include "tests/support/CapturedLog.h"
+#include "wire/Utf8.h"
 
 namespace tarn {
 namespace {

@@ -7,9 +7,9 @@
 #include <array>
 #include <cstring>
 
-#include "platform/linux/FileDescriptor.h"
-#include "platform/linux/log/JournalSink.h"
-#include "platform/linux/log/StandardErrorSink.h"
+#include "log/JournalSink.h"
+#include "log/StandardErrorSink.h"
+#include "system/FileDescriptor.h"
 #include "tests/support/TemporaryFolder.h"
 
 namespace tarn {

@@ -2,14 +2,14 @@
 
 #include <gtest/gtest.h>
 
-#include "platform/MediaItem.h"
-#include "platform/MediaQueuePlayer.h"
-#include "platform/core/PropertyList.h"
 #include "proto/Envelope.h"
 #include "proto/ErrorUserInfo.h"
 #include "proto/VelmoMessage.h"
+#include "roles/MediaItem.h"
+#include "roles/MediaQueuePlayer.h"
 #include "tests/proto/Hex.h"
 #include "tests/support/CapturedLog.h"
+#include "wire/PropertyList.h"
 
 namespace tarn {
 

@@ -3,9 +3,9 @@
 
 #include <gtest/gtest.h>
 
-#include "platform/core/ProtoReader.h"
 #include "proto/VelmoMessage.h"
 #include "tests/proto/Hex.h"
+#include "wire/ProtoReader.h"
 
 namespace tarn {
 

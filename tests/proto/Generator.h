@@ -6,8 +6,8 @@
 #include <string>
 #include <vector>
 
-#include "platform/core/ProtoWriter.h"
 #include "proto/FieldRow.h"
+#include "wire/ProtoWriter.h"
 
 namespace tarn {
 

@@ -5,8 +5,8 @@
 
 #include <gtest/gtest.h>
 
-#include "platform/core/PropertyList.h"
 #include "tests/support/TemporaryFolder.h"
+#include "wire/PropertyList.h"
 
 namespace tarn {
 

@@ -2,9 +2,9 @@
 
 #include <limits>
 
-#include "platform/MediaQueuePlayer.h"
-#include "platform/core/LiveObjects.h"
+#include "roles/MediaQueuePlayer.h"
 #include "tests/support/ClientStory.h"
+#include "threads/LiveObjects.h"
 
 namespace tarn {
 namespace {

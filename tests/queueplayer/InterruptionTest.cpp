@@ -1,7 +1,7 @@
 #include <gtest/gtest.h>
 
-#include "platform/AudioSession.h"
-#include "platform/MediaQueuePlayer.h"
+#include "roles/AudioSession.h"
+#include "roles/MediaQueuePlayer.h"
 #include "tests/support/ClientStory.h"
 
 namespace tarn {

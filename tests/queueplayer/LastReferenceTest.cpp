@@ -1,8 +1,8 @@
 #include <gtest/gtest.h>
 
-#include "platform/AudioSession.h"
-#include "platform/core/LiveObjects.h"
+#include "roles/AudioSession.h"
 #include "tests/support/ClientStory.h"
+#include "threads/LiveObjects.h"
 
 namespace tarn {
 namespace {

@@ -1,6 +1,6 @@
 #include <gmock/gmock.h>
 
-#include "platform/MediaQueuePlayer.h"
+#include "roles/MediaQueuePlayer.h"
 #include "tests/support/ClientStory.h"
 
 namespace tarn {

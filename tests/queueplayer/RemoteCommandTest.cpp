@@ -2,7 +2,7 @@
 
 #include <optional>
 
-#include "platform/MediaQueuePlayer.h"
+#include "roles/MediaQueuePlayer.h"
 #include "tests/support/ClientStory.h"
 
 namespace tarn {

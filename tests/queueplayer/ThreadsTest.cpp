@@ -5,22 +5,22 @@
 #include <sstream>
 #include <thread>
 
-#include "platform/AudioSession.h"
-#include "platform/NowPlayingService.h"
-#include "platform/core/LiveObjects.h"
-#include "platform/core/LocalNotificationCenter.h"
-#include "platform/core/RemoteTargets.h"
-#include "platform/core/SteadyClock.h"
-#include "platform/core/WorkerQueues.h"
-#include "platform/simulated/SimulatedApplicationRegistry.h"
-#include "platform/simulated/SimulatedLocalization.h"
-#include "platform/simulated/SimulatedSandboxExtension.h"
-#include "platform/simulated/SimulatedServiceListeners.h"
-#include "platform/simulated/media/SimulatedMediaEngine.h"
-#include "tests/media/ThreadLoop.h"
+#include "controls/RemoteTargets.h"
+#include "observation/LocalNotificationCenter.h"
+#include "roles/AudioSession.h"
+#include "roles/NowPlayingService.h"
+#include "simulated/SimulatedApplicationRegistry.h"
+#include "simulated/SimulatedLocalization.h"
+#include "simulated/SimulatedMediaEngine.h"
+#include "simulated/SimulatedSandboxExtension.h"
+#include "simulated/SimulatedServiceListeners.h"
+#include "tests/player/ThreadLoop.h"
 #include "tests/schedules/CommandMix.h"
 #include "tests/support/CapturedLog.h"
 #include "tests/support/MirroredClient.h"
+#include "threads/LiveObjects.h"
+#include "threads/SteadyClock.h"
+#include "threads/WorkerQueues.h"
 
 namespace tarn {
 namespace {

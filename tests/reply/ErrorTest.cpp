@@ -4,9 +4,9 @@
 
 #include <limits>
 
-#include "platform/core/localization/DirectoryLocalization.h"
-#include "platform/simulated/SimulatedLocalization.h"
+#include "localization/DirectoryLocalization.h"
 #include "reply/LocalizedString.h"
+#include "simulated/SimulatedLocalization.h"
 #include "tests/support/CapturedLog.h"
 #include "tests/support/TemporaryFolder.h"
 

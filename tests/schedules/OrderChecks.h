@@ -8,7 +8,7 @@
 #include <string_view>
 #include <vector>
 
-#include "platform/simulated/SimulatedConnection.h"
+#include "simulated/SimulatedConnection.h"
 #include "tests/support/ClientCommands.h"
 
 namespace tarn {

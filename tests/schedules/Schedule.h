@@ -5,9 +5,9 @@
 #include <string>
 #include <vector>
 
-#include "platform/simulated/SimulatedClient.h"
-#include "platform/simulated/SimulatedPlatform.h"
 #include "service/LongFormAudioServer.h"
+#include "simulated/SimulatedClient.h"
+#include "simulated/SimulatedPlatform.h"
 #include "tests/schedules/CommandMix.h"
 #include "tests/schedules/OrderChecks.h"
 

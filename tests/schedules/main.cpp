@@ -5,9 +5,9 @@
 #include <cstdio>
 #include <cstdlib>
 
-#include "platform/SystemLog.h"
-#include "platform/core/LiveObjects.h"
+#include "log/SystemLog.h"
 #include "tests/schedules/Schedule.h"
+#include "threads/LiveObjects.h"
 
 namespace {
 

@@ -11,12 +11,12 @@
 #include <string>
 #include <utility>
 
-#include "platform/core/LiveObjects.h"
 #include "proto/AudioFilePlayerMessage.h"
 #include "proto/VelmoMessage.h"
 #include "tests/service/World.h"
 #include "tests/support/CapturedLog.h"
 #include "tests/support/ClientCommands.h"
+#include "threads/LiveObjects.h"
 
 namespace {
 

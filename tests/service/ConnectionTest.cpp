@@ -4,8 +4,8 @@
 #include <map>
 #include <utility>
 
-#include "platform/simulated/SimulatedPlatform.h"
 #include "service/LongFormAudioServer.h"
+#include "simulated/SimulatedPlatform.h"
 #include "tests/support/CapturedLog.h"
 
 namespace tarn {

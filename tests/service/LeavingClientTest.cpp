@@ -1,9 +1,9 @@
 #include <gtest/gtest.h>
 
-#include "platform/AudioSession.h"
-#include "platform/simulated/SimulatedClient.h"
-#include "platform/simulated/SimulatedPlatform.h"
+#include "roles/AudioSession.h"
 #include "service/LongFormAudioServer.h"
+#include "simulated/SimulatedClient.h"
+#include "simulated/SimulatedPlatform.h"
 #include "tests/support/CapturedLog.h"
 #include "tests/support/ClientCommands.h"
 

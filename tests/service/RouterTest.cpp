@@ -4,8 +4,8 @@
 #include <barrier>
 #include <thread>
 
-#include "assets/AssetManager.h"
-#include "assets/PlayerItemManager.h"
+#include "objects/AssetManager.h"
+#include "objects/PlayerItemManager.h"
 #include "queueplayer/QueuePlayerManager.h"
 #include "service/AudioFilePlayerServer.h"
 #include "tests/service/World.h"

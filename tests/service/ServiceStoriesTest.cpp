@@ -6,12 +6,12 @@
 #include <mutex>
 #include <string>
 
-#include "platform/core/LiveObjects.h"
 #include "proto/VelmoMessage.h"
 #include "service/AudioFilePlayerServer.h"
 #include "tests/service/World.h"
 #include "tests/support/CapturedLog.h"
 #include "tests/support/ClientCommands.h"
+#include "threads/LiveObjects.h"
 
 namespace tarn {
 namespace {

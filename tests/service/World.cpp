@@ -1,8 +1,8 @@
 #include "tests/service/World.h"
 
-#include "platform/MediaEngine.h"
-#include "platform/core/LiveObjects.h"
+#include "roles/MediaEngine.h"
 #include "service/AudioFilePlayerServer.h"
+#include "threads/LiveObjects.h"
 
 namespace tarn {
 

@@ -6,12 +6,12 @@
 #include <optional>
 #include <thread>
 
-#include "platform/core/RemoteTargets.h"
-#include "platform/core/SteadyClock.h"
-#include "platform/core/WorkerQueues.h"
-#include "platform/simulated/SimulatedClient.h"
-#include "platform/simulated/SimulatedPlatform.h"
+#include "controls/RemoteTargets.h"
 #include "service/LongFormAudioServer.h"
+#include "simulated/SimulatedClient.h"
+#include "simulated/SimulatedPlatform.h"
+#include "threads/SteadyClock.h"
+#include "threads/WorkerQueues.h"
 
 namespace tarn {
 

@@ -4,8 +4,8 @@
 #include <set>
 #include <string>
 
-#include "platform/simulated/SimulatedClock.h"
-#include "platform/simulated/SimulatedQueues.h"
+#include "simulated/SimulatedClock.h"
+#include "simulated/SimulatedQueues.h"
 
 namespace tarn {
 namespace {

@@ -8,7 +8,7 @@
 #include <string_view>
 #include <vector>
 
-#include "platform/SystemLog.h"
+#include "log/SystemLog.h"
 
 namespace tarn {
 

@@ -10,7 +10,7 @@
 
 #include <sys/types.h>
 
-#include "platform/linux/FileDescriptor.h"
+#include "system/FileDescriptor.h"
 
 namespace tarn {
 

@@ -5,8 +5,8 @@
 #include <string>
 #include <vector>
 
-#include "platform/Data.h"
 #include "proto/AudioFilePlayerMessage.h"
+#include "roles/Data.h"
 
 /// The commands that a client can send, as the router takes them. An absent identifier is one that the client
 /// left out.

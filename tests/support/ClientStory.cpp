@@ -1,6 +1,6 @@
 #include "tests/support/ClientStory.h"
 
-#include "platform/core/LiveObjects.h"
+#include "threads/LiveObjects.h"
 
 namespace tarn {
 

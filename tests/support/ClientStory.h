@@ -7,7 +7,7 @@
 #include <string>
 #include <vector>
 
-#include "platform/simulated/SimulatedPlatform.h"
+#include "simulated/SimulatedPlatform.h"
 #include "tests/support/CapturedLog.h"
 #include "tests/support/ClientCommands.h"
 #include "tests/support/MirroredClient.h"

@@ -2,10 +2,10 @@
 
 #include <memory>
 
-#include "assets/AssetManager.h"
-#include "assets/PlayerItemManager.h"
-#include "platform/Platform.h"
+#include "objects/AssetManager.h"
+#include "objects/PlayerItemManager.h"
 #include "queueplayer/QueuePlayerManager.h"
+#include "roles/Platform.h"
 #include "service/AudioFilePlayerServer.h"
 #include "tests/support/ClientCommands.h"
 #include "tests/support/Transcript.h"

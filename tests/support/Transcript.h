@@ -5,10 +5,10 @@
 #include <mutex>
 #include <string>
 
-#include "platform/core/Dictionary.h"
-#include "platform/core/ProtoCodable.h"
 #include "reply/EventSink.h"
 #include "reply/Reply.h"
+#include "wire/Dictionary.h"
+#include "wire/ProtoCodable.h"
 
 namespace tarn {
 

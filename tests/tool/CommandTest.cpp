@@ -6,8 +6,8 @@
 #include <stdexcept>
 
 #include "client/tool/OutputLine.h"
-#include "platform/core/PropertyList.h"
 #include "proto/VelmoMessage.h"
+#include "wire/PropertyList.h"
 
 namespace tarn::tool {
 namespace {

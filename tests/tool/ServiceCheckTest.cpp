@@ -7,7 +7,7 @@
 #include <cstring>
 #include <stdexcept>
 
-#include "platform/linux/FileDescriptor.h"
+#include "system/FileDescriptor.h"
 #include "tests/ipc/TestServer.h"
 
 namespace tarn::tool {

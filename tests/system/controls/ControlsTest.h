@@ -6,7 +6,7 @@
 
 #include <gmock/gmock.h>
 
-#include "platform/linux/controls/LinuxMediaControls.h"
+#include "controls/LinuxMediaControls.h"
 #include "tests/support/ChildProcess.h"
 #include "tests/system/controls/BusListener.h"
 #include "tests/system/controls/FakePlayer.h"

@@ -10,7 +10,7 @@
 #include <systemd/sd-bus.h>
 #include <unistd.h>
 
-#include "platform/linux/FileDescriptor.h"
+#include "system/FileDescriptor.h"
 
 namespace tarn {
 

@@ -6,7 +6,7 @@
 #include <string>
 #include <vector>
 
-#include "platform/RemoteCommandCenter.h"
+#include "roles/RemoteCommandCenter.h"
 
 namespace tarn {
 

@@ -1,9 +1,9 @@
 #pragma once
 
-#include "platform/core/LocalNotificationCenter.h"
-#include "platform/linux/media/LinuxMediaEngine.h"
-#include "tests/linux_media/MediaFixture.h"
+#include "observation/LocalNotificationCenter.h"
+#include "service/LinuxMediaEngine.h"
 #include "tests/support/Events.h"
+#include "tests/support/MediaFixture.h"
 #include "tests/system/sound/SoundServerProcess.h"
 
 namespace tarn {

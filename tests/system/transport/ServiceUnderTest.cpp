@@ -8,7 +8,7 @@
 #include <array>
 #include <filesystem>
 
-#include "platform/linux/ipc/SocketAddress.h"
+#include "ipc/SocketAddress.h"
 
 namespace tarn {
 

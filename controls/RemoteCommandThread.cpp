@@ -1,0 +1,60 @@
+#include "controls/RemoteCommandThread.h"
+
+#include <utility>
+
+#include <pthread.h>
+
+namespace tarn {
+
+RemoteCommandThread::RemoteCommandThread(BusLoop& loop, RemoteTargets& targets)
+    : loop_(loop), targets_(targets), thread_([this] { run(); }) {}
+
+RemoteCommandThread::~RemoteCommandThread() {
+    {
+        const std::lock_guard lock(mutex_);
+        ending_ = true;
+    }
+    changed_.notify_one();
+    thread_.join();
+}
+
+bool RemoteCommandThread::deliver(RemoteCommandKind kind, Completion completion) {
+    {
+        const std::lock_guard lock(mutex_);
+        if (waiting_.size() >= limit)
+            return false;
+        waiting_.push_back({kind, std::move(completion)});
+    }
+    changed_.notify_one();
+    return true;
+}
+
+void RemoteCommandThread::deliverUnanswered(RemoteCommandKind kind) {
+    static_cast<void>(deliver(kind, nullptr));
+}
+
+bool RemoteCommandThread::isBusy() {
+    const std::lock_guard lock(mutex_);
+    return delivering_ || !waiting_.empty();
+}
+
+void RemoteCommandThread::run() {
+    pthread_setname_np(pthread_self(), "remote commands");
+    std::unique_lock lock(mutex_);
+    for (;;) {
+        changed_.wait(lock, [this] { return ending_ || !waiting_.empty(); });
+        if (ending_)
+            return;
+        Delivery delivery = std::move(waiting_.front());
+        waiting_.pop_front();
+        delivering_ = true;
+        lock.unlock();
+        const RemoteCommandResult result = targets_.deliver(delivery.kind);
+        if (delivery.completion)
+            loop_.post([completion = std::move(delivery.completion), result] { completion(result); });
+        lock.lock();
+        delivering_ = false;
+    }
+}
+
+} // namespace tarn

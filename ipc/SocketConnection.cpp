@@ -1,0 +1,139 @@
+#include "ipc/SocketConnection.h"
+
+#include <malloc.h>
+
+#include <algorithm>
+#include <utility>
+
+#include "ipc/CallAnswer.h"
+#include "ipc/TransportMessages.h"
+#include "log/SystemLog.h"
+
+namespace tarn {
+
+namespace {
+
+constexpr std::size_t longFrame = 65'536; // no client of good will comes near
+
+} // namespace
+
+SocketConnection::SocketConnection(std::shared_ptr<ConnectionSocket> socket, std::uint64_t key,
+                                   TokenTable& tokens)
+    : socket_(std::move(socket)), key_(key), tokens_(tokens) {}
+
+void SocketConnection::setExportedObject(std::shared_ptr<VLLongFormAudioServerProtocol> object) {
+    exportedObject_ = std::move(object);
+}
+
+void SocketConnection::resume() {
+    resumed_ = true;
+    socket_->startReading();
+}
+
+void SocketConnection::setInterruptionHandler(std::function<void()> handler) {
+    interruptionHandler_ = std::move(handler);
+}
+
+void SocketConnection::setInvalidationHandler(std::function<void()> handler) {
+    invalidationHandler_ = std::move(handler);
+}
+
+void SocketConnection::receiveData(const Data& data) {
+    if (data.size() > FrameHeader::largestBody) {
+        SystemLog::error(__func__, __LINE__, "%{public}s:%d: dropped an event of %d bytes: too long",
+                         data.size());
+        return;
+    }
+    socket_->send(FrameKind::event, 0, data);
+}
+
+bool SocketConnection::handle(std::uint32_t events, Receiver& receiver) {
+    if ((events & EPOLLOUT) != 0)
+        socket_->flush();
+    if ((events & (EPOLLRDHUP | EPOLLHUP | EPOLLERR)) != 0)
+        handleHangUp(receiver);
+    else if ((events & EPOLLIN) != 0)
+        read(receiver);
+    socket_->limitReading();
+    return loss_ == Loss::none;
+}
+
+void SocketConnection::handleHangUp(Receiver& receiver) {
+    if (const auto failure = socket_->failure(); !failure.empty())
+        return interrupt(failure);
+    if (!resumed_)
+        loss_ = Loss::invalidation;
+    while (loss_ == Loss::none)
+        read(receiver);
+}
+
+void SocketConnection::read(Receiver& receiver) {
+    auto received = receiver.receive(socket_->socket());
+    if (received.state == Received::State::truncatedFiles)
+        return interrupt("its files could not be taken");
+    if (received.state == Received::State::ended)
+        loss_ = Loss::invalidation;
+    if (received.bytes.empty())
+        return;
+    std::vector<Frame> frames;
+    const auto broken = reader_.take(received.bytes, std::move(received.files), frames);
+    deliver(std::move(frames));
+    if (broken)
+        interrupt(*broken);
+}
+
+void SocketConnection::deliver(std::vector<Frame> frames) {
+    std::vector<ReceivedCall> calls;
+    std::size_t longest = 0;
+    for (auto& frame : frames) {
+        longest = std::max(longest, frame.body.size());
+        if (frame.kind == FrameKind::extension) {
+            takeExtension(std::move(frame));
+            if (loss_ == Loss::interruption)
+                break; // what came behind it is not looked at
+            continue;
+        }
+        auto callback = std::make_unique<CallAnswer>(socket_, frame.callId, frame.body.size());
+        calls.push_back({std::move(frame.body), std::move(callback)});
+    }
+    if (!calls.empty() && exportedObject_)
+        exportedObject_->receiveData(std::move(calls));
+    if (longest >= longFrame)
+        ::malloc_trim(
+            0); // the heap of a thread would keep up to 64 MiB of what such a frame was decoded into
+}
+
+void SocketConnection::takeExtension(Frame frame) {
+    const auto extension = decodeExtension(frame.body);
+    if (!extension)
+        return interrupt("an extension cannot be decoded");
+    const auto refusal = tokens_.grant(key_, extension->token, extension->path, std::move(frame.file));
+    if (!refusal.empty())
+        SystemLog::error(__func__, __LINE__, "%{public}s:%d: refused a file of client %d: %{public}s", key_,
+                         refusal);
+}
+
+void SocketConnection::interrupt(std::string_view reason) {
+    if (std::exchange(loss_, Loss::interruption) != Loss::interruption)
+        SystemLog::error(__func__, __LINE__, "%{public}s:%d: ended the connection of client %d: %{public}s",
+                         key_, reason);
+}
+
+void SocketConnection::reportLoss(Receiver& receiver) {
+    const auto handler = loss_ == Loss::interruption ? interruptionHandler_ : invalidationHandler_;
+    close(receiver);
+    if (handler)
+        handler();
+}
+
+void SocketConnection::close(Receiver& receiver) {
+    receiver.drain(socket_->socket());
+    socket_->close();
+    tokens_.forget(key_);
+    // They hold the service, which may hold this connection.
+    exportedObject_.reset();
+    interruptionHandler_ = nullptr;
+    invalidationHandler_ = nullptr;
+}
+
+} // namespace tarn

@@ -1,0 +1,68 @@
+#pragma once
+
+#include <cstdint>
+#include <functional>
+#include <memory>
+#include <string_view>
+#include <vector>
+
+#include "ipc/ConnectionSocket.h"
+#include "ipc/FrameReader.h"
+#include "ipc/Receiver.h"
+#include "ipc/TokenTable.h"
+#include "roles/ServiceConnection.h"
+#include "threads/LiveObjects.h"
+
+namespace tarn {
+
+/// One client. Lives on the I/O thread, apart from remoteObjectProxy(), which any thread may use.
+///
+/// The listener holds it until its peer goes, and then asks it to report the loss.
+class SocketConnection final : public ServiceConnection, private VLLongFormAudioClientProtocol {
+public:
+    SocketConnection(std::shared_ptr<ConnectionSocket> socket, std::uint64_t key, TokenTable& tokens);
+
+    void setExportedObject(std::shared_ptr<VLLongFormAudioServerProtocol> object) override;
+    void resume() override;
+    void setInterruptionHandler(std::function<void()> handler) override;
+    void setInvalidationHandler(std::function<void()> handler) override;
+    VLLongFormAudioClientProtocol& remoteObjectProxy() override { return *this; }
+
+    /// Reads and writes what `events` of the poller call for. Once the peer is gone everything that it has
+    /// sent is read. False when the connection is lost.
+    [[nodiscard]] bool handle(std::uint32_t events, Receiver& receiver);
+
+    /// Ends the connection with one line in the log.
+    void interrupt(std::string_view reason);
+
+    /// Closes what is lost and runs the handler that it calls for.
+    void reportLoss(Receiver& receiver);
+
+    /// Closes without a word.
+    void close(Receiver& receiver);
+
+    std::size_t unfinishedBytes() const { return reader_.unfinishedBytes(); }
+    int socket() const { return socket_->socket(); }
+
+private:
+    enum class Loss { none, interruption, invalidation };
+
+    void receiveData(const Data& data) override;
+    void handleHangUp(Receiver& receiver);
+    void read(Receiver& receiver);
+    void deliver(std::vector<Frame> frames);
+    void takeExtension(Frame frame);
+
+    const std::shared_ptr<ConnectionSocket> socket_;
+    const std::uint64_t key_;
+    TokenTable& tokens_;
+    FrameReader reader_{FrameReader::Sender::client};
+    std::shared_ptr<VLLongFormAudioServerProtocol> exportedObject_;
+    std::function<void()> interruptionHandler_;
+    std::function<void()> invalidationHandler_;
+    bool resumed_ = false;
+    Loss loss_ = Loss::none;
+    LiveObject<"connection"> live_;
+};
+
+} // namespace tarn

@@ -1,7 +1,0 @@
-#include "platform/linux/media/sound/PulseLibrary.h"
-
-namespace tarn {
-
-extern "C" [[gnu::visibility("default")]] SoundLibrary* tarnSoundModule1() { return new PulseLibrary; }
-
-} // namespace tarn

@@ -1,0 +1,81 @@
+#include "player/CoreMediaItem.h"
+
+#include <algorithm>
+#include <cassert>
+#include <utility>
+
+#include "log/SystemLog.h"
+#include "player/MediaTimes.h"
+#include "player/PlayQueue.h"
+#include "roles/MediaAsset.h"
+#include "roles/NotificationCenter.h"
+
+namespace tarn {
+
+CoreMediaItem::CoreMediaItem(PlayerEnvironment& environment, std::shared_ptr<MediaAsset> asset)
+    : environment_(environment),
+      asset_(std::move(asset)),
+      observers_(*this, [](const Observable& object, std::string_view keyPath) {
+          return static_cast<const CoreMediaItem&>(object).read(keyPath);
+      }) {}
+
+RegistrationHandle CoreMediaItem::observe(std::string_view keyPath, Block block) {
+    return observers_.observe(keyPath, std::move(block));
+}
+
+MediaStatus CoreMediaItem::status() const {
+    EngineLock lock(environment_);
+    return state_.status;
+}
+
+std::optional<Error> CoreMediaItem::error() const {
+    EngineLock lock(environment_);
+    return state_.error;
+}
+
+MediaTime CoreMediaItem::currentTime() const {
+    EngineLock lock(environment_);
+    return mediaTimeOf(state_.driver ? state_.driver->positionOf(*this) : state_.position);
+}
+
+void CoreMediaItem::seekToTime(MediaTime time) {
+    if (!time.isNumeric()) {
+        SystemLog::error("-[MediaItem seekToTime:]", __LINE__,
+                         "%{public}s:%d: Refused to seek to a time that is not a number.");
+        return;
+    }
+    auto position = std::max(nanosecondsOf(time), std::chrono::nanoseconds(0));
+    if (MediaTime duration = asset_->duration(); duration.isNumeric())
+        position = std::min(position, nanosecondsOf(duration));
+    {
+        EngineLock lock(environment_);
+        state_.playedToEnd = false;
+        if (state_.driver)
+            state_.driver->seek(*this, position);
+        else
+            state_.position = position;
+    }
+    post(timeJumped);
+}
+
+void CoreMediaItem::becomeReady() {
+    {
+        EngineLock lock(environment_);
+        if (state_.status != MediaStatus::unknown)
+            return;
+        state_.status = MediaStatus::readyToPlay;
+    }
+    reportStatus();
+}
+
+void CoreMediaItem::post(std::string_view notification) {
+    environment_.notifications.post(
+        {.name = notification, .sender = static_cast<MediaItem*>(this), .info = {}});
+}
+
+ObservedValue CoreMediaItem::read([[maybe_unused]] std::string_view keyPath) const {
+    assert(keyPath == statusKeyPath);
+    return static_cast<std::int64_t>(status());
+}
+
+} // namespace tarn

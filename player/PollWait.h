@@ -1,0 +1,22 @@
+#pragma once
+
+#include <poll.h>
+
+#include <vector>
+
+#include "player/EventWait.h"
+
+namespace tarn {
+
+/// Sleeps until one of a few descriptors is readable.
+class PollWait final : public EventWait {
+public:
+    void watch(int descriptor, std::function<void()> readable) override;
+    bool wait(bool idle) override;
+
+private:
+    std::vector<pollfd> descriptors_;
+    std::vector<std::function<void()>> calls_; // of the descriptor in the same place
+};
+
+} // namespace tarn

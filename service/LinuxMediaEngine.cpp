@@ -1,0 +1,21 @@
+#include "service/LinuxMediaEngine.h"
+
+namespace tarn {
+
+LinuxMediaEngine::LinuxMediaEngine(NotificationCenter& notifications, FileAccess& files,
+                                   LinuxAudioSession& session)
+    : LinuxMediaParts(session),
+      CoreMediaEngine(LinuxMediaParts::loop, LinuxMediaParts::renderings, LinuxMediaParts::outputs,
+                      notifications),
+      opener_(files, loader) {}
+
+LinuxMediaEngine::~LinuxMediaEngine() { LinuxMediaParts::loop.stop(); }
+
+MediaAssetOutcome LinuxMediaEngine::openAsset(const std::string& URL) {
+    MediaAssetOutcome outcome = opener_.open(URL);
+    if (outcome.asset)
+        outcome.asset = heap_.counted(std::move(outcome.asset));
+    return outcome;
+}
+
+} // namespace tarn

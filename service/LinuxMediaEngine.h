@@ -1,0 +1,39 @@
+#pragma once
+
+#include "media/AssetOpener.h"
+#include "player/CoreMediaEngine.h"
+#include "rendering/LinuxRendering.h"
+#include "service/IdleHeap.h"
+#include "sound/LinuxAudioSession.h"
+#include "sound/SystemOutput.h"
+#include "system/FileAccess.h"
+
+namespace tarn {
+
+/// What the engine of this machine is made of; the engine's base keeps references to it.
+struct LinuxMediaParts {
+    explicit LinuxMediaParts(InterruptionListener& interruptions) : outputs(loop, interruptions) {}
+
+    DecoderLoader loader;
+    LinuxPlayerLoop loop;
+    LinuxRenderingFactory renderings{loop, loader};
+    SystemOutputFactory outputs;
+};
+
+/// The media engine of this machine: FFmpeg reads, the sound server plays.
+class LinuxMediaEngine final : private LinuxMediaParts, public CoreMediaEngine {
+public:
+    /// All of these outlive the engine.
+    LinuxMediaEngine(NotificationCenter& notifications, FileAccess& files, LinuxAudioSession& session);
+
+    /// Silences what still plays.
+    ~LinuxMediaEngine() override;
+
+    MediaAssetOutcome openAsset(const std::string& URL) override;
+
+private:
+    const AssetOpener opener_;
+    IdleHeap heap_{LinuxMediaParts::loop};
+};
+
+} // namespace tarn

@@ -1,0 +1,115 @@
+#include "tests/support/MediaFixture.h"
+
+namespace tarn {
+namespace {
+
+using namespace std::chrono_literals;
+
+struct FileFormat {
+    const char* name;
+    const char* arguments;
+    std::uint32_t rate;
+    bool lossless;
+    bool gapless;               ///< the format tells what its encoder added
+    std::int64_t seekTolerance; ///< in frames
+    double noise = 1e-10;       ///< some decoders make noise of their own
+};
+
+std::ostream& operator<<(std::ostream& stream, const FileFormat& format) { return stream << format.name; }
+
+const FileFormat formats[] = {
+    {"a.wav", "-c:a pcm_s16le", 44100, true, true, 0},
+    {"a24.wav", "-c:a pcm_s24le", 44100, true, true, 0},
+    {"float.wav", "-c:a pcm_f32le", 44100, true, true, 0},
+    {"a.aiff", "-c:a pcm_s16be", 44100, true, true, 0},
+    {"a.flac", "-c:a flac", 44100, true, true, 0},
+    {"a24.flac", "-c:a flac -sample_fmt s32 -bits_per_raw_sample 24", 44100, true, true, 0},
+    {"alac.m4a", "-c:a alac", 44100, true, true, 0},
+    {"aac.m4a", "-c:a aac -b:a 192k", 44100, false, true, 0, 1e-3},
+    {"aac.m4b", "-c:a aac -b:a 192k -f ipod", 44100, false, true, 0, 1e-3},
+    {"raw.aac", "-c:a aac -b:a 192k", 44100, false, false, 0, 1e-3},
+    {"cbr.mp3", "-c:a libmp3lame -b:a 192k", 44100, false, true, 0},
+    {"vbr.mp3", "-c:a libmp3lame -q:a 2", 44100, false, true, 0},
+    {"headerless.mp3", "-c:a libmp3lame -q:a 2 -write_xing 0 -id3v2_version 0", 44100, false, false, 0},
+    {"a.ogg", "-c:a libvorbis -q:a 6", 44100, false, true, 0},
+    {"a.opus", "-c:a libopus -b:a 160k", 48000, false, true, 0},
+    {"opus.webm", "-c:a libopus -b:a 160k", 48000, false, true, 0},
+    {"vorbis.mka", "-c:a libvorbis -q:a 6", 44100, false, false, 45},
+    {"flac.mka", "-c:a flac", 44100, true, false, 45},
+};
+
+struct DecoderTest : testing::TestWithParam<FileFormat> {
+    // An odd length, so that no packet ends with the recording.
+    static constexpr std::size_t length = 211'713;
+
+    DecoderTest() {
+        writeWav(folder / "source.wav", source);
+        path = folder / GetParam().name;
+        encodeAudio(folder / "source.wav", GetParam().arguments, path);
+        asset = openFile(path);
+        if (asset) {
+            reader = std::make_unique<FileReader>(asset->file());
+            decoder = sharedLoader().load()->open(*reader, asset->info()).decoder;
+        }
+    }
+
+    void SetUp() override { ASSERT_NE(decoder, nullptr); }
+
+    std::vector<float> readFrames(std::size_t frames) {
+        PcmBuffer buffer;
+        state = Decoder::State::more;
+        while (state == Decoder::State::more && buffer.frames < frames)
+            state = decoder->read(buffer, frames - buffer.frames);
+        return toFloats(buffer, asset->info().format.sample);
+    }
+
+    const Recording source = makeSweep(length, GetParam().rate, 2);
+    TemporaryFolder folder;
+    std::filesystem::path path;
+    std::shared_ptr<LinuxMediaAsset> asset;
+    std::unique_ptr<FileReader> reader;
+    std::unique_ptr<Decoder> decoder;
+    Decoder::State state = Decoder::State::more;
+};
+
+TEST_P(DecoderTest, DecodesExactlyWhatWasEncoded) {
+    const std::vector<float> whole = toFloats(source);
+    const std::vector<float> decoded = readFrames(2 * length);
+    EXPECT_EQ(state, Decoder::State::ended);
+    EXPECT_EQ(decoded.size() / 2, static_cast<std::size_t>(asset->info().frames.value_or(-1)))
+        << "the duration is not what comes out";
+    if (GetParam().gapless) {
+        ASSERT_EQ(decoded.size(), whole.size());
+    }
+    if (GetParam().lossless) {
+        EXPECT_EQ(difference(decoded, whole, 0, 2), 0.0);
+    } else if (GetParam().gapless) {
+        const std::vector<float> middle(decoded.begin() + 200'000, decoded.begin() + 208'000);
+        EXPECT_EQ(displacement(middle, whole, 100'000, 2, 1'500), 0);
+    }
+}
+
+TEST_P(DecoderTest, SeeksToTheFrame) {
+    const std::vector<float> whole = readFrames(2 * length);
+    const std::int64_t tolerance = GetParam().seekTolerance;
+    for (const std::int64_t target : {150'001L, 3L, 0L, 44'100L, 200'000L, 1'151L, 209'000L, 100'000L}) {
+        decoder->seek(target);
+        const std::vector<float> part = readFrames(2'000);
+        ASSERT_EQ(part.size(), 4'000u) << "at " << target;
+        const std::int64_t shift = displacement(part, whole, target, 2, tolerance + 1);
+        EXPECT_LE(std::abs(shift), tolerance) << "at " << target;
+        EXPECT_LT(difference(part, whole, target + shift, 2), GetParam().noise) << "at " << target;
+    }
+    decoder->seek(static_cast<std::int64_t>(whole.size() / 2) + 10);
+    EXPECT_TRUE(readFrames(100).empty());
+    EXPECT_EQ(state, Decoder::State::ended);
+}
+
+INSTANTIATE_TEST_SUITE_P(Formats, DecoderTest, testing::ValuesIn(formats), [](const auto& information) {
+    std::string name = information.param.name;
+    std::replace(name.begin(), name.end(), '.', '_');
+    return name;
+});
+
+} // namespace
+} // namespace tarn
