@@ -12,7 +12,19 @@
 namespace tarn {
 
 /// What a frame means; the value is its byte on the wire.
-enum class FrameKind : std::uint8_t { call = 1, extension = 2, reply = 3, released = 4, event = 5 };
+enum class FrameKind : std::uint8_t {
+    call = 1,
+    extension = 2,
+    reply = 3,
+    released = 4,
+    event = 5,
+    takenOver = 6, ///< news: another connection is the current one now
+    forgotten = 7, ///< news: another connection was lost, and none is the current one now
+};
+
+/// The body of a call by which a client asks for the two frames with news of its connection. It is also a
+/// valid envelope without a command, so that a service that does not know it releases the call and no more.
+inline constexpr std::array<std::uint8_t, 2> askForNews = {0x78, 0x01};
 
 /// What stands before every body: body length (4 bytes), kind (1), zero (3), call id (8), little-endian.
 struct FrameHeader {

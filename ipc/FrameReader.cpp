@@ -102,6 +102,8 @@ bool FrameReader::mayComeFromSender(FrameKind kind) const {
     case FrameKind::reply:
     case FrameKind::released:
     case FrameKind::event:
+    case FrameKind::takenOver:
+    case FrameKind::forgotten:
         return sender_ == Sender::service;
     }
     return false;

@@ -93,6 +93,10 @@ void SocketConnection::deliver(std::vector<Frame> frames) {
                 break; // what came behind it is not looked at
             continue;
         }
+        if (std::ranges::equal(frame.body, askForNews)) {
+            beginNews(frame.callId);
+            continue;
+        }
         auto callback = std::make_unique<CallAnswer>(socket_, frame.callId, frame.body.size());
         calls.push_back({std::move(frame.body), std::move(callback)});
     }
@@ -111,6 +115,23 @@ void SocketConnection::takeExtension(Frame frame) {
     if (!refusal.empty())
         SystemLog::error(__func__, __LINE__, "%{public}s:%d: refused a file of client %d: %{public}s", key_,
                          refusal);
+}
+
+/// Answered with neither data nor error. A service that knows no news releases the call instead.
+void SocketConnection::beginNews(std::uint64_t callId) {
+    wantsNews_ = true;
+    if (callId != 0)
+        socket_->send(FrameKind::reply, callId, {});
+    if (displaced_)
+        socket_->send(*displaced_, 0, {});
+}
+
+void SocketConnection::displace(FrameKind news) {
+    if (displaced_ == FrameKind::takenOver || displaced_ == news)
+        return;
+    displaced_ = news;
+    if (wantsNews_)
+        socket_->send(news, 0, {});
 }
 
 void SocketConnection::interrupt(std::string_view reason) {

@@ -3,6 +3,7 @@
 #include <cstdint>
 #include <functional>
 #include <memory>
+#include <optional>
 #include <string_view>
 #include <vector>
 
@@ -35,6 +36,10 @@ public:
     /// Ends the connection with one line in the log.
     void interrupt(std::string_view reason);
 
+    /// This connection is not the service's current one any more, for the reason that `news` gives. A client
+    /// that has asked for news is told, once for each reason, and no more after `takenOver`.
+    void displace(FrameKind news);
+
     /// Closes what is lost and runs the handler that it calls for.
     void reportLoss(Receiver& receiver);
 
@@ -52,6 +57,7 @@ private:
     void read(Receiver& receiver);
     void deliver(std::vector<Frame> frames);
     void takeExtension(Frame frame);
+    void beginNews(std::uint64_t callId);
 
     const std::shared_ptr<ConnectionSocket> socket_;
     const std::uint64_t key_;
@@ -61,6 +67,8 @@ private:
     std::function<void()> interruptionHandler_;
     std::function<void()> invalidationHandler_;
     bool resumed_ = false;
+    bool wantsNews_ = false;
+    std::optional<FrameKind> displaced_;
     Loss loss_ = Loss::none;
     LiveObject<"connection"> live_;
 };

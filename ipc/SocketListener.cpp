@@ -69,6 +69,14 @@ void SocketListener::serve(std::uint64_t key, std::uint32_t events) {
         return;
     connections_.erase(found);
     connection->reportLoss(receiver_);
+    displaceOthers(nullptr, FrameKind::forgotten);
+}
+
+/// The service serves the connection that it accepted last, and none once any connection was lost.
+void SocketListener::displaceOthers(const SocketConnection* current, FrameKind news) {
+    for (const auto& [key, connection] : connections_)
+        if (connection.get() != current)
+            connection->displace(news);
 }
 
 void SocketListener::accept() {
@@ -137,7 +145,7 @@ void SocketListener::offer(FileDescriptor descriptor) {
     const auto connection = std::make_shared<SocketConnection>(socket, key, tokens_);
     connections_.emplace(key, connection);
     if (delegate_->listenerShouldAcceptNewConnection(*this, connection))
-        return;
+        return displaceOthers(connection.get(), FrameKind::takenOver);
     connections_.erase(key);
     connection->close(receiver_);
 }

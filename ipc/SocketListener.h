@@ -50,6 +50,7 @@ private:
     bool mayBeOffered(int socket);
     void refuse(std::string_view reason);
     void offer(FileDescriptor descriptor);
+    void displaceOthers(const SocketConnection* current, FrameKind news);
 
     FileDescriptor listeningSocket_;
     FileDescriptor spare_; // given up for a moment when there are no descriptors left, to refuse a client

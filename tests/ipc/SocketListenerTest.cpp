@@ -62,6 +62,36 @@ TEST(SocketListener, AnswersEveryCallOnTheConnectionThatItCameOn) {
     EXPECT_EQ(next->callId, 8U);
 }
 
+void askForNewsAs(RawClient& client, std::uint64_t callId) {
+    ASSERT_TRUE(client.send(FrameKind::call, callId, "\x78\x01"));
+    if (callId != 0) {
+        EXPECT_EQ(client.receive()->kind, FrameKind::reply);
+    }
+}
+
+TEST(SocketListener, TellsThoseWhoAskedThatTheyAreNotTheCurrentClientAnyMore) {
+    TestServer server(echo);
+    auto silent = server.connect();
+    auto first = server.connect();
+    askForNewsAs(first, 1);
+    auto second = std::make_optional(server.connect());
+    EXPECT_EQ(first.receive()->kind, FrameKind::takenOver);
+    auto third = server.connect();
+    askForNewsAs(third, 0);
+    server.service.journalOf(4);
+    askForNewsAs(*second, 2);
+    EXPECT_EQ(second->receive()->kind, FrameKind::takenOver) << "it had been, before it asked";
+    second.reset();
+    EXPECT_EQ(third.receive()->kind, FrameKind::forgotten);
+    const auto fourth = server.connect();
+    EXPECT_EQ(third.receive()->kind, FrameKind::takenOver);
+    for (auto* client : {&silent, &first, &third}) { // no other news has come to them
+        ASSERT_TRUE(client->send(FrameKind::call, 9));
+        EXPECT_EQ(client->receive()->callId, 9U);
+    }
+    EXPECT_EQ(server.service.callCount(), 3U) << "the service hears nothing of it";
+}
+
 TEST(SocketListener, SendsNothingForACallThatWantsNoAnswer) {
     TestServer server(echo);
     auto client = server.connect();
