@@ -2,10 +2,10 @@
 
 #include <iostream>
 
-#include "client/tool/OutputLine.h"
-#include "client/tool/ServiceCheck.h"
-#include "client/tool/Terminal.h"
-#include "client/tool/TimeText.h"
+#include "client/tool/display/OutputLine.h"
+#include "client/tool/display/Terminal.h"
+#include "client/tool/display/TimeText.h"
+#include "client/tool/play/ServiceCheck.h"
 
 namespace tarn::tool {
 

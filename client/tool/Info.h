@@ -3,7 +3,7 @@
 #include <string>
 #include <vector>
 
-#include "client/tool/Tracks.h"
+#include "client/tool/play/Tracks.h"
 
 namespace tarn::tool {
 

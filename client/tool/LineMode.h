@@ -4,7 +4,7 @@
 #include <string>
 #include <vector>
 
-#include "client/tool/OutputLine.h"
+#include "client/tool/display/OutputLine.h"
 
 namespace tarn::tool {
 

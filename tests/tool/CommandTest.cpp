@@ -5,7 +5,7 @@
 
 #include <stdexcept>
 
-#include "client/tool/OutputLine.h"
+#include "client/tool/display/OutputLine.h"
 #include "proto/VelmoMessage.h"
 #include "wire/PropertyList.h"
 

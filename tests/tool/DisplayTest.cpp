@@ -4,9 +4,9 @@
 #include <clocale>
 #include <cmath>
 
-#include "client/tool/LiveLine.h"
-#include "client/tool/Terminal.h"
-#include "client/tool/TimeText.h"
+#include "client/tool/display/LiveLine.h"
+#include "client/tool/display/Terminal.h"
+#include "client/tool/display/TimeText.h"
 
 namespace tarn::tool {
 namespace {

@@ -26,6 +26,12 @@ def make_song(path, seconds):
         song.writeframes(bytes(int(2 * 8000 * seconds)))
 
 
+def wait_for_line(tool, beginning):
+    while not tool.stdout.readline().startswith(beginning):
+        if tool.poll() is not None:
+            raise AssertionError(f"it ended without {beginning}")
+
+
 class TheTool(unittest.TestCase):
     def setUp(self):
         self.folder = pathlib.Path(self.enterContext(tempfile.TemporaryDirectory()))
@@ -50,6 +56,20 @@ class TheTool(unittest.TestCase):
             finally:
                 process.kill()
                 process.wait()
+
+    @contextlib.contextmanager
+    def bus(self):
+        """A session bus, from now on that of the service and the tool."""
+        address = f"unix:path={self.folder}/bus"
+        process = subprocess.Popen(["dbus-daemon", "--session", "--nofork", "--print-address", "--address", address],
+                                   stdout=subprocess.PIPE, stderr=subprocess.DEVNULL)
+        try:
+            process.stdout.readline()  # it listens
+            self.environment["DBUS_SESSION_BUS_ADDRESS"] = address
+            yield
+        finally:
+            process.kill()
+            process.communicate()
 
     @contextlib.contextmanager
     def start(self, *words, stdin=subprocess.DEVNULL, stdout=subprocess.PIPE, stderr=subprocess.STDOUT):
@@ -80,7 +100,7 @@ class TheTool(unittest.TestCase):
             self.assertTrue(output.endswith("Stopped at the end.\n"), output)
 
     def test_refuses_what_it_cannot_do_before_it_connects(self):
-        for words in ([], ["play"], ["play", "--rate", "0", "a"], ["play", "--rate", "nan", "a"],
+        for words in ([], ["seek", "x"], ["rate", "-1"], ["volume", "loud"], ["play", "--rate", "0", "a"], ["play", "--rate", "nan", "a"],
                       ["play", "--rate", "8", "a"], ["play", "--rate", "-1", "a", "b"], ["play", "--from", "x", "a"],
                       ["sing"]):
             status, output = self.run_tool(*words)
@@ -88,7 +108,7 @@ class TheTool(unittest.TestCase):
             self.assertNotEqual(output, "", words)
         status, output = self.run_tool("play", "short.wav")
         self.assertEqual(status, 1)
-        self.assertIn("Is tarnd running?", output)
+        self.assertIn("systemctl --user enable --now tarnd.socket", output)
 
     def test_writes_a_line_whatever_a_file_is_called(self):
         for name in (b"new\nline.wav", b"bytes\xff\xfe.wav", b"escape\x1b[2J.wav"):
@@ -116,6 +136,35 @@ class TheTool(unittest.TestCase):
                 service.kill()
                 self.assertIn(b"connection to the service was lost", tool.communicate(timeout=DEADLINE)[0])
             self.assertEqual(tool.returncode, 1)
+
+    def test_controls_what_plays_without_taking_over(self):
+        def control(*words):
+            status, output = self.run_tool(*words)
+            self.assertEqual((status, output), (0, ""), words)
+
+        def status():
+            return json.loads(self.run_tool("status", "--json")[1])
+
+        with self.bus(), self.service():
+            self.assertEqual(self.run_tool("status"), (0, "Nothing plays.\n"))
+            self.assertEqual(status(), {"type": "status", "state": "stopped"})
+            for words in (["pause"], ["play"]):
+                self.assertEqual(self.run_tool(*words),
+                                 (1, "tarnctl: nothing plays\nStart something: tarnctl play FILE...\n"))
+            with self.start("play", "long.wav", "long.wav") as player, \
+                    self.start("status", "--follow") as follower:
+                player.stdout.readline()
+                wait_for_line(follower, b"Playing long.wav")
+                self.assertLessEqual({"state": "playing", "title": "long.wav", "duration": 60}.items(), status().items())
+                for words, state in ((["pause"], "paused"), (["play"], "playing"), (["toggle"], "paused"),
+                                     (["toggle"], "playing"), (["stop"], "paused"), (["play"], "playing")):
+                    control(*words)
+                    self.assertEqual(status()["state"], state, words)
+                control("next")
+                wait_for_line(follower, b"Paused long.wav")
+                player.send_signal(signal.SIGINT)
+                self.assertEqual(player.communicate(timeout=DEADLINE)[0].count(b"Playing"), 1)
+                wait_for_line(follower, b"Nothing plays.")
 
     def test_goes_on_when_the_one_before_it_leaves_late(self):
         with self.service(), self.start("play", "long.wav") as first:

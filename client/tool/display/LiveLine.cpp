@@ -1,12 +1,12 @@
-#include "client/tool/LiveLine.h"
+#include "client/tool/display/LiveLine.h"
 
 #include <algorithm>
 #include <array>
 #include <cmath>
 #include <cstdio>
 
-#include "client/tool/Terminal.h"
-#include "client/tool/TimeText.h"
+#include "client/tool/display/Terminal.h"
+#include "client/tool/display/TimeText.h"
 
 namespace tarn::tool {
 

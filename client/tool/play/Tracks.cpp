@@ -1,4 +1,4 @@
-#include "client/tool/Tracks.h"
+#include "client/tool/play/Tracks.h"
 
 #include <unistd.h>
 
@@ -8,7 +8,7 @@
 #include <system_error>
 #include <utility>
 
-#include "client/tool/ServiceCheck.h"
+#include "client/tool/play/ServiceCheck.h"
 
 namespace tarn::tool {
 

@@ -1,4 +1,4 @@
-#include "client/tool/ServiceCheck.h"
+#include "client/tool/play/ServiceCheck.h"
 
 #include <cstdint>
 #include <future>

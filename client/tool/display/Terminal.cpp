@@ -1,4 +1,4 @@
-#include "client/tool/Terminal.h"
+#include "client/tool/display/Terminal.h"
 
 #include <sys/ioctl.h>
 #include <unistd.h>

@@ -1,4 +1,4 @@
-#include "client/tool/OutputLine.h"
+#include "client/tool/display/OutputLine.h"
 
 #include <algorithm>
 #include <array>

@@ -1,4 +1,4 @@
-#include "client/tool/Play.h"
+#include "client/tool/play/Play.h"
 
 #include <poll.h>
 #include <sys/signalfd.h>
@@ -14,11 +14,12 @@
 #include <optional>
 #include <set>
 
-#include "client/tool/EventInbox.h"
-#include "client/tool/LiveLine.h"
-#include "client/tool/ServiceCheck.h"
-#include "client/tool/Terminal.h"
-#include "client/tool/TimeText.h"
+#include "client/tool/display/LiveLine.h"
+#include "client/tool/display/Problem.h"
+#include "client/tool/display/Terminal.h"
+#include "client/tool/display/TimeText.h"
+#include "client/tool/play/EventInbox.h"
+#include "client/tool/play/ServiceCheck.h"
 
 namespace tarn::tool {
 
@@ -357,6 +358,10 @@ private:
 
 } // namespace
 
-int runPlay(const PlayOptions& options) { return PlaySession(options).run(); }
+int runPlay(const PlayOptions& options) {
+    if (options.rate < 0 && options.paths.size() > 1)
+        throw Problem("only one file can be played backwards", "Name one, or give a --rate over 0.", 2);
+    return PlaySession(options).run();
+}
 
 } // namespace tarn::tool

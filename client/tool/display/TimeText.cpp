@@ -1,4 +1,4 @@
-#include "client/tool/TimeText.h"
+#include "client/tool/display/TimeText.h"
 
 #include <charconv>
 #include <cmath>
