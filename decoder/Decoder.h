@@ -4,31 +4,14 @@
 #include <cstdint>
 #include <memory>
 #include <optional>
-#include <string>
 
 #include "decoder/ByteSource.h"
+#include "mediaprotocol/AudioFileInfo.h"
 #include "pcm/PcmBuffer.h"
 #include "pcm/PcmFormat.h"
 #include "roles/Error.h"
 
 namespace tarn {
-
-/// What an audio file says about itself.
-struct AudioFileInfo {
-    /// How the decoder hands its frames out; 16-bit samples stay s16, wider integers are s32 (high bits
-    /// used), the rest is f32.
-    PcmFormat format;
-
-    /// Where the audible part begins and how long it is, in frames of the decoder's raw output: what encoders
-    /// put before and behind it is left out. The length is exact; none when the file does not tell.
-    std::int64_t firstFrame = 0;
-    std::optional<std::int64_t> frames;
-
-    // Valid UTF-8 without control characters, cut to a sane length.
-    std::optional<std::string> title;
-    std::optional<std::string> album;
-    std::optional<std::string> artist;
-};
 
 /// One file being decoded, from any frame on. Used by one thread.
 class Decoder {

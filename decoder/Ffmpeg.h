@@ -10,7 +10,7 @@ extern "C" {
 #include <memory>
 #include <string>
 
-#include "decoder/MediaError.h"
+#include "mediaprotocol/MediaError.h"
 
 namespace tarn {
 

@@ -5,10 +5,10 @@
 #include <cerrno>
 #include <cstring>
 
-#include "decoder/MediaError.h"
 #include "media/FileReader.h"
 #include "media/FileURL.h"
 #include "media/LinuxMediaAsset.h"
+#include "mediaprotocol/MediaError.h"
 
 namespace tarn {
 

@@ -4,7 +4,7 @@
 #include <cassert>
 #include <cmath>
 
-#include "decoder/MediaError.h"
+#include "mediaprotocol/MediaError.h"
 #include "player/MediaTimes.h"
 #include "rendering/RemoteRendering.h"
 

@@ -7,8 +7,8 @@
 #include <mutex>
 #include <utility>
 
-#include "decoder/MediaError.h"
 #include "media/DeadlineCall.h"
+#include "mediaprotocol/MediaError.h"
 
 namespace tarn {
 

@@ -3,7 +3,7 @@
 #include <cstdlib>
 #include <semaphore>
 
-#include "decoder/MediaError.h"
+#include "mediaprotocol/MediaError.h"
 #include "observation/LocalNotificationCenter.h"
 #include "player/CoreMediaEngine.h"
 #include "player/LinuxPlayerLoop.h"

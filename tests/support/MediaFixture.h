@@ -9,10 +9,10 @@
 #include <memory>
 #include <vector>
 
-#include "decoder/MediaError.h"
 #include "media/AssetOpener.h"
 #include "media/FileReader.h"
 #include "media/LinuxMediaAsset.h"
+#include "mediaprotocol/MediaError.h"
 #include "tests/support/AudioFixture.h"
 #include "tests/support/TemporaryFolder.h"
 

@@ -1,0 +1,24 @@
+#pragma once
+
+#include <cstdint>
+
+namespace tarn {
+
+/// What a renderer made in one piece: `frames` output frames that play the media evenly from `start` to `end`
+/// (nanoseconds). The next span starts where this one ends.
+struct MediaSpan {
+    enum class State : std::uint32_t {
+        more,   ///< the media goes on behind it
+        ended,  ///< it is the last one, and may hold no frames
+        failed, ///< nothing can be rendered behind it; it may hold no frames
+    };
+
+    std::uint32_t generation = 0; ///< of the seek that it follows on
+    std::uint32_t frames = 0;
+    State state = State::more;
+    std::uint32_t zero = 0;
+    std::int64_t start = 0;
+    std::int64_t end = 0;
+};
+
+} // namespace tarn
