@@ -35,6 +35,8 @@ std::string Completion::problem() const {
         return error.summary();
     case Outcome::connectionLost:
         return "the connection to the service was lost";
+    case Outcome::takenOver:
+        return "another program has taken over the service";
     }
     return {};
 }

@@ -3,8 +3,10 @@
 #include <chrono>
 #include <condition_variable>
 #include <deque>
+#include <iterator>
 #include <mutex>
 #include <optional>
+#include <vector>
 
 #include <tarn/Event.h>
 
@@ -18,14 +20,15 @@ public:
     /// The oldest gives way when there are too many.
     void push(client::Event event) {
         std::lock_guard lock(mutex_);
-        ended_ = std::holds_alternative<client::ConnectionLost>(event);
+        ended_ = std::holds_alternative<client::ConnectionLost>(event) ||
+                 std::holds_alternative<client::TakenOver>(event);
         if (events_.size() == mostEvents)
             events_.pop_front();
         events_.push_back(std::move(event));
         changed_.notify_all(); // it may be the last one
     }
 
-    /// None when the time came first, or when the last event was ConnectionLost.
+    /// None when the time came first, or when the last event was one that nothing follows.
     std::optional<client::Event> pop(std::optional<std::chrono::steady_clock::time_point> until) {
         std::unique_lock lock(mutex_);
         const auto ready = [&] { return !events_.empty() || ended_; };
@@ -40,10 +43,23 @@ public:
         return event;
     }
 
-    /// For a new connection: drops what waits.
+    std::vector<client::Event> popAll() {
+        std::lock_guard lock(mutex_);
+        std::vector<client::Event> all(std::make_move_iterator(events_.begin()),
+                                       std::make_move_iterator(events_.end()));
+        events_.clear();
+        return all;
+    }
+
+    /// Would pop() return at once?
+    bool isReady() {
+        std::lock_guard lock(mutex_);
+        return !events_.empty() || ended_;
+    }
+
+    /// For a new connection: more events come.
     void begin() {
         std::lock_guard lock(mutex_);
-        events_.clear();
         ended_ = false;
     }
 

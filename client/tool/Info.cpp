@@ -40,7 +40,7 @@ void printJSON(const Track& track) {
 } // namespace
 
 int runInfo(const InfoOptions& options) {
-    client::Client client({.socketPath = options.socketPath});
+    client::Client client({.socketPath = options.socketPath, .reconnectLimit = std::chrono::seconds(30)});
     checkThatServiceAnswers(client);
     int status = 0;
     const auto tracks = openTracks(client, options.paths, options.access,

@@ -192,6 +192,9 @@ private:
                               [&](const client::ConnectionLost&) {
                                   stop("Stopped: the connection to the service was lost.", 1);
                               },
+                              [&](const client::TakenOver&) {
+                                  stop("Stopped: another program has taken over the service.", 1);
+                              },
                               [](const auto&) {}},
                    event);
     }
@@ -353,7 +356,8 @@ private:
     std::string stopReason_;
     int status_ = 0;
     client::Client client_{{.socketPath = options_.socketPath,
-                            .onEvent = [this](const client::Event& event) { inbox_.put(event); }}};
+                            .onEvent = [this](const client::Event& event) { inbox_.put(event); },
+                            .reconnectLimit = 2s}};
 };
 
 } // namespace

@@ -5,7 +5,7 @@
 
 #include <gtest/gtest.h>
 
-#include <array>
+#include <cstring>
 #include <filesystem>
 
 #include "ipc/SocketAddress.h"
@@ -52,14 +52,18 @@ std::size_t ServiceUnderTest::openFiles() const { return entriesOf("/fd"); }
 
 std::size_t ServiceUnderTest::threads() const { return entriesOf("/task"); }
 
-std::string ServiceUnderTest::song() const {
-    constexpr std::size_t samples = 16'000;
-    constexpr std::array<unsigned char, 44> header = {
-        'R', 'I', 'F', 'F', 0xA4, 0x3E, 0,   0,   'W', 'A',  'V',  'E',  'f', 'm',  't',
-        ' ', 16,  0,   0,   0,    1,    0,   1,   0,   0x40, 0x1F, 0,    0,   0x80, 0x3E,
-        0,   0,   2,   0,   16,   0,    'd', 'a', 't', 'a',  0x80, 0x3E, 0,   0};
-    const std::string content(header.begin(), header.end());
-    return client::fileURL(folder_.write("song.wav", content + std::string(samples, '\0')).string());
+std::string ServiceUnderTest::song(const std::string& name, std::uint32_t seconds) const {
+    constexpr std::uint32_t rate = 8'000;
+    std::string content("RIFF....WAVEfmt \x10\0\0\0\1\0\1\0....\0\0\0\0\1\0\x08\0data....", 44);
+    const auto put = [&](std::size_t place, std::uint32_t value) {
+        std::memcpy(&content[place], &value, sizeof(value));
+    };
+    put(4, 36 + rate * seconds);
+    put(24, rate);
+    put(28, rate);
+    put(40, rate * seconds);
+    return client::fileURL(
+        folder_.write(name, content + std::string(std::size_t{rate} * seconds, '\x80')).string());
 }
 
 bool isServed(client::Client& client, const std::string& songURL) {

@@ -36,8 +36,8 @@ public:
     std::size_t openFiles() const;
     std::size_t threads() const;
 
-    /// A second of silence, and its URL.
-    std::string song() const;
+    /// Makes a file of silence; its URL.
+    std::string song(const std::string& name = "song.wav", std::uint32_t seconds = 1) const;
 
 private:
     std::size_t entriesOf(const char* folder) const;

@@ -30,13 +30,14 @@ enum class Outcome {
     failed,         ///< with an error
     released,       ///< the service is done with it and gives no answer, as most commands do that succeed
     connectionLost, ///< the connection ended first: whether the command was carried out is not known
+    takenOver,      ///< not carried out: another program has taken over the service before
 };
 
 /// The answer to a call, as it came.
 struct Answer {
     Outcome outcome = Outcome::connectionLost;
-    std::optional<Bytes> data; ///< when answered, and even then maybe absent
-    Error error;               ///< when failed
+    std::optional<Bytes> data{}; ///< when answered, and even then maybe absent
+    Error error{};               ///< when failed
 };
 
 /// How a command ended that has no answer of its own.
