@@ -55,8 +55,9 @@ void appendInterleaved(const AVFrame& frame, int first, int count, const PcmForm
         const std::size_t frameSize = format.bytesPerFrame();
         const auto* from = reinterpret_cast<const std::byte*>(frame.extended_data[0]) +
                            static_cast<std::size_t>(first) * frameSize;
-        buffer.bytes.insert(buffer.bytes.end(), from, from + static_cast<std::size_t>(count) * frameSize);
-    } else if (packed == AV_SAMPLE_FMT_U8) {
+        return buffer.append(from, static_cast<std::size_t>(count), frameSize);
+    }
+    if (packed == AV_SAMPLE_FMT_U8) {
         append<std::uint8_t>(frame, first, count, planar, buffer);
     } else if (packed == AV_SAMPLE_FMT_S16) {
         append<std::int16_t>(frame, first, count, planar, buffer);

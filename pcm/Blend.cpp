@@ -30,9 +30,7 @@ PcmBuffer FrameMemory::get(std::int64_t index, std::size_t frames) const {
     while (buffer.frames < frames) {
         const std::size_t place = placeOf(index + static_cast<std::int64_t>(buffer.frames));
         const std::size_t count = std::min(frames - buffer.frames, capacity_ - place);
-        const auto from = bytes_.begin() + static_cast<std::ptrdiff_t>(place * frameSize_);
-        buffer.bytes.insert(buffer.bytes.end(), from, from + static_cast<std::ptrdiff_t>(count * frameSize_));
-        buffer.frames += count;
+        buffer.append(bytes_.data() + place * frameSize_, count, frameSize_);
     }
     return buffer;
 }

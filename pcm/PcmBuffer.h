@@ -11,6 +11,12 @@ struct PcmBuffer {
     std::size_t frames = 0;
     std::vector<std::byte> bytes;
 
+    /// Copies `count` frames of `frameSize` bytes each behind what is there.
+    void append(const std::byte* from, std::size_t count, std::size_t frameSize) {
+        bytes.insert(bytes.end(), from, from + count * frameSize);
+        frames += count;
+    }
+
     void clear() {
         frames = 0;
         bytes.clear();

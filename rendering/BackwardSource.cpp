@@ -32,9 +32,7 @@ Decoder::State BackwardSource::read(PcmBuffer& buffer, std::size_t maxFrames) {
         if (left_ == 0 && !readPiece())
             return Decoder::State::failed;
         --left_;
-        const auto from = piece_.bytes.begin() + static_cast<std::ptrdiff_t>(left_ * size);
-        buffer.bytes.insert(buffer.bytes.end(), from, from + static_cast<std::ptrdiff_t>(size));
-        ++buffer.frames;
+        buffer.append(piece_.bytes.data() + left_ * size, 1, size);
     }
     return left_ == 0 && position_ == 0 ? Decoder::State::ended : Decoder::State::more;
 }

@@ -92,9 +92,7 @@ void ForwardSource::convertMore() {
 
 void ForwardSource::moveOut(PcmBuffer& buffer, std::size_t frames) {
     const std::size_t size = to_.bytesPerFrame();
-    const auto from = converted_.bytes.begin() + static_cast<std::ptrdiff_t>(taken_ * size);
-    buffer.bytes.insert(buffer.bytes.end(), from, from + static_cast<std::ptrdiff_t>(frames * size));
-    buffer.frames += frames;
+    buffer.append(converted_.bytes.data() + taken_ * size, frames, size);
     taken_ += frames;
     position_ += static_cast<std::int64_t>(frames);
 }

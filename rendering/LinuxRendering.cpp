@@ -127,9 +127,7 @@ void LinuxRendering::fillStretched(std::size_t frames) {
 std::size_t LinuxRendering::takeStretched(PcmBuffer& buffer, std::size_t maxFrames) {
     const std::size_t count = std::min(maxFrames, stretched_.frames - taken_);
     const std::size_t size = format_.bytesPerFrame();
-    const auto from = stretched_.bytes.begin() + static_cast<std::ptrdiff_t>(taken_ * size);
-    buffer.bytes.insert(buffer.bytes.end(), from, from + static_cast<std::ptrdiff_t>(count * size));
-    buffer.frames += count;
+    buffer.append(stretched_.bytes.data() + taken_ * size, count, size);
     taken_ += count;
     return count;
 }

@@ -185,9 +185,7 @@ RenderedSpan RemoteRendering::Worker::takeFrom(Piece& piece, PcmBuffer& buffer, 
     span.frames = count;
     if (count > 0) {
         const std::size_t size = piece.buffer.bytes.size() / piece.buffer.frames;
-        const std::byte* from = piece.buffer.bytes.data() + piece.taken * size;
-        buffer.bytes.insert(buffer.bytes.end(), from, from + count * size);
-        buffer.frames += count;
+        buffer.append(piece.buffer.bytes.data() + piece.taken * size, count, size);
         piece.taken += count;
     }
     return span;
