@@ -4,8 +4,8 @@
 #include <cstdint>
 #include <functional>
 
+#include "player/EventLoop.h"
 #include "player/Output.h"
-#include "player/PlayerLoop.h"
 
 namespace tarn {
 
@@ -15,7 +15,7 @@ namespace tarn {
 /// growing distances while the clock stands: an output that does not get on costs next to nothing.
 class EndTimer {
 public:
-    EndTimer(PlayerLoop& loop, std::function<void()> call) : loop_(loop), call_(std::move(call)) {}
+    EndTimer(EventLoop& loop, std::function<void()> call) : loop_(loop), call_(std::move(call)) {}
 
     /// May be called as often as one likes.
     void set(const Output& output, std::int64_t frame);
@@ -25,7 +25,7 @@ public:
 private:
     void arm(std::chrono::nanoseconds time);
 
-    PlayerLoop& loop_;
+    EventLoop& loop_;
     const std::function<void()> call_;
     RegistrationHandle timer_;
     bool pending_ = false;

@@ -7,7 +7,7 @@
 
 namespace tarn {
 
-std::shared_ptr<CoreMediaItem> PlayQueue::current() const {
+std::shared_ptr<PlaybackItem> PlayQueue::current() const {
     return entries_.empty() ? nullptr : entries_.front().item;
 }
 
@@ -17,14 +17,14 @@ std::int64_t PlayQueue::heard() const {
     return clock_ ? clock_->heardFrame() : 0;
 }
 
-std::chrono::nanoseconds PlayQueue::positionOf(const CoreMediaItem& item) const {
+std::chrono::nanoseconds PlayQueue::positionOf(const PlaybackItem& item) const {
     const Entry& entry = *byItem_.at(&item);
     if (entry.moved)
         return entry.position;
     return timeline_.positionOf(entry.id, heard()).value_or(entry.position);
 }
 
-bool PlayQueue::insert(std::shared_ptr<CoreMediaItem> item, const CoreMediaItem* after) {
+bool PlayQueue::insert(std::shared_ptr<PlaybackItem> item, const PlaybackItem* after) {
     if (byItem_.contains(item.get()))
         return false;
     auto behind = byItem_.find(after);
@@ -40,7 +40,7 @@ bool PlayQueue::insert(std::shared_ptr<CoreMediaItem> item, const CoreMediaItem*
 
 /// The item's position comes along, out of the queue that drove it before.
 void PlayQueue::enter(Entry& entry) {
-    CoreMediaItem::State& state = entry.item->state();
+    PlaybackItem::State& state = entry.item->state();
     if (!std::exchange(state.playedToEnd, false))
         entry.position = state.driver ? state.driver->positionOf(*entry.item) : state.position;
     entry.driverBefore = std::exchange(state.driver, this);
@@ -48,7 +48,7 @@ void PlayQueue::enter(Entry& entry) {
 
 /// The item's position stays with it when no other queue holds it.
 void PlayQueue::leave(Entry& entry) {
-    CoreMediaItem::State& state = entry.item->state();
+    PlaybackItem::State& state = entry.item->state();
     if (state.driver == this)
         state.position = positionOf(*entry.item);
     PlayQueue** driver = &state.driver;
@@ -66,7 +66,7 @@ PlayQueue::Entries PlayQueue::take(Entries::iterator entry) {
     return taken;
 }
 
-PlayQueue::Entries PlayQueue::remove(const CoreMediaItem& item) {
+PlayQueue::Entries PlayQueue::remove(const PlaybackItem& item) {
     auto found = byItem_.find(&item);
     return found == byItem_.end() ? Entries() : take(found->second);
 }
@@ -80,7 +80,7 @@ PlayQueue::Entries PlayQueue::removeAll() {
     return taken;
 }
 
-void PlayQueue::seek(const CoreMediaItem& item, std::chrono::nanoseconds position) {
+void PlayQueue::seek(const PlaybackItem& item, std::chrono::nanoseconds position) {
     Entry& entry = *byItem_.at(&item);
     entry.position = position;
     entry.moved = true;
@@ -207,7 +207,7 @@ std::optional<PlayQueue::Ending> PlayQueue::fail(EntryId id, const Error& error)
 
 PlayQueue::Ending PlayQueue::end(Entries::iterator entry, Timeline::End how,
                                  const std::optional<Error>& error) {
-    CoreMediaItem::State& state = entry->item->state();
+    PlaybackItem::State& state = entry->item->state();
     Ending ending;
     ending.how = how;
     ending.driven = state.driver == this;

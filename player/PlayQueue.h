@@ -8,8 +8,8 @@
 #include <optional>
 #include <unordered_map>
 
-#include "player/CoreMediaItem.h"
 #include "player/Output.h"
+#include "player/PlaybackItem.h"
 #include "player/Timeline.h"
 
 namespace tarn {
@@ -23,7 +23,7 @@ class PlayQueue {
 public:
     struct Entry {
         EntryId id;
-        std::shared_ptr<CoreMediaItem> item;
+        std::shared_ptr<PlaybackItem> item;
         std::chrono::nanoseconds position; ///< where it begins, or goes on, when no span tells
         bool moved;                        ///< a seek that has not been rendered yet
         PlayQueue* driverBefore;           ///< drives the item again when this queue lets it go, if any
@@ -37,18 +37,18 @@ public:
 
     // What the player shows.
     const Entries& entries() const { return entries_; }
-    std::shared_ptr<CoreMediaItem> current() const;
+    std::shared_ptr<PlaybackItem> current() const;
     float rate() const { return rate_; }
-    std::chrono::nanoseconds positionOf(const CoreMediaItem& item) const;
+    std::chrono::nanoseconds positionOf(const PlaybackItem& item) const;
 
     // Edits.
     /// Behind `after`, or at the end when it is null or not there. False when the item is in the queue
     /// already.
-    [[nodiscard]] bool insert(std::shared_ptr<CoreMediaItem> item, const CoreMediaItem* after);
-    [[nodiscard]] Entries remove(const CoreMediaItem& item);
+    [[nodiscard]] bool insert(std::shared_ptr<PlaybackItem> item, const PlaybackItem* after);
+    [[nodiscard]] Entries remove(const PlaybackItem& item);
     [[nodiscard]] Entries removeFirst();
     [[nodiscard]] Entries removeAll();
-    void seek(const CoreMediaItem& item, std::chrono::nanoseconds position);
+    void seek(const PlaybackItem& item, std::chrono::nanoseconds position);
 
     /// All three say whether the rate changed.
     bool setRate(float rate);
@@ -112,7 +112,7 @@ private:
 
     const std::function<void()> changed_;
     Entries entries_;
-    std::unordered_map<const CoreMediaItem*, Entries::iterator> byItem_;
+    std::unordered_map<const PlaybackItem*, Entries::iterator> byItem_;
     EntryId lastId_ = 0;
     float rate_ = 0;
     std::optional<float> interruptedRate_;

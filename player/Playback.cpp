@@ -5,7 +5,7 @@
 #include <iterator>
 #include <utility>
 
-#include "player/PlayerLoop.h"
+#include "player/EventLoop.h"
 #include "roles/MediaAsset.h"
 
 namespace tarn {

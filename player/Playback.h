@@ -47,7 +47,7 @@ public:
 private:
     struct Place {
         EntryId entry = 0;
-        std::shared_ptr<CoreMediaItem> item;
+        std::shared_ptr<PlaybackItem> item;
     };
 
     void outputIsWritable() override { scheduleLocking(); }

@@ -9,12 +9,12 @@ namespace tarn {
 
 class NotificationCenter;
 class OutputFactory;
-class PlayerLoop;
+class EventLoop;
 class RenderingFactory;
 
 /// What the players and items of one engine share. Outlives all of them.
 struct PlayerEnvironment {
-    PlayerLoop& loop;
+    EventLoop& loop;
     RenderingFactory& renderings;
     OutputFactory& outputs;
     NotificationCenter& notifications;

@@ -3,7 +3,7 @@
 #include "media/DecoderLoader.h"
 #include "media/FileReader.h"
 #include "media/LinuxMediaAsset.h"
-#include "player/PlayerLoop.h"
+#include "player/EventLoop.h"
 #include "player/Rendering.h"
 #include "rendering/BackwardSource.h"
 #include "rendering/ForwardSource.h"
@@ -53,12 +53,12 @@ private:
 class LinuxRenderingFactory final : public RenderingFactory {
 public:
     /// Both outlive the factory and its renderings.
-    LinuxRenderingFactory(PlayerLoop& loop, DecoderLoader& loader) : loop_(loop), loader_(loader) {}
+    LinuxRenderingFactory(EventLoop& loop, DecoderLoader& loader) : loop_(loop), loader_(loader) {}
 
     Outcome open(const std::shared_ptr<MediaAsset>& asset, std::function<void()> goesOn) override;
 
 private:
-    PlayerLoop& loop_;
+    EventLoop& loop_;
     DecoderLoader& loader_;
 };
 

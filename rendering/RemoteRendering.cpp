@@ -35,7 +35,7 @@ public:
         std::optional<nanoseconds> busySince; ///< when the call in progress began
     };
 
-    Worker(PlayerLoop& loop, std::function<void()> goesOn)
+    Worker(EventLoop& loop, std::function<void()> goesOn)
         : loop_(loop), goesOn_(std::move(goesOn)), busySince_(loop.now()) {}
 
     /// All that the thread does.
@@ -65,7 +65,7 @@ private:
     void work(std::unique_lock<std::mutex>& lock, Rendering& rendering);
     void tell();
 
-    PlayerLoop& loop_; // may be gone when closed_
+    EventLoop& loop_; // may be gone when closed_
     const std::function<void()> goesOn_;
 
     std::mutex mutex_;
@@ -191,7 +191,7 @@ RenderedSpan RemoteRendering::Worker::takeFrom(Piece& piece, PcmBuffer& buffer, 
     return span;
 }
 
-std::unique_ptr<RemoteRendering> RemoteRendering::create(PlayerLoop& loop,
+std::unique_ptr<RemoteRendering> RemoteRendering::create(EventLoop& loop,
                                                          std::function<RenderingFactory::Outcome()> open,
                                                          std::function<void()> goesOn, Options options) {
     const auto worker = std::make_shared<Worker>(loop, goesOn);
@@ -200,7 +200,7 @@ std::unique_ptr<RemoteRendering> RemoteRendering::create(PlayerLoop& loop,
     return std::unique_ptr<RemoteRendering>(new RemoteRendering(loop, worker, std::move(goesOn), options));
 }
 
-RemoteRendering::RemoteRendering(PlayerLoop& loop, std::shared_ptr<Worker> worker,
+RemoteRendering::RemoteRendering(EventLoop& loop, std::shared_ptr<Worker> worker,
                                  std::function<void()> goesOn, Options options)
     : loop_(loop), goesOn_(std::move(goesOn)), options_(options), worker_(std::move(worker)) {}
 

@@ -2,7 +2,7 @@
 
 #include <optional>
 
-#include "player/PlayerLoop.h"
+#include "player/EventLoop.h"
 #include "player/Rendering.h"
 
 namespace tarn {
@@ -19,7 +19,7 @@ public:
 
     /// `open` runs on the rendering's thread and owns what it needs. `goesOn` is called as the factory's
     /// contract says. `loop` outlives the rendering. None when there is no thread to be had.
-    static std::unique_ptr<RemoteRendering> create(PlayerLoop& loop,
+    static std::unique_ptr<RemoteRendering> create(EventLoop& loop,
                                                    std::function<RenderingFactory::Outcome()> open,
                                                    std::function<void()> goesOn, Options options);
 
@@ -32,10 +32,10 @@ public:
 private:
     class Worker;
 
-    RemoteRendering(PlayerLoop& loop, std::shared_ptr<Worker> worker, std::function<void()> goesOn,
+    RemoteRendering(EventLoop& loop, std::shared_ptr<Worker> worker, std::function<void()> goesOn,
                     Options options);
 
-    PlayerLoop& loop_;
+    EventLoop& loop_;
     const std::function<void()> goesOn_;
     const Options options_;
     const std::shared_ptr<Worker> worker_;

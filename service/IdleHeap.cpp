@@ -16,7 +16,7 @@ constexpr std::chrono::milliseconds patience{200}; // the rest of a client goes,
 
 class IdleHeap::Count {
 public:
-    explicit Count(PlayerLoop& loop) : loop_(&loop) {}
+    explicit Count(EventLoop& loop) : loop_(&loop) {}
 
     void begin() {
         RegistrationHandle dropped; // behind the lock
@@ -40,12 +40,12 @@ public:
 
 private:
     std::mutex mutex_;
-    PlayerLoop* loop_; // null when it is gone
+    EventLoop* loop_; // null when it is gone
     std::size_t assets_ = 0;
     RegistrationHandle timer_;
 };
 
-IdleHeap::IdleHeap(PlayerLoop& loop) : count_(std::make_shared<Count>(loop)) {}
+IdleHeap::IdleHeap(EventLoop& loop) : count_(std::make_shared<Count>(loop)) {}
 
 IdleHeap::~IdleHeap() { count_->close(); }
 

@@ -2,7 +2,7 @@
 
 #include <memory>
 
-#include "player/PlayerLoop.h"
+#include "player/EventLoop.h"
 #include "roles/MediaAsset.h"
 
 namespace tarn {
@@ -12,7 +12,7 @@ namespace tarn {
 class IdleHeap {
 public:
     /// `loop`, on which the work is done, outlives the heap; assets need not be outlived.
-    explicit IdleHeap(PlayerLoop& loop);
+    explicit IdleHeap(EventLoop& loop);
     ~IdleHeap();
 
     /// The asset itself, counted as long as it lives.

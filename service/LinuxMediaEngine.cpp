@@ -5,8 +5,8 @@ namespace tarn {
 LinuxMediaEngine::LinuxMediaEngine(NotificationCenter& notifications, FileAccess& files,
                                    LinuxAudioSession& session)
     : LinuxMediaParts(session),
-      CoreMediaEngine(LinuxMediaParts::loop, LinuxMediaParts::renderings, LinuxMediaParts::outputs,
-                      notifications),
+      PlaybackEngine(LinuxMediaParts::loop, LinuxMediaParts::renderings, LinuxMediaParts::outputs,
+                     notifications),
       opener_(files, loader) {}
 
 LinuxMediaEngine::~LinuxMediaEngine() { LinuxMediaParts::loop.stop(); }

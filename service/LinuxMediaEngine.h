@@ -1,7 +1,7 @@
 #pragma once
 
 #include "media/AssetOpener.h"
-#include "player/CoreMediaEngine.h"
+#include "player/PlaybackEngine.h"
 #include "rendering/LinuxRendering.h"
 #include "service/IdleHeap.h"
 #include "sound/LinuxAudioSession.h"
@@ -15,13 +15,13 @@ struct LinuxMediaParts {
     explicit LinuxMediaParts(InterruptionListener& interruptions) : outputs(loop, interruptions) {}
 
     DecoderLoader loader;
-    LinuxPlayerLoop loop;
+    EventLoopThread loop;
     LinuxRenderingFactory renderings{loop, loader};
     SystemOutputFactory outputs;
 };
 
 /// The media engine of this machine: FFmpeg reads, the sound server plays.
-class LinuxMediaEngine final : private LinuxMediaParts, public CoreMediaEngine {
+class LinuxMediaEngine final : private LinuxMediaParts, public PlaybackEngine {
 public:
     /// All of these outlive the engine.
     LinuxMediaEngine(NotificationCenter& notifications, FileAccess& files, LinuxAudioSession& session);

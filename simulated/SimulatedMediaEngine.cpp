@@ -7,9 +7,9 @@
 
 namespace tarn {
 
-SimulatedMediaEngine::SimulatedMediaEngine(PlayerLoop& loop, NotificationCenter& notifications,
+SimulatedMediaEngine::SimulatedMediaEngine(EventLoop& loop, NotificationCenter& notifications,
                                            SimulatedSandboxExtension& sandboxExtensions)
-    : CoreMediaEngine(loop, renderings_, speaker_, notifications), // they are only remembered there
+    : PlaybackEngine(loop, renderings_, speaker_, notifications), // they are only remembered there
       sandboxExtensions_(sandboxExtensions),
       renderings_(loop),
       speaker_(loop) {}

@@ -4,7 +4,7 @@
 #include <memory>
 #include <string>
 
-#include "player/CoreMediaEngine.h"
+#include "player/PlaybackEngine.h"
 #include "simulated/MediaScript.h"
 #include "simulated/SimulatedRendering.h"
 #include "simulated/SimulatedSandboxExtension.h"
@@ -16,9 +16,9 @@ namespace tarn {
 /// The engine's own queue logic over scripted files, arithmetic and the loop's time, which may be virtual.
 ///
 /// Any thread may call.
-class SimulatedMediaEngine final : public CoreMediaEngine {
+class SimulatedMediaEngine final : public PlaybackEngine {
 public:
-    SimulatedMediaEngine(PlayerLoop& loop, NotificationCenter& notifications,
+    SimulatedMediaEngine(EventLoop& loop, NotificationCenter& notifications,
                          SimulatedSandboxExtension& sandboxExtensions);
 
     /// From now on there is such a file. `URL` may be any text.

@@ -17,7 +17,7 @@ constexpr std::int64_t capacity = 2 * std::int64_t{simulatedFormat.rate};
 
 } // namespace
 
-SimulatedOutput::SimulatedOutput(SimulatedSpeaker& speaker, PlayerLoop& loop, OutputListener& listener,
+SimulatedOutput::SimulatedOutput(SimulatedSpeaker& speaker, EventLoop& loop, OutputListener& listener,
                                  std::chrono::nanoseconds latency)
     : speaker_(speaker), loop_(loop), listener_(listener), latency_(latency / simulatedFrame) {}
 

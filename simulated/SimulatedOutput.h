@@ -3,8 +3,8 @@
 #include <deque>
 #include <mutex>
 
+#include "player/EventLoop.h"
 #include "player/Output.h"
-#include "player/PlayerLoop.h"
 #include "simulated/SimulatedSpeaker.h"
 
 namespace tarn {
@@ -12,7 +12,7 @@ namespace tarn {
 /// Two seconds of buffer and a clock that is computed from the loop's.
 class SimulatedOutput final : public Output {
 public:
-    SimulatedOutput(SimulatedSpeaker& speaker, PlayerLoop& loop, OutputListener& listener,
+    SimulatedOutput(SimulatedSpeaker& speaker, EventLoop& loop, OutputListener& listener,
                     std::chrono::nanoseconds latency);
     ~SimulatedOutput() override;
 
@@ -52,7 +52,7 @@ private:
     void setWritableTimer();
 
     SimulatedSpeaker& speaker_;
-    PlayerLoop& loop_;
+    EventLoop& loop_;
     OutputListener& listener_;
     const std::int64_t latency_;
 

@@ -5,10 +5,10 @@
 #include "simulated/SimulatedApplicationRegistry.h"
 #include "simulated/SimulatedAudioSession.h"
 #include "simulated/SimulatedClock.h"
+#include "simulated/SimulatedEventLoop.h"
 #include "simulated/SimulatedLocalization.h"
 #include "simulated/SimulatedMediaEngine.h"
 #include "simulated/SimulatedNowPlayingService.h"
-#include "simulated/SimulatedPlayerLoop.h"
 #include "simulated/SimulatedQueues.h"
 #include "simulated/SimulatedRemoteCommands.h"
 #include "simulated/SimulatedSandboxExtension.h"
@@ -38,7 +38,7 @@ struct SimulatedPlatform {
     SimulatedLocalization localization;
     LocalNotificationCenter notifications;
     SimulatedSandboxExtension sandboxExtensions;
-    SimulatedPlayerLoop playerLoop{scheduler};
+    SimulatedEventLoop playerLoop{scheduler};
     SimulatedMediaEngine media{playerLoop, notifications, sandboxExtensions};
     SimulatedAudioSession audioSession{scheduler, notifications};
     SimulatedRemoteCommands remoteCommands{scheduler};

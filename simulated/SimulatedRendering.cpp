@@ -9,7 +9,7 @@
 
 namespace tarn {
 
-SimulatedRendering::SimulatedRendering(std::shared_ptr<SimulatedMediaAsset> asset, PlayerLoop& loop,
+SimulatedRendering::SimulatedRendering(std::shared_ptr<SimulatedMediaAsset> asset, EventLoop& loop,
                                        std::function<void()> goesOn)
     : asset_(std::move(asset)), loop_(loop), goesOn_(std::move(goesOn)) {
     for (const MediaScript::Stall& stall : asset_->script().stalls)

@@ -4,7 +4,7 @@
 #include <memory>
 #include <vector>
 
-#include "player/PlayerLoop.h"
+#include "player/EventLoop.h"
 #include "player/Rendering.h"
 #include "simulated/SimulatedMediaAsset.h"
 
@@ -13,7 +13,7 @@ namespace tarn {
 /// Renders by arithmetic: every rate is played exactly, and every position is right to the nanosecond.
 class SimulatedRendering final : public Rendering {
 public:
-    SimulatedRendering(std::shared_ptr<SimulatedMediaAsset> asset, PlayerLoop& loop,
+    SimulatedRendering(std::shared_ptr<SimulatedMediaAsset> asset, EventLoop& loop,
                        std::function<void()> goesOn);
 
     Opening opening() const override;
@@ -39,7 +39,7 @@ private:
     std::chrono::nanoseconds position() const;
 
     const std::shared_ptr<SimulatedMediaAsset> asset_;
-    PlayerLoop& loop_;
+    EventLoop& loop_;
     const std::function<void()> goesOn_;
     bool isOpen_ = true;
     RegistrationHandle openingTimer_;
@@ -51,12 +51,12 @@ private:
 
 class SimulatedRenderingFactory final : public RenderingFactory {
 public:
-    explicit SimulatedRenderingFactory(PlayerLoop& loop) : loop_(loop) {}
+    explicit SimulatedRenderingFactory(EventLoop& loop) : loop_(loop) {}
 
     Outcome open(const std::shared_ptr<MediaAsset>& asset, std::function<void()> goesOn) override;
 
 private:
-    PlayerLoop& loop_;
+    EventLoop& loop_;
 };
 
 } // namespace tarn

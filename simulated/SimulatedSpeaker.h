@@ -6,8 +6,8 @@
 #include <string>
 #include <vector>
 
+#include "player/EventLoop.h"
 #include "player/Output.h"
-#include "player/PlayerLoop.h"
 #include "threads/MutexProtected.h"
 
 namespace tarn {
@@ -30,7 +30,7 @@ public:
         std::string text() const;
     };
 
-    explicit SimulatedSpeaker(PlayerLoop& loop) : loop_(loop) {}
+    explicit SimulatedSpeaker(EventLoop& loop) : loop_(loop) {}
 
     std::unique_ptr<Output> create(OutputListener& listener) override;
 
@@ -61,7 +61,7 @@ private:
     void hear(Heard heard);
     void remove(SimulatedOutput& output);
 
-    PlayerLoop& loop_;
+    EventLoop& loop_;
     std::atomic<std::chrono::nanoseconds> latency_{std::chrono::nanoseconds(0)};
     std::atomic<bool> listening_ = false;
     std::atomic<std::size_t> blends_ = 0;

@@ -4,7 +4,7 @@
 #include <memory>
 #include <optional>
 
-#include "player/EventWait.h"
+#include "player/Poller.h"
 #include "sound/SoundStream.h"
 
 namespace tarn {
@@ -39,7 +39,7 @@ public:
 ///
 /// Everything that knows the server's own library is behind this interface, so that it can be loaded when a
 /// player first needs it. Player thread; outlives its connections and streams.
-class SoundLibrary : public EventWait {
+class SoundLibrary : public Poller {
 public:
     /// Returns at once; `listener`, which outlives the connection, may be told before that. The server is not
     /// started when it is not there.

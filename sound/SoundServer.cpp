@@ -15,7 +15,7 @@ constexpr auto longestDelay = 1500ms;
 
 } // namespace
 
-SoundServer::SoundServer(LinuxPlayerLoop& loop)
+SoundServer::SoundServer(EventLoopThread& loop)
     : loop_(loop), delay_(firstDelay), self_(std::make_shared<SoundServer*>(this)) {}
 
 SoundServer::~SoundServer() = default;

@@ -4,7 +4,7 @@
 #include <memory>
 #include <set>
 
-#include "player/LinuxPlayerLoop.h"
+#include "player/EventLoopThread.h"
 #include "sound/SoundLibrary.h"
 
 namespace tarn {
@@ -29,7 +29,7 @@ public:
 class SoundServer final : private SoundConnectionListener {
 public:
     /// `loop` outlives the server, and no longer runs when that is destroyed.
-    explicit SoundServer(LinuxPlayerLoop& loop);
+    explicit SoundServer(EventLoopThread& loop);
     ~SoundServer() override;
 
     /// Loads what speaks to the server, which takes a few milliseconds; the first want() does it otherwise.
@@ -68,7 +68,7 @@ private:
     void retryLater();
     void tell(void (SoundServerListener::*what)());
 
-    LinuxPlayerLoop& loop_;
+    EventLoopThread& loop_;
     std::unique_ptr<SoundLibrary> library_; // null before it is needed, and when it is not there
     bool librarySought_ = false;
     std::unique_ptr<SoundConnection> connection_;

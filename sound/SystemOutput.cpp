@@ -12,7 +12,7 @@ using std::chrono::nanoseconds;
 
 constexpr auto bufferLength = 2s;
 constexpr std::size_t mostBytes = 3u << 20; // the server takes four mebibytes at most
-constexpr auto blendLength = 5ms;
+constexpr auto fadeLength = 5ms;
 constexpr auto serverPatience = 500ms;
 constexpr auto streamRetry = 1500ms;
 constexpr auto timingRetry = 40ms;
@@ -30,7 +30,7 @@ std::size_t capacityFor(const PcmFormat& format) {
 
 } // namespace
 
-SystemOutput::SystemOutput(LinuxPlayerLoop& loop, SoundServer& server, InterruptionListener& interruptions,
+SystemOutput::SystemOutput(EventLoopThread& loop, SoundServer& server, InterruptionListener& interruptions,
                            OutputListener& listener)
     : loop_(loop),
       server_(server),
@@ -125,8 +125,8 @@ void SystemOutput::beginAnew(Mode mode) {
     seekNext_ = false;
     placing_ = false;
     latency_ = 0us;
-    blend_.reset();
-    memory_.reset(format_, capacity_);
+    crossfade_.reset();
+    history_.reset(format_, capacity_);
     writableTimer_.reset();
     timingTimer_.reset();
     later([](SystemOutput& self) { self.listener_.outputWasReset(); });
@@ -282,9 +282,9 @@ void SystemOutput::write(const PcmBuffer& buffer) {
     const nanoseconds now = loop_.now();
     const bool standing = clock_.heard(now) >= writeIndex_;
     if (mode_ == Mode::sounding) {
-        if (blend_.pending()) {
+        if (crossfade_.pending()) {
             PcmBuffer blended = buffer;
-            blend_.apply(blended);
+            crossfade_.apply(blended);
             send(blended, standing);
         } else {
             send(buffer, standing);
@@ -299,7 +299,7 @@ void SystemOutput::write(const PcmBuffer& buffer) {
 }
 
 void SystemOutput::send(const PcmBuffer& buffer, bool standing) {
-    memory_.put(writeIndex_, buffer);
+    history_.put(writeIndex_, buffer);
     if (standing && running_ && filledTo_ > writeIndex_) {
         // Silence has begun to be heard behind the last frame: go on as soon as can be.
         stream_->writeSoon(static_cast<std::size_t>(framesIn(renderingMargin)), buffer.bytes.data(),
@@ -332,10 +332,10 @@ void SystemOutput::rewind(std::int64_t index, Join join) {
     assert(index <= writeIndex_);
     if (mode_ == Mode::sounding && index < writeIndex_) {
         if (join == Join::blended) {
-            const auto frames = std::min(writeIndex_ - index, framesIn(blendLength));
-            blend_.begin(memory_.get(index, static_cast<std::size_t>(frames)), format_);
+            const auto frames = std::min(writeIndex_ - index, framesIn(fadeLength));
+            crossfade_.begin(history_.get(index, static_cast<std::size_t>(frames)), format_);
         } else {
-            blend_.reset();
+            crossfade_.reset();
         }
         silenceFrom(index);
     }

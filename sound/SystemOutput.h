@@ -3,7 +3,8 @@
 #include <memory>
 #include <string>
 
-#include "pcm/Blend.h"
+#include "pcm/Crossfade.h"
+#include "pcm/FrameHistory.h"
 #include "player/Output.h"
 #include "sound/HeardClock.h"
 #include "sound/InterruptionListener.h"
@@ -19,7 +20,7 @@ namespace tarn {
 class SystemOutput final : public Output, private SoundServerListener, private SoundStreamListener {
 public:
     /// All of these outlive the output.
-    SystemOutput(LinuxPlayerLoop& loop, SoundServer& server, InterruptionListener& interruptions,
+    SystemOutput(EventLoopThread& loop, SoundServer& server, InterruptionListener& interruptions,
                  OutputListener& listener);
     ~SystemOutput() override;
 
@@ -66,7 +67,7 @@ private:
     void later(std::function<void(SystemOutput&)> work);
     std::int64_t framesIn(std::chrono::nanoseconds time) const;
 
-    LinuxPlayerLoop& loop_;
+    EventLoopThread& loop_;
     SoundServer& server_;
     InterruptionListener& interruptions_;
     OutputListener& listener_;
@@ -78,8 +79,8 @@ private:
     bool toBeSilent_ = false; // the server has asked for silence and not taken it back
     std::int64_t writeIndex_ = 0;
     HeardClock clock_;
-    FrameMemory memory_;
-    Blend blend_;
+    FrameHistory history_;
+    Crossfade crossfade_;
     std::string title_;
     std::string artist_;
 
@@ -104,7 +105,7 @@ class SystemOutputFactory final : public OutputFactory {
 public:
     /// Both outlive the factory, and the factory its outputs. Lives and dies off the player thread, while
     /// that does nothing for it.
-    SystemOutputFactory(LinuxPlayerLoop& loop, InterruptionListener& interruptions)
+    SystemOutputFactory(EventLoopThread& loop, InterruptionListener& interruptions)
         : loop_(loop), interruptions_(interruptions), server_(loop) {}
 
     void prepare() override { server_.prepare(); }
@@ -113,7 +114,7 @@ public:
     }
 
 private:
-    LinuxPlayerLoop& loop_;
+    EventLoopThread& loop_;
     InterruptionListener& interruptions_;
     SoundServer server_;
 };

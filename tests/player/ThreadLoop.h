@@ -7,12 +7,12 @@
 #include <mutex>
 #include <thread>
 
-#include "player/PlayerLoop.h"
+#include "player/EventLoop.h"
 
 namespace tarn {
 
 /// A player thread on real time.
-class ThreadLoop final : public PlayerLoop {
+class ThreadLoop final : public EventLoop {
 public:
     ThreadLoop();
     ~ThreadLoop() override { finish(); }

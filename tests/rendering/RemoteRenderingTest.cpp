@@ -5,9 +5,9 @@
 
 #include "mediaprotocol/MediaError.h"
 #include "observation/LocalNotificationCenter.h"
-#include "player/CoreMediaEngine.h"
-#include "player/LinuxPlayerLoop.h"
+#include "player/EventLoopThread.h"
 #include "player/MediaTimes.h"
+#include "player/PlaybackEngine.h"
 #include "rendering/RemoteRendering.h"
 #include "sound/LinuxAudioSession.h"
 #include "sound/SystemOutput.h"
@@ -81,7 +81,7 @@ private:
 
 class RemoteFactory final : public RenderingFactory {
 public:
-    explicit RemoteFactory(PlayerLoop& loop) : loop_(loop) {}
+    explicit RemoteFactory(EventLoop& loop) : loop_(loop) {}
 
     Outcome open(const std::shared_ptr<MediaAsset>& asset, std::function<void()> goesOn) override {
         auto file = std::static_pointer_cast<StallingAsset>(asset);
@@ -96,20 +96,20 @@ public:
     nanoseconds limit = 10s;
 
 private:
-    PlayerLoop& loop_;
+    EventLoop& loop_;
 };
 
 struct Parts {
     LocalNotificationCenter notifications;
     LinuxAudioSession session{notifications};
-    LinuxPlayerLoop loop;
+    EventLoopThread loop;
     RemoteFactory renderings{loop};
     SystemOutputFactory outputs{loop, session};
 };
 
-class RemoteEngine final : public Parts, public CoreMediaEngine {
+class RemoteEngine final : public Parts, public PlaybackEngine {
 public:
-    RemoteEngine() : CoreMediaEngine(loop, renderings, outputs, notifications) {}
+    RemoteEngine() : PlaybackEngine(loop, renderings, outputs, notifications) {}
     ~RemoteEngine() override { loop.stop(); }
     MediaAssetOutcome openAsset(const std::string&) override { return {}; }
 };

@@ -2,7 +2,7 @@
 #include <numbers>
 #include <semaphore>
 
-#include "player/LinuxPlayerLoop.h"
+#include "player/EventLoopThread.h"
 #include "rendering/LinuxRendering.h"
 #include "tests/support/MediaFixture.h"
 
@@ -57,7 +57,7 @@ struct RenderingTest : testing::Test {
     }
 
     TemporaryFolder folder;
-    LinuxPlayerLoop loop;
+    EventLoopThread loop;
 };
 
 constexpr PcmFormat sixteenBits{SampleFormat::s16, 44100, 2};

@@ -8,7 +8,7 @@ namespace tarn {
 namespace {
 
 /// Counts the timers that are set.
-class CountingLoop final : public PlayerLoop {
+class CountingLoop final : public EventLoop {
 public:
     void post(std::function<void()>) override {}
     RegistrationHandle at(std::chrono::nanoseconds, std::function<void()>) override {

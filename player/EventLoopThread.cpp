@@ -1,4 +1,4 @@
-#include "player/LinuxPlayerLoop.h"
+#include "player/EventLoopThread.h"
 
 #include <pthread.h>
 #include <sys/eventfd.h>
@@ -34,7 +34,7 @@ void takeCount(int descriptor) {
 
 /// What is to run at some time; one timer of the kernel is set to the first of them. Outlived by nobody but
 /// registrations.
-class LinuxPlayerLoop::Timers : public std::enable_shared_from_this<Timers> {
+class EventLoopThread::Timers : public std::enable_shared_from_this<Timers> {
 public:
     Timers()
         : clock_(checked(timerfd_create(CLOCK_MONOTONIC, TFD_NONBLOCK | TFD_CLOEXEC), "timerfd_create")) {}
@@ -113,23 +113,23 @@ private:
     std::uint64_t lastNumber_ = 0;
 };
 
-LinuxPlayerLoop::LinuxPlayerLoop()
+EventLoopThread::EventLoopThread()
     : wakeUp_(checked(eventfd(0, EFD_NONBLOCK | EFD_CLOEXEC), "eventfd")),
       timers_(std::make_shared<Timers>()) {
-    sleepIn(firstWait_);
+    sleepIn(firstPoller_);
     thread_ = std::thread([this] { run(); });
     pthread_setname_np(thread_.native_handle(), "player");
 }
 
-void LinuxPlayerLoop::sleepIn(EventWait& wait) {
-    wait.watch(wakeUp_.get(), [this] { takeCount(wakeUp_.get()); });
-    wait.watch(timers_->descriptor(), [this] { timers_->runDue(); });
-    wait_ = &wait;
+void EventLoopThread::sleepIn(Poller& poller) {
+    poller.watch(wakeUp_.get(), [this] { takeCount(wakeUp_.get()); });
+    poller.watch(timers_->descriptor(), [this] { timers_->runDue(); });
+    poller_ = &poller;
 }
 
-LinuxPlayerLoop::~LinuxPlayerLoop() { stop(); }
+EventLoopThread::~EventLoopThread() { stop(); }
 
-void LinuxPlayerLoop::stop() {
+void EventLoopThread::stop() {
     if (!thread_.joinable())
         return;
     assert(!isCurrent());
@@ -144,16 +144,16 @@ void LinuxPlayerLoop::stop() {
         dropped.swap(posted_); // what is dropped may post its farewell
 }
 
-bool LinuxPlayerLoop::isCurrent() const { return std::this_thread::get_id() == thread_.get_id(); }
+bool EventLoopThread::isCurrent() const { return std::this_thread::get_id() == thread_.get_id(); }
 
-nanoseconds LinuxPlayerLoop::now() const { return steadyNow(); }
+nanoseconds EventLoopThread::now() const { return steadyNow(); }
 
-void LinuxPlayerLoop::wake() {
+void EventLoopThread::wake() {
     const std::uint64_t one = 1;
     [[maybe_unused]] const ssize_t size = ::write(wakeUp_.get(), &one, sizeof one);
 }
 
-void LinuxPlayerLoop::post(std::function<void()> work) {
+void EventLoopThread::post(std::function<void()> work) {
     bool first = false;
     {
         std::lock_guard lock(mutex_);
@@ -164,11 +164,11 @@ void LinuxPlayerLoop::post(std::function<void()> work) {
         wake();
 }
 
-RegistrationHandle LinuxPlayerLoop::at(nanoseconds time, std::function<void()> work) {
+RegistrationHandle EventLoopThread::at(nanoseconds time, std::function<void()> work) {
     return timers_->add(time, std::move(work));
 }
 
-void LinuxPlayerLoop::run() {
+void EventLoopThread::run() {
     for (;;) {
         bool idle = false;
         {
@@ -177,14 +177,14 @@ void LinuxPlayerLoop::run() {
                 return;
             idle = posted_.empty();
         }
-        if (!wait_->wait(idle))
+        if (!poller_->wait(idle))
             return;
         runPosted();
     }
 }
 
 // What this work posts comes after the next look at timers and the server.
-void LinuxPlayerLoop::runPosted() {
+void EventLoopThread::runPosted() {
     std::vector<std::function<void()>> work;
     {
         std::lock_guard lock(mutex_);

@@ -1,4 +1,4 @@
-#include "player/CoreMediaItem.h"
+#include "player/PlaybackItem.h"
 
 #include <algorithm>
 #include <cassert>
@@ -12,33 +12,33 @@
 
 namespace tarn {
 
-CoreMediaItem::CoreMediaItem(PlayerEnvironment& environment, std::shared_ptr<MediaAsset> asset)
+PlaybackItem::PlaybackItem(PlayerEnvironment& environment, std::shared_ptr<MediaAsset> asset)
     : environment_(environment),
       asset_(std::move(asset)),
       observers_(*this, [](const Observable& object, std::string_view keyPath) {
-          return static_cast<const CoreMediaItem&>(object).read(keyPath);
+          return static_cast<const PlaybackItem&>(object).read(keyPath);
       }) {}
 
-RegistrationHandle CoreMediaItem::observe(std::string_view keyPath, Block block) {
+RegistrationHandle PlaybackItem::observe(std::string_view keyPath, Block block) {
     return observers_.observe(keyPath, std::move(block));
 }
 
-MediaStatus CoreMediaItem::status() const {
+MediaStatus PlaybackItem::status() const {
     EngineLock lock(environment_);
     return state_.status;
 }
 
-std::optional<Error> CoreMediaItem::error() const {
+std::optional<Error> PlaybackItem::error() const {
     EngineLock lock(environment_);
     return state_.error;
 }
 
-MediaTime CoreMediaItem::currentTime() const {
+MediaTime PlaybackItem::currentTime() const {
     EngineLock lock(environment_);
     return mediaTimeOf(state_.driver ? state_.driver->positionOf(*this) : state_.position);
 }
 
-void CoreMediaItem::seekToTime(MediaTime time) {
+void PlaybackItem::seekToTime(MediaTime time) {
     if (!time.isNumeric()) {
         SystemLog::error("-[MediaItem seekToTime:]", __LINE__,
                          "%{public}s:%d: Refused to seek to a time that is not a number.");
@@ -58,7 +58,7 @@ void CoreMediaItem::seekToTime(MediaTime time) {
     post(timeJumped);
 }
 
-void CoreMediaItem::becomeReady() {
+void PlaybackItem::becomeReady() {
     {
         EngineLock lock(environment_);
         if (state_.status != MediaStatus::unknown)
@@ -68,12 +68,12 @@ void CoreMediaItem::becomeReady() {
     reportStatus();
 }
 
-void CoreMediaItem::post(std::string_view notification) {
+void PlaybackItem::post(std::string_view notification) {
     environment_.notifications.post(
         {.name = notification, .sender = static_cast<MediaItem*>(this), .info = {}});
 }
 
-ObservedValue CoreMediaItem::read([[maybe_unused]] std::string_view keyPath) const {
+ObservedValue PlaybackItem::read([[maybe_unused]] std::string_view keyPath) const {
     assert(keyPath == statusKeyPath);
     return static_cast<std::int64_t>(status());
 }

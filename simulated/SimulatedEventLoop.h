@@ -3,16 +3,16 @@
 #include <memory>
 #include <utility>
 
-#include "player/PlayerLoop.h"
+#include "player/EventLoop.h"
 #include "simulated/SimulatedQueue.h"
 #include "simulated/SimulatedScheduler.h"
 
 namespace tarn {
 
 /// The player thread as one of the scheduler's.
-class SimulatedPlayerLoop final : public PlayerLoop {
+class SimulatedEventLoop final : public EventLoop {
 public:
-    explicit SimulatedPlayerLoop(SimulatedScheduler& scheduler)
+    explicit SimulatedEventLoop(SimulatedScheduler& scheduler)
         : scheduler_(scheduler), queue_(scheduler.createQueue("player")) {}
 
     void post(std::function<void()> work) override { queue_->async(std::move(work)); }

@@ -5,9 +5,9 @@
 namespace tarn {
 
 /// What the player thread sleeps in. Player thread.
-class EventWait {
+class Poller {
 public:
-    virtual ~EventWait() = default;
+    virtual ~Poller() = default;
 
     /// Has `readable` called by wait() whenever there is something to be read from `descriptor`, which
     /// outlives the wait.

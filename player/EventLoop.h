@@ -9,9 +9,9 @@ namespace tarn {
 
 /// The player thread: everything that turns queues into sound runs here, one piece at a time. Any thread may
 /// call.
-class PlayerLoop {
+class EventLoop {
 public:
-    virtual ~PlayerLoop() = default;
+    virtual ~EventLoop() = default;
 
     virtual void post(std::function<void()> work) = 0;
 

@@ -1,12 +1,12 @@
-#include "player/CoreQueuePlayer.h"
+#include "player/PlaybackQueuePlayer.h"
 
 #include <cassert>
 #include <cmath>
 #include <utility>
 
 #include "log/SystemLog.h"
-#include "player/CoreMediaItem.h"
 #include "player/MediaTimes.h"
+#include "player/PlaybackItem.h"
 #include "roles/AudioSession.h"
 #include "roles/NotificationCenter.h"
 
@@ -14,12 +14,12 @@ namespace tarn {
 
 namespace {
 
-std::shared_ptr<CoreMediaItem> coreItem(std::shared_ptr<MediaItem> item) {
-    assert(dynamic_cast<CoreMediaItem*>(item.get()) && "an item of another engine");
-    return std::static_pointer_cast<CoreMediaItem>(std::move(item));
+std::shared_ptr<PlaybackItem> playbackItem(std::shared_ptr<MediaItem> item) {
+    assert(dynamic_cast<PlaybackItem*>(item.get()) && "an item of another engine");
+    return std::static_pointer_cast<PlaybackItem>(std::move(item));
 }
 
-const CoreMediaItem* coreItem(const MediaItem* item) { return static_cast<const CoreMediaItem*>(item); }
+const PlaybackItem* playbackItem(const MediaItem* item) { return static_cast<const PlaybackItem*>(item); }
 
 void reportDuplicate(std::string_view method) {
     SystemLog::error(method, __LINE__, "%{public}s:%d: Refused an item that is in the queue already.");
@@ -27,29 +27,29 @@ void reportDuplicate(std::string_view method) {
 
 } // namespace
 
-std::shared_ptr<CoreQueuePlayer> CoreQueuePlayer::create(PlayerEnvironment& environment,
-                                                         std::vector<std::shared_ptr<MediaItem>> items) {
-    auto player = std::make_shared<CoreQueuePlayer>(environment);
+std::shared_ptr<PlaybackQueuePlayer>
+PlaybackQueuePlayer::create(PlayerEnvironment& environment, std::vector<std::shared_ptr<MediaItem>> items) {
+    auto player = std::make_shared<PlaybackQueuePlayer>(environment);
     player->playback_->setListener(player);
     for (auto& item : items)
         player->insertItem(std::move(item), nullptr);
     return player;
 }
 
-CoreQueuePlayer::CoreQueuePlayer(PlayerEnvironment& environment)
+PlaybackQueuePlayer::PlaybackQueuePlayer(PlayerEnvironment& environment)
     : environment_(environment),
       playback_(std::make_shared<Playback>(environment)),
       observers_(*this, [](const Observable& object, std::string_view keyPath) {
-          return static_cast<const CoreQueuePlayer&>(object).read(keyPath);
+          return static_cast<const PlaybackQueuePlayer&>(object).read(keyPath);
       }) {}
 
-CoreQueuePlayer::~CoreQueuePlayer() { playback_->close(); }
+PlaybackQueuePlayer::~PlaybackQueuePlayer() { playback_->close(); }
 
-RegistrationHandle CoreQueuePlayer::observe(std::string_view keyPath, Block block) {
+RegistrationHandle PlaybackQueuePlayer::observe(std::string_view keyPath, Block block) {
     return observers_.observe(keyPath, std::move(block));
 }
 
-ObservedValue CoreQueuePlayer::read(std::string_view keyPath) const {
+ObservedValue PlaybackQueuePlayer::read(std::string_view keyPath) const {
     if (keyPath == rateKeyPath)
         return rate();
     if (keyPath == currentItemKeyPath)
@@ -58,17 +58,17 @@ ObservedValue CoreQueuePlayer::read(std::string_view keyPath) const {
     return static_cast<std::int64_t>(status());
 }
 
-float CoreQueuePlayer::rate() const {
+float PlaybackQueuePlayer::rate() const {
     EngineLock lock(environment_);
     return playback_->queue().rate();
 }
 
-std::shared_ptr<MediaItem> CoreQueuePlayer::currentItem() const {
+std::shared_ptr<MediaItem> PlaybackQueuePlayer::currentItem() const {
     EngineLock lock(environment_);
     return playback_->queue().current();
 }
 
-MediaTime CoreQueuePlayer::currentTime() const {
+MediaTime PlaybackQueuePlayer::currentTime() const {
     EngineLock lock(environment_);
     const PlayQueue::Entries& entries = playback_->queue().entries();
     if (entries.empty())
@@ -77,7 +77,7 @@ MediaTime CoreQueuePlayer::currentTime() const {
 }
 
 template <class Change>
-void CoreQueuePlayer::changeRate(Change change) {
+void PlaybackQueuePlayer::changeRate(Change change) {
     bool changed = false;
     {
         EngineLock lock(environment_);
@@ -87,7 +87,7 @@ void CoreQueuePlayer::changeRate(Change change) {
         rateChanged();
 }
 
-void CoreQueuePlayer::setRate(float rate) {
+void PlaybackQueuePlayer::setRate(float rate) {
     if (!std::isfinite(rate)) {
         SystemLog::error("-[MediaQueuePlayer setRate:]", __LINE__,
                          "%{public}s:%d: Refused a rate that is not finite: %f.", rate);
@@ -96,32 +96,32 @@ void CoreQueuePlayer::setRate(float rate) {
     changeRate([rate](PlayQueue& queue) { return queue.setRate(rate); });
 }
 
-void CoreQueuePlayer::pause() {
+void PlaybackQueuePlayer::pause() {
     changeRate([](PlayQueue& queue) { return queue.setRate(0); });
 }
 
-void CoreQueuePlayer::play() {
+void PlaybackQueuePlayer::play() {
     changeRate([](PlayQueue& queue) { return queue.play(); });
 }
 
-void CoreQueuePlayer::interruptionBegan() {
+void PlaybackQueuePlayer::interruptionBegan() {
     changeRate([](PlayQueue& queue) { return queue.interrupt(); });
 }
 
-void CoreQueuePlayer::deviceVanished() {
+void PlaybackQueuePlayer::deviceVanished() {
     SystemLog::message("-[MediaQueuePlayer deviceVanished]", __LINE__,
                        "%{public}s:%d: Paused: the device that played is gone.");
     pause();
 }
 
 template <class Edit>
-void CoreQueuePlayer::edit(Edit edit) {
+void PlaybackQueuePlayer::edit(Edit edit) {
     PlayQueue::Entries left; // outlives the lock
     bool changed = false;
     {
         EngineLock lock(environment_);
         PlayQueue& queue = playback_->queue();
-        const CoreMediaItem* before = queue.current().get(); // kept alive by `left`
+        const PlaybackItem* before = queue.current().get(); // kept alive by `left`
         left = edit(queue);
         changed = queue.current().get() != before;
     }
@@ -129,42 +129,43 @@ void CoreQueuePlayer::edit(Edit edit) {
         currentItemChanged();
 }
 
-void CoreQueuePlayer::advanceToNextItem() {
+void PlaybackQueuePlayer::advanceToNextItem() {
     edit([](PlayQueue& queue) { return queue.removeFirst(); });
 }
 
-void CoreQueuePlayer::insertItem(std::shared_ptr<MediaItem> item, const std::shared_ptr<MediaItem>& after) {
+void PlaybackQueuePlayer::insertItem(std::shared_ptr<MediaItem> item,
+                                     const std::shared_ptr<MediaItem>& after) {
     bool inserted = false;
     edit([&](PlayQueue& queue) {
-        inserted = queue.insert(coreItem(std::move(item)), coreItem(after.get()));
+        inserted = queue.insert(playbackItem(std::move(item)), playbackItem(after.get()));
         return PlayQueue::Entries();
     });
     if (!inserted)
         reportDuplicate("-[MediaQueuePlayer insertItem:afterItem:]");
 }
 
-void CoreQueuePlayer::removeItem(const std::shared_ptr<MediaItem>& item) {
-    edit([&](PlayQueue& queue) { return queue.remove(*coreItem(item.get())); });
+void PlaybackQueuePlayer::removeItem(const std::shared_ptr<MediaItem>& item) {
+    edit([&](PlayQueue& queue) { return queue.remove(*playbackItem(item.get())); });
 }
 
-void CoreQueuePlayer::removeAllItems() {
+void PlaybackQueuePlayer::removeAllItems() {
     edit([](PlayQueue& queue) { return queue.removeAll(); });
 }
 
-void CoreQueuePlayer::replaceCurrentItem(std::shared_ptr<MediaItem> item) {
+void PlaybackQueuePlayer::replaceCurrentItem(std::shared_ptr<MediaItem> item) {
     bool replaced = true;
     edit([&](PlayQueue& queue) {
         auto current = queue.current();
         if (current == item)
             return PlayQueue::Entries();
-        replaced = queue.insert(coreItem(std::move(item)), current.get());
+        replaced = queue.insert(playbackItem(std::move(item)), current.get());
         return replaced && current ? queue.removeFirst() : PlayQueue::Entries();
     });
     if (!replaced)
         reportDuplicate("-[MediaQueuePlayer replaceCurrentItemWithPlayerItem:]");
 }
 
-void CoreQueuePlayer::setAudioSession(AudioSession& session) {
+void PlaybackQueuePlayer::setAudioSession(AudioSession& session) {
     auto handler = [weak = weak_from_this()](const Notification& notification) {
         auto type = notification.info.find(AudioSession::interruptionTypeKey);
         auto player = weak.lock();
@@ -178,7 +179,7 @@ void CoreQueuePlayer::setAudioSession(AudioSession& session) {
     std::swap(interruptions_, subscription); // the one before ends behind the lock
 }
 
-AudioSession* CoreQueuePlayer::audioSession() const {
+AudioSession* PlaybackQueuePlayer::audioSession() const {
     EngineLock lock(environment_);
     return session_;
 }

@@ -4,12 +4,12 @@
 
 #include <vector>
 
-#include "player/EventWait.h"
+#include "player/Poller.h"
 
 namespace tarn {
 
 /// Sleeps until one of a few descriptors is readable.
-class PollWait final : public EventWait {
+class SystemPoller final : public Poller {
 public:
     void watch(int descriptor, std::function<void()> readable) override;
     bool wait(bool idle) override;

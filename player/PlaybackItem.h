@@ -17,9 +17,9 @@ class PlayQueue;
 /// A player may be replaced by another one that holds the same items. The queue that an item entered last
 /// drives it: it alone tells its position and reports how it ends. When that one lets it go, the one before
 /// drives it again.
-class CoreMediaItem final : public MediaItem {
+class PlaybackItem final : public MediaItem {
 public:
-    CoreMediaItem(PlayerEnvironment& environment, std::shared_ptr<MediaAsset> asset);
+    PlaybackItem(PlayerEnvironment& environment, std::shared_ptr<MediaAsset> asset);
 
     RegistrationHandle observe(std::string_view keyPath, Block block) override;
     MediaStatus status() const override;

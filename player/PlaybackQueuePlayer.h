@@ -12,15 +12,15 @@ namespace tarn {
 
 /// The queue player of every engine: what can be asked of it and what it reports. Its PlayQueue decides, its
 /// Playback plays.
-class CoreQueuePlayer final : public MediaQueuePlayer,
-                              public PlaybackListener,
-                              public std::enable_shared_from_this<CoreQueuePlayer> {
+class PlaybackQueuePlayer final : public MediaQueuePlayer,
+                                  public PlaybackListener,
+                                  public std::enable_shared_from_this<PlaybackQueuePlayer> {
 public:
     /// A paused player of `items`; an item that is among them twice is refused the second time.
-    static std::shared_ptr<CoreQueuePlayer> create(PlayerEnvironment& environment,
-                                                   std::vector<std::shared_ptr<MediaItem>> items);
-    explicit CoreQueuePlayer(PlayerEnvironment& environment);
-    ~CoreQueuePlayer() override;
+    static std::shared_ptr<PlaybackQueuePlayer> create(PlayerEnvironment& environment,
+                                                       std::vector<std::shared_ptr<MediaItem>> items);
+    explicit PlaybackQueuePlayer(PlayerEnvironment& environment);
+    ~PlaybackQueuePlayer() override;
 
     RegistrationHandle observe(std::string_view keyPath, Block block) override;
 

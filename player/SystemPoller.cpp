@@ -1,16 +1,16 @@
-#include "player/PollWait.h"
+#include "player/SystemPoller.h"
 
 #include <cerrno>
 #include <utility>
 
 namespace tarn {
 
-void PollWait::watch(int descriptor, std::function<void()> readable) {
+void SystemPoller::watch(int descriptor, std::function<void()> readable) {
     descriptors_.push_back({descriptor, POLLIN, 0});
     calls_.push_back(std::move(readable));
 }
 
-bool PollWait::wait(bool idle) {
+bool SystemPoller::wait(bool idle) {
     if (poll(descriptors_.data(), descriptors_.size(), idle ? -1 : 0) < 0)
         return errno == EINTR;
     for (std::size_t i = 0; i < descriptors_.size(); ++i)

@@ -7,11 +7,11 @@ namespace tarn {
 
 /// The items and players of an engine. What opens files, renders and sounds is given to it, and openAsset()
 /// is left to the engine that derives from it.
-class CoreMediaEngine : public MediaEngine {
+class PlaybackEngine : public MediaEngine {
 public:
     /// All of these outlive the engine, and the engine every item and player that it made.
-    CoreMediaEngine(PlayerLoop& loop, RenderingFactory& renderings, OutputFactory& outputs,
-                    NotificationCenter& notifications);
+    PlaybackEngine(EventLoop& loop, RenderingFactory& renderings, OutputFactory& outputs,
+                   NotificationCenter& notifications);
 
     std::shared_ptr<MediaItem> makeItem(std::shared_ptr<MediaAsset> asset) final;
     std::shared_ptr<MediaQueuePlayer> makeQueuePlayer(std::vector<std::shared_ptr<MediaItem>> items) final;

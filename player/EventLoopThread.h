@@ -6,8 +6,8 @@
 #include <thread>
 #include <vector>
 
-#include "player/PlayerLoop.h"
-#include "player/PollWait.h"
+#include "player/EventLoop.h"
+#include "player/SystemPoller.h"
 #include "system/FileDescriptor.h"
 
 namespace tarn {
@@ -16,11 +16,11 @@ namespace tarn {
 /// where it is asked for, with no hand-off between threads and no lock. Without work, a timer that is due or
 /// word from the server it sleeps: in poll(2) first, and in the library of the sound server once that is
 /// loaded.
-class LinuxPlayerLoop final : public PlayerLoop {
+class EventLoopThread final : public EventLoop {
 public:
-    LinuxPlayerLoop();
+    EventLoopThread();
 
-    ~LinuxPlayerLoop() override;
+    ~EventLoopThread() override;
 
     /// Ends the thread and waits for it. Work that has not begun is dropped, with all that it owns; so what
     /// belongs to the thread can be destroyed in peace. Not on the player thread; nothing may be posted
@@ -32,8 +32,8 @@ public:
     bool isCurrent() const override;
     std::chrono::nanoseconds now() const override;
 
-    /// From its next turn on the thread sleeps in `wait`, which lives until stop(). Player thread.
-    void sleepIn(EventWait& wait);
+    /// From its next turn on the thread sleeps with `poller`, which lives until stop(). Player thread.
+    void sleepIn(Poller& poller);
 
 private:
     class Timers;
@@ -43,8 +43,8 @@ private:
 
     const FileDescriptor wakeUp_;
     const std::shared_ptr<Timers> timers_;
-    PollWait firstWait_;
-    EventWait* wait_ = nullptr; // player thread
+    SystemPoller firstPoller_;
+    Poller* poller_ = nullptr; // player thread
 
     std::mutex mutex_;
     std::vector<std::function<void()>> posted_; // under the mutex
