@@ -96,28 +96,29 @@ private:
     }
 
     void addPlay() {
-        auto* play = add("play", "Play files one after the other; without any, go on", [this] {
+        auto* play = add("play", "Play files, folders and playlists; without any, go on", [this] {
             play_.socketPath = socketPath_;
-            play_.from = *parseTime(from_);
-            return play_.paths.empty() ? runControl(resume_) : runPlay(play_);
+            play_.playback.from = *parseTime(from_);
+            return play_.names.empty() ? control(Control::play) : runPlay(play_);
         });
         play->footer(playHelp);
-        play->add_option("--rate", play_.rate,
+        play->add_option("--rate", play_.playback.rate,
                          "How fast: 1 as recorded, 0.25 to 4; below 0 backwards, one file")
             ->check(checkRate, "RATE")
             ->capture_default_str();
         play->add_option("--from", from_, "Where to begin in the first file: SECONDS or MINUTES:SECONDS")
             ->check(checkTime, "TIME");
-        addGrant(*play, play_.access);
-        play->add_option("FILE", play_.paths, "What to play");
+        addGrant(*play, play_.playback.access);
+        play->add_flag("--shuffle", play_.playback.order.isShuffled, "In another order each time");
+        play->add_flag("--loop", play_.playback.order.isLooped, "Begin anew after the last one");
+        play->add_flag("--detach", play_.isDetached, "Give the prompt back when it sounds, and play on");
+        play->add_option("FILE", play_.names,
+                         "A file, a folder, a playlist, or - for a list on standard input");
     }
 
     void addControls() {
         const auto add = [this](const char* name, const char* text, Control control) {
-            return this->add(name, text, [this, control] {
-                control_.control = control;
-                return runControl(control_);
-            });
+            return this->add(name, text, [this, control] { return this->control(control); });
         };
         const auto addValue = [&](CLI::App* command, const char* name, const char* text, Control control) {
             return command->add_option(name, control_.value, text)
@@ -129,7 +130,7 @@ private:
         add("pause", "Pause what plays", Control::pause);
         add("toggle", "Pause what plays, or go on", Control::toggle);
         add("next", "Go on to the next track", Control::next);
-        add("stop", "Stop what plays", Control::stop);
+        add("stop", "End what plays in the background, or pause what another program plays", Control::stop);
         addValue(add("seek", "Move within the track", Control::seek), "[+-]TIME",
                  "Where to, or how far on or back: 1:30, +10, -10", Control::seek)
             ->required();
@@ -140,6 +141,12 @@ private:
         auto* status = add("status", "Show what plays", Control::status);
         status->add_flag("--json", control_.asJSON, "Print JSON lines");
         status->add_flag("--follow", control_.follow, "Go on with a line for each change");
+    }
+
+    int control(Control control) {
+        control_.control = control;
+        control_.socketPath = socketPath_;
+        return runControl(control_);
     }
 
     void addInfo() {
@@ -184,7 +191,6 @@ private:
     std::string from_ = "0";
     InfoOptions info_;
     LineModeOptions send_;
-    ControlOptions resume_{Control::play, {}};
     ControlOptions control_;
     std::vector<std::string> completed_;
 };

@@ -1,9 +1,11 @@
 #include "client/tool/Info.h"
 
+#include <exception>
 #include <iostream>
+#include <stdexcept>
 
+#include "client/tool/display/Columns.h"
 #include "client/tool/display/OutputLine.h"
-#include "client/tool/display/Terminal.h"
 #include "client/tool/display/TimeText.h"
 #include "client/tool/play/ServiceCheck.h"
 
@@ -37,19 +39,31 @@ void printJSON(const Track& track) {
     std::cout << outputLine(LineFormat::JSON, "file", fields) << "\n";
 }
 
+Track open(client::Client& client, const std::string& path, Access access) {
+    client::AssetUpsert upsert{.identifier = "info", .URL = client::fileURL(path)};
+    if (access == Access::granted)
+        upsert.sandboxExtensionToken = client.grantFile(path);
+    const auto result = client.await(client.upsertAsset(upsert));
+    if (result.outcome != client::Outcome::answered)
+        throw std::runtime_error(result.succeeded() ? "the service gave no answer" : result.problem());
+    return {path, "info", 0, 0, result.value};
+}
+
 } // namespace
 
 int runInfo(const InfoOptions& options) {
     client::Client client({.socketPath = options.socketPath, .reconnectLimit = std::chrono::seconds(30)});
     checkThatServiceAnswers(client);
     int status = 0;
-    const auto tracks = openTracks(client, options.paths, options.access,
-                                   [&](const std::string& path, const std::string& reason) {
-                                       status = 1;
-                                       std::cerr << "tarnctl: " << printable(path + ": " + reason) << "\n";
-                                   });
-    for (const auto& track : tracks)
-        options.asJSON ? printJSON(track) : print(track);
+    for (const auto& path : options.paths) {
+        try {
+            const auto track = open(client, path, options.access);
+            options.asJSON ? printJSON(track) : print(track);
+        } catch (const std::exception& problem) {
+            status = 1;
+            std::cerr << "tarnctl: " << printable(path + ": " + problem.what()) << "\n";
+        }
+    }
     return status;
 }
 

@@ -3,7 +3,7 @@
 #include <string>
 #include <vector>
 
-#include "client/tool/play/Tracks.h"
+#include "client/tool/play/Track.h"
 
 namespace tarn::tool {
 

@@ -4,8 +4,9 @@
 #include <clocale>
 #include <cmath>
 
+#include "client/tool/display/Columns.h"
+#include "client/tool/display/Keys.h"
 #include "client/tool/display/LiveLine.h"
-#include "client/tool/display/Terminal.h"
 #include "client/tool/display/TimeText.h"
 
 namespace tarn::tool {
@@ -28,11 +29,11 @@ TEST(TimeText, ShowsAndReadsTimes) {
 
 TEST(LiveLine, FitsEveryWidthAndLeavesOutTheLeastImportantFirst) {
     std::setlocale(LC_CTYPE, "C.UTF-8");
-    const LiveState state{"A rather long title 音楽", "Somebody", 61, 120, 1.5F};
+    const LiveState state{"3/12", "A rather long title 音楽", "Somebody", 61, 120, false, 1.5F};
     for (int columns = 1; columns < 150; ++columns)
         EXPECT_LT(columnsOf(liveLine(state, columns, false)), std::max(columns, 2)) << columns;
     const auto wide = liveLine(state, 120, false);
-    EXPECT_THAT(wide, HasSubstr("> A rather long title 音楽 - Somebody 1:01 / 2:00 [=="));
+    EXPECT_THAT(wide, HasSubstr("> 3/12 A rather long title 音楽 - Somebody 1:01 / 2:00 [=="));
     EXPECT_THAT(wide, HasSubstr("] 1.50x"));
     EXPECT_THAT(liveLine(state, 50, false), Not(HasSubstr("[")));
     EXPECT_THAT(liveLine(state, 40, false), Not(HasSubstr("Somebody")));

@@ -5,7 +5,7 @@
 #include <cmath>
 #include <cstdio>
 
-#include "client/tool/display/Terminal.h"
+#include "client/tool/display/Columns.h"
 #include "client/tool/display/TimeText.h"
 
 namespace tarn::tool {
@@ -23,7 +23,7 @@ std::string colored(const std::string& text, const char* code, bool color) {
 std::string rateText(float rate) {
     std::array<char, 32> text{};
     std::snprintf(text.data(), text.size(), " %.2fx", static_cast<double>(rate));
-    return rate == 1.0F || rate == 0.0F ? "" : text.data();
+    return rate == 1.0F ? "" : text.data();
 }
 
 std::string barText(double position, double duration, int columns) {
@@ -37,7 +37,7 @@ std::string barText(double position, double duration, int columns) {
 } // namespace
 
 std::string liveLine(const LiveState& state, int columns, bool color) {
-    const std::string mark = state.rate == 0.0F ? "|| " : state.rate < 0 ? "<< " : "> ";
+    const std::string mark = state.isPaused ? "|| " : state.rate < 0 ? "<< " : "> ";
     const std::string times = " " + timeText(state.position) + " / " + timeText(state.duration);
     const std::string rate = rateText(state.rate);
     const int fixed = columnsOf(mark) + columnsOf(times) + columnsOf(rate);
@@ -45,13 +45,17 @@ std::string liveLine(const LiveState& state, int columns, bool color) {
     if (room < shortestTitle)
         return fitColumns(mark + timeText(state.position), columns - 1);
 
+    std::string place = state.place.empty() ? "" : state.place + " ";
+    if (room - columnsOf(place) < shortestTitle)
+        place.clear();
+    room -= columnsOf(place);
     std::string name = state.title;
     if (!state.artist.empty() && columnsOf(name) + columnsOf(state.artist) + 3 <= room)
         name += " - " + state.artist;
     name = fitColumns(name, room);
     room -= columnsOf(name);
     const int bar = std::min(room, longestBar);
-    return mark + colored(name, "1", color) + times +
+    return mark + place + colored(name, "1", color) + times +
            (bar >= shortestBar ? colored(barText(state.position, state.duration, bar), "36", color) : "") +
            rate;
 }

@@ -8,6 +8,7 @@ namespace tarn::tool {
 enum class Control { pause, play, toggle, next, stop, seek, rate, volume, status };
 
 struct ControlOptions {
+    std::string socketPath; ///< of the service
     Control control = Control::status;
     std::string value{}; ///< of seek, rate and volume, without a fault; empty: show what it is
     bool asJSON = false;

@@ -5,7 +5,7 @@
 #include <cstdio>
 #include <tuple>
 
-#include "client/tool/display/Terminal.h"
+#include "client/tool/display/Columns.h"
 #include "client/tool/display/TimeText.h"
 
 namespace tarn::tool {

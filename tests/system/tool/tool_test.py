@@ -2,28 +2,13 @@
 import contextlib
 import json
 import os
-import pathlib
-import pty
 import re
-import select
 import signal
 import socket
-import subprocess
 import sys
-import tempfile
 import unittest
-import wave
 
-SERVICE, TOOL = (os.path.abspath(argument) for argument in sys.argv[1:3])
-DEADLINE = 30  # seconds
-
-
-def make_song(path, seconds):
-    with wave.open(str(path), "wb") as song:
-        song.setnchannels(1)
-        song.setsampwidth(2)
-        song.setframerate(8000)
-        song.writeframes(bytes(int(2 * 8000 * seconds)))
+from harness import DEADLINE, ToolTest, make_song
 
 
 def wait_for_line(tool, beginning):
@@ -32,59 +17,11 @@ def wait_for_line(tool, beginning):
             raise AssertionError(f"it ended without {beginning}")
 
 
-class TheTool(unittest.TestCase):
+class TheTool(ToolTest):
     def setUp(self):
-        self.folder = pathlib.Path(self.enterContext(tempfile.TemporaryDirectory()))
-        self.environment = {**os.environ, "XDG_RUNTIME_DIR": str(self.folder), "LC_ALL": "C.UTF-8",
-                            "LANGUAGE": "en", "PULSE_SERVER": "unix:/nonexistent", "TERM": "xterm"}
-        make_song(self.folder / "short.wav", 0.3)
-        make_song(self.folder / "long.wav", 60)
-        (self.folder / "empty.mp3").touch()
+        super().setUp()
         (self.folder / "folder").mkdir()
         os.mkfifo(self.folder / "pipe")
-
-    @contextlib.contextmanager
-    def service(self):
-        with tempfile.TemporaryDirectory() as folder, socket.socket(socket.AF_UNIX, socket.SOCK_DGRAM) as readiness:
-            readiness.bind(folder + "/notify")
-            readiness.settimeout(DEADLINE)
-            process = subprocess.Popen([SERVICE], env={**self.environment, "NOTIFY_SOCKET": folder + "/notify"},
-                                       stderr=subprocess.DEVNULL)
-            try:
-                self.assertIn(b"READY=1", readiness.recv(100))
-                yield process
-            finally:
-                process.kill()
-                process.wait()
-
-    @contextlib.contextmanager
-    def bus(self):
-        """A session bus, from now on that of the service and the tool."""
-        address = f"unix:path={self.folder}/bus"
-        process = subprocess.Popen(["dbus-daemon", "--session", "--nofork", "--print-address", "--address", address],
-                                   stdout=subprocess.PIPE, stderr=subprocess.DEVNULL)
-        try:
-            process.stdout.readline()  # it listens
-            self.environment["DBUS_SESSION_BUS_ADDRESS"] = address
-            yield
-        finally:
-            process.kill()
-            process.communicate()
-
-    @contextlib.contextmanager
-    def start(self, *words, stdin=subprocess.DEVNULL, stdout=subprocess.PIPE, stderr=subprocess.STDOUT):
-        with subprocess.Popen([TOOL, *words], env=self.environment, cwd=self.folder, stdin=stdin, stdout=stdout,
-                              stderr=stderr) as tool:
-            try:
-                yield tool
-            finally:
-                tool.kill()  # it has ended, unless something has failed
-
-    def run_tool(self, *words):
-        """How it ended, and its output."""
-        with self.start(*words) as tool:
-            output = tool.communicate(timeout=DEADLINE)[0]
-        return tool.returncode, output.decode("utf-8")
 
     def test_says_what_played_and_ends_with_it(self):
         with self.service():
@@ -99,10 +36,66 @@ class TheTool(unittest.TestCase):
             self.assertIn("Playing short.wav", output)
             self.assertTrue(output.endswith("Stopped at the end.\n"), output)
 
+    def test_plays_folders_and_lists(self):
+        album = self.folder / "album"
+        for name in ("CD 2/Song 10.wav", "CD 2/song 9.wav", "CD 10/x.wav", "CD 2/.hidden.wav", "intro.wav"):
+            (album / name).parent.mkdir(parents=True, exist_ok=True)
+            make_song(album / name, 0.05)
+        for name in ("cover.jpg", "CD 2/notes.txt"):
+            (album / name).touch()
+        (album / "list.m3u8").write_text("\ufeff#EXTM3U\r\nCD 2\\song 9.wav\r\nfile://%s/intr%%6f.wav\nhttp://x/y\nnone\n"
+                                         % album)
+        (album / "list.pls").write_text("[playlist]\nFile10=intro.wav\nFile9=CD 10\nNumberOfEntries=2\n")
+        (album / "itself.m3u").write_text("intro.wav\nitself.m3u\n")
+        everything = ["song 9.wav", "Song 10.wav", "x.wav", "intro.wav"]
+        for words, names, refused in ((["album"], everything, []),
+                                      (["album/list.m3u8"], ["song 9.wav", "intro.wav"], ["http://x/y", "album/none"]),
+                                      (["album/list.pls"], ["x.wav", "intro.wav"], []),
+                                      (["album/itself.m3u"], ["intro.wav"], ["album/itself.m3u"]),
+                                      (["folder", f"file://{album}/intro.wav"], ["intro.wav"], ["folder"])):
+            with self.subTest(words), self.service():
+                status, output = self.run_tool("play", *words)
+                self.assertEqual(re.findall(r"Playing (.*) \(", output), names)
+                self.assertEqual(re.findall(r"(?m)^tarnctl: (.*?): .+$", output), refused)
+                self.assertEqual(status, 1 if refused else 0)
+        with self.service(), open(album / "list.m3u8", "rb") as names:
+            output = self.run_tool("play", "-", stdin=names)[1]  # taken from the current folder
+            self.assertEqual(re.findall(r"Playing (.*) \(", output), ["intro.wav"])
+            output = self.run_tool("play", "--shuffle", "album")[1]
+            self.assertEqual(sorted(re.findall(r"Playing (.*) \(", output)), sorted(everything))
+            with self.start("play", "--loop", "album") as tool:
+                for name in 2 * everything:
+                    wait_for_line(tool, f"Playing {name}".encode())
+
+    def test_plays_in_the_background(self):
+        with self.bus(), self.service():
+            status, output = self.run_tool("play", "--detach", "empty.mp3", "long.wav", "short.wav")
+            self.assertEqual(status, 0)
+            self.assertRegex(output, r"tarnctl: empty\.mp3: .*\nPlaying long\.wav.*\nIn the background: .*\n")
+            first = json.loads(self.run_tool("status", "--json")[1])["background"]
+            self.assertEqual((first["track"], first["tracks"], len(first["problems"])), (2, 3, 1))
+            self.assertEqual(self.run_tool("play", "--detach", "long.wav")[0], 0)
+            self.assertNotEqual(json.loads(self.run_tool("status", "--json")[1])["background"]["process"], first["process"])
+            self.assertRegex(self.run_tool("status")[1], r"Playing long\.wav .*\nIn the background, track 1 of 1;.*\n")
+            self.assertEqual(self.run_tool("stop"), (0, ""))
+            self.assertEqual(self.run_tool("status"), (0, "Nothing plays.\n"))
+            self.assertEqual(self.run_tool("play", "--detach", "empty.mp3")[0], 1)
+            self.assertEqual(self.run_tool("stop")[0], 1)
+
+    def test_keeps_the_rate_when_others_let_it_go_on(self):
+        with self.bus(), self.service(), self.start("play", "--rate", "1.5", "long.wav") as tool, \
+                self.start("status", "--follow") as follower:
+            wait_for_line(follower, b"Playing long.wav (0:00 of 1:00, 1.50x)")
+            for words in (["pause"], ["play"]):
+                self.assertEqual(self.run_tool(*words), (0, ""))
+            wait_for_line(follower, b"Paused")
+            wait_for_line(follower, b"Playing long.wav (0:00 of 1:00, 1.50x)")
+            tool.send_signal(signal.SIGTERM)
+
     def test_refuses_what_it_cannot_do_before_it_connects(self):
         for words in ([], ["seek", "x"], ["rate", "-1"], ["volume", "loud"], ["play", "--rate", "0", "a"], ["play", "--rate", "nan", "a"],
-                      ["play", "--rate", "8", "a"], ["play", "--rate", "-1", "a", "b"], ["play", "--from", "x", "a"],
-                      ["sing"]):
+                      ["play", "--rate", "8", "a"], ["play", "--rate", "-1", "long.wav", "short.wav"],
+                      ["play", "--from", "x", "a"], ["sing"]):
             status, output = self.run_tool(*words)
             self.assertEqual(status, 2, words)
             self.assertNotEqual(output, "", words)
@@ -124,18 +117,26 @@ class TheTool(unittest.TestCase):
                     self.assertIsNone(re.search("[\x00-\x09\x0b-\x1f]", output), output)
 
     def test_stops_when_it_is_told_to(self):
-        with self.service() as service:
+        with self.service():
             for number in (signal.SIGINT, signal.SIGTERM):
                 with self.start("play", "long.wav") as tool:
                     self.assertEqual(tool.stdout.readline(), b"Playing long.wav (1:00)\n")
                     tool.send_signal(number)
                     self.assertEqual(tool.communicate(timeout=DEADLINE)[0], b"Stopped.\n")
                 self.assertEqual(tool.returncode, 128 + number)
-            with self.start("play", "long.wav") as tool:
-                tool.stdout.readline()
+
+    def test_goes_on_when_the_service_comes_back(self):
+        with contextlib.ExitStack() as services:
+            service = services.enter_context(self.service())
+            with self.start("play", "--from", "59", "long.wav") as tool:
+                wait_for_line(tool, b"Playing long.wav")
                 service.kill()
-                self.assertIn(b"connection to the service was lost", tool.communicate(timeout=DEADLINE)[0])
-            self.assertEqual(tool.returncode, 1)
+                service.wait()
+                wait_for_line(tool, b"The service is gone")
+                services.enter_context(self.service())
+                wait_for_line(tool, b"The service is back.")
+                wait_for_line(tool, b"Played everything.")
+                self.assertEqual(tool.wait(DEADLINE), 0)
 
     def test_controls_what_plays_without_taking_over(self):
         def control(*words):
@@ -186,34 +187,7 @@ class TheTool(unittest.TestCase):
                     connection.recv(1)  # it asks whether anybody is there
                     tool.send_signal(signal.SIGINT)
                     tool.communicate(timeout=DEADLINE)
-            self.assertEqual(tool.returncode, -signal.SIGINT)
-
-    def test_obeys_keys_on_a_terminal(self):
-        with self.service():
-            here, there = pty.openpty()
-            with open(here, "r+b", buffering=0) as terminal, open(there, "r+b", buffering=0) as its_side, \
-                    self.start("play", "long.wav", "short.wav", stdin=its_side, stdout=its_side,
-                               stderr=its_side) as tool:
-                shown = b""
-
-                def wait_for(pattern):
-                    nonlocal shown
-                    while not re.search(pattern, shown):
-                        self.assertTrue(select.select([terminal], [], [], DEADLINE)[0], shown)
-                        shown += terminal.read(4096)
-                    shown = b""
-
-                wait_for(rb"> .*long\.wav")
-                terminal.write(b" ")
-                wait_for(rb"\|\| .*long\.wav")
-                terminal.write(b"\x1b[A\x1b[3~\x1bOH")  # keys that mean nothing change nothing
-                terminal.write(b"]")
-                wait_for(rb"1\.25x")
-                terminal.write(b"\x1b[C")
-                wait_for(rb"0:1\d / 1:00")
-                terminal.write(b"q")
-                wait_for(rb"Stopped\.")
-                self.assertEqual(tool.wait(DEADLINE), 0)
+            self.assertIn(tool.returncode, (-signal.SIGINT, 128 + signal.SIGINT))
 
 
 if __name__ == "__main__":
