@@ -10,6 +10,7 @@
 #include <csignal>
 #include <cstdio>
 #include <cstdlib>
+#include <ctime>
 #include <string_view>
 
 #include "bench/support/ProcFile.h"
@@ -37,19 +38,19 @@ void waitUntilReady(int notifications) {
     std::abort();
 }
 
-[[noreturn]] void become(const fs::path& folder, const fs::path& readySocket) {
+[[noreturn]] void become(const fs::path& program, const fs::path& folder, const fs::path& readySocket) {
     ::setenv("XDG_RUNTIME_DIR", folder.c_str(), 1);
     ::setenv("NOTIFY_SOCKET", readySocket.c_str(), 1);
     ::unsetenv("DBUS_SESSION_BUS_ADDRESS");
     const int nowhere = ::open("/dev/null", O_WRONLY | O_CLOEXEC);
     ::dup2(nowhere, STDERR_FILENO);
-    ::execl(TARND, "tarnd", nullptr);
+    ::execl(program.c_str(), "tarnd", nullptr);
     _exit(127);
 }
 
 } // namespace
 
-ServiceProcess::ServiceProcess() {
+ServiceProcess::ServiceProcess(const fs::path& program) {
     std::string name = (fs::temp_directory_path() / "tarn-bench-XXXXXX").string();
     if (::mkdtemp(name.data()) == nullptr)
         std::abort();
@@ -61,7 +62,7 @@ ServiceProcess::ServiceProcess() {
     const auto begin = std::chrono::steady_clock::now();
     pid_ = ::fork();
     if (pid_ == 0)
-        become(folder_, readyPath);
+        become(program, folder_, readyPath);
     waitUntilReady(ready.get());
     startTime_ = std::chrono::steady_clock::now() - begin;
 }
@@ -87,6 +88,18 @@ long ServiceProcess::memory() const {
 
 long ServiceProcess::residentMemory() const {
     return numberInProcFile(fs::path("/proc") / std::to_string(pid_) / "status", "VmRSS:");
+}
+
+long ServiceProcess::anonymousMemory() const {
+    return numberInProcFile(fs::path("/proc") / std::to_string(pid_) / "status", "RssAnon:");
+}
+
+std::chrono::nanoseconds ServiceProcess::processorTime() const {
+    clockid_t clock = 0;
+    timespec time{};
+    if (::clock_getcpuclockid(pid_, &clock) != 0 || ::clock_gettime(clock, &time) != 0)
+        std::abort();
+    return std::chrono::seconds(time.tv_sec) + std::chrono::nanoseconds(time.tv_nsec);
 }
 
 std::size_t ServiceProcess::threads() const {

@@ -10,11 +10,11 @@
 
 namespace tarn::bench {
 
-/// A tarnd on a socket of its own in an empty runtime folder. Ends with this object.
+/// A tarnd with a socket of its own in an empty runtime folder. It ends with this object.
 class ServiceProcess {
 public:
-    /// Returns when the service has said that it is ready.
-    ServiceProcess();
+    /// Starts `program`, by default the service of this build, and returns when it has said that it is ready.
+    explicit ServiceProcess(const std::filesystem::path& program = TARND);
     ~ServiceProcess();
     ServiceProcess(const ServiceProcess&) = delete;
     ServiceProcess& operator=(const ServiceProcess&) = delete;
@@ -29,9 +29,13 @@ public:
     long memory() const;
     /// Resident memory in KiB.
     long residentMemory() const;
+    /// Resident memory in KiB that belongs to no file.
+    long anonymousMemory() const;
+    /// What it has used of a processor, also in threads that have ended.
+    std::chrono::nanoseconds processorTime() const;
     std::size_t threads() const;
     std::size_t openFiles() const;
-    /// Times that its threads have waited and gone on, in all.
+    /// How often its living threads have waited and gone on, in all.
     long wakeups() const;
 
 private:
