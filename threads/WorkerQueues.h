@@ -1,24 +1,34 @@
 #pragma once
 
+#include <semaphore>
+
 #include "roles/SerialQueue.h"
-#include "threads/MainQueue.h"
 #include "threads/WorkerPool.h"
+#include "threads/WorkerQueue.h"
 
 namespace tarn {
 
-/// The queues of the process: serial queues on shared workers, and the main queue. Destroying it lets the
-/// serial queues' work run out; not from that work.
+/// The serial queues of the process, all on one pool of workers.
+///
+/// The main queue is one of them: nothing that it runs needs the main thread itself, which only waits for the
+/// end. Destroying this lets submitted work run to its end, so it must not happen on a queue.
 class WorkerQueues final : public SerialQueues {
 public:
     std::shared_ptr<SerialQueue> create(std::string label) override;
-    MainQueue& main() override { return main_; }
-    void runMainLoop() override { main_.runLoop(); }
+    SerialQueue& main() override { return main_; }
+
+    /// Waits for endMainLoop(), which may have come before.
+    void runMainLoop() override { ended_.acquire(); }
+
+    /// Any thread; once.
+    void endMainLoop() { ended_.release(); }
 
     const WorkerPool& pool() const { return pool_; }
 
 private:
-    MainQueue main_;
+    std::binary_semaphore ended_{0};
     WorkerPool pool_;
+    WorkerQueue main_{pool_, "main"};
 };
 
 } // namespace tarn

@@ -49,9 +49,9 @@ ThreadedWorld::ThreadedWorld(std::uint64_t seed)
                   [] { std::this_thread::yield(); }}),
       service_(std::make_shared<VLLongFormAudioServer>(
           Platform{clock_, queues_, listeners_, localization_, notifications_, *media_, *audioSession_,
-                   sandboxExtensions_, remoteCommands_, nowPlaying_, applications_})),
-      mainThread_([this] { service_->run(); }) {
-    queues_.main().sync([] {}); // from now on it listens
+                   sandboxExtensions_, remoteCommands_, nowPlaying_, applications_})) {
+    queues_.endMainLoop(); // the main thread only waits for the end: it is not needed
+    service_->run();
 }
 
 void SimulatedWorld::settleIntake() {
@@ -59,11 +59,7 @@ void SimulatedWorld::settleIntake() {
     platform_.queues.main().sync([] {});
 }
 
-ThreadedWorld::~ThreadedWorld() {
-    settle();
-    queues_.main().end();
-    mainThread_.join();
-}
+ThreadedWorld::~ThreadedWorld() { settle(); }
 
 void ThreadedWorld::linger() {
     for (auto times = random(20); times > 0; --times)

@@ -92,7 +92,6 @@ private:
     WorkerQueues queues_;
     SimulatedServiceListeners listeners_;
     std::shared_ptr<VLLongFormAudioServer> service_;
-    std::thread mainThread_;
 };
 
 } // namespace tarn

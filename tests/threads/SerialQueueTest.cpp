@@ -2,7 +2,6 @@
 #include <gtest/gtest.h>
 
 #include <array>
-#include <atomic>
 #include <future>
 #include <latch>
 #include <random>
@@ -17,19 +16,10 @@ namespace {
 
 using namespace std::chrono_literals;
 
-/// Queues with a main thread that drains the main queue.
 class SerialQueueTest : public testing::Test {
 protected:
-    ~SerialQueueTest() override {
-        queues_.main().end();
-        mainThread_.join();
-    }
-
     WorkerQueues queues_;
     SteadyClock clock_;
-
-private:
-    std::thread mainThread_{[this] { queues_.runMainLoop(); }};
 };
 
 TEST_F(SerialQueueTest, WorkOfManyThreadsRunsOneAtATimeAndInOrder) {
@@ -73,79 +63,6 @@ TEST_F(SerialQueueTest, SyncOnAnIdleQueueRunsInPlace) {
     EXPECT_EQ(ranOn, std::this_thread::get_id());
     EXPECT_FALSE(queue->isCurrent());
     EXPECT_EQ(queues_.pool().threads(), 0u);
-}
-
-TEST_F(SerialQueueTest, TheMainQueueIsLentWhileItsThreadWaitsAndTakesUpWhatCameMeanwhile) {
-    const auto caller = std::this_thread::get_id();
-    std::thread::id ranOn;
-    std::promise<std::thread::id> cameMeanwhile;
-    while (ranOn != caller) // until the main thread has come to wait
-        queues_.main().sync([&] { ranOn = std::this_thread::get_id(); });
-    queues_.main().sync([&] {
-        EXPECT_TRUE(queues_.main().isCurrent());
-        queues_.main().async([&] { cameMeanwhile.set_value(std::this_thread::get_id()); });
-    });
-    EXPECT_NE(cameMeanwhile.get_future().get(), caller);
-}
-
-TEST_F(SerialQueueTest, TheMainQueueRunsOneThingAtATimeWhetherLentOrNot) {
-    constexpr int threads = 4;
-    constexpr int rounds = 20'000;
-    int ran = 0; // unguarded, but for the queue
-    {
-        std::array<std::jthread, threads> submitters;
-        for (auto& submitter : submitters)
-            submitter = std::jthread([&] {
-                for (int round = 0; round < rounds; ++round)
-                    if (round % 3 == 0)
-                        queues_.main().async([&] { ++ran; });
-                    else
-                        queues_.main().sync([&] { ++ran; });
-            });
-    }
-    queues_.main().sync([&] { EXPECT_EQ(ran, threads * rounds); });
-}
-
-TEST_F(SerialQueueTest, TheMainQueueIsLentToOneAtATime) {
-    for (int lent = 0; lent < 100;) {
-        std::atomic<bool> comes = false;
-        std::atomic<bool> ran = false;
-        std::jthread other;
-        queues_.main().sync([&, caller = std::this_thread::get_id()] {
-            if (std::this_thread::get_id() != caller)
-                return;
-            ++lent;
-            other = std::jthread([&] {
-                comes = true;
-                queues_.main().sync([&] { ran = true; });
-            });
-            while (!comes)
-                std::this_thread::yield();
-            for (int i = 0; i < 100; ++i)
-                std::this_thread::yield();
-            EXPECT_FALSE(ran);
-        });
-    }
-}
-
-TEST(MainQueueTest, TheRunLoopReturnsWhenNoWorkRunsInPlaceAnyMore) {
-    MainQueue queue;
-    std::atomic<bool> returned = false;
-    std::jthread loop([&] {
-        queue.runLoop();
-        returned = true;
-    });
-    bool isLent = false;
-    while (!isLent)
-        queue.sync([&, caller = std::this_thread::get_id()] {
-            isLent = std::this_thread::get_id() == caller;
-            if (!isLent)
-                return;
-            queue.end();
-            for (int i = 0; i < 100; ++i)
-                std::this_thread::yield();
-            EXPECT_FALSE(returned);
-        });
 }
 
 TEST_F(SerialQueueTest, SyncWaitsForEverythingSubmittedBefore) {
@@ -245,6 +162,15 @@ TEST_F(SerialQueueDeathTest, AnExceptionThatLeavesWorkEndsTheProcess) {
             }
         },
         "escaped");
+}
+
+TEST(WorkerQueuesTest, TheRunLoopOnlyWaitsForItsEndWhileTheMainQueueWorks) {
+    WorkerQueues queues;
+    std::promise<void> ran;
+    std::jthread loop([&] { queues.runMainLoop(); });
+    queues.main().async([&] { ran.set_value(); });
+    ran.get_future().wait();
+    queues.endMainLoop();
 }
 
 TEST(SteadyClockTest, ASignalEndsTheWaitAndTheLimitDoesToo) {
