@@ -2,12 +2,12 @@
 
 namespace tarn {
 
-/// Stands around anything that may hold up the calling thread for long: waiting for another thread, opening
-/// files.
+/// Stands around everything that may hold up the calling thread for long, such as waiting for another thread
+/// or opening a file.
 ///
-/// First finishes what the thread's burst has deferred, so that no answer waits behind the block. On a worker
-/// it also lets other workers take over the queues that this one would have gone on with. Code that runs on
-/// a queue and waits for anything without it may wait for work that nobody runs.
+/// At its begin the answers that the thread has gathered in its burst are sent, since they must not wait as
+/// long. On a worker it also sends another worker to the queues that this one would have gone on with. Work
+/// that waits for anything outside of a blocking section may wait for work that nobody runs.
 class BlockingSection {
 public:
     BlockingSection();
@@ -16,7 +16,7 @@ public:
     BlockingSection& operator=(const BlockingSection&) = delete;
 
 private:
-    bool entered_; // and not the one around it
+    bool entered_; // false inside of another one, and on a thread that is no worker
 };
 
 } // namespace tarn

@@ -5,31 +5,30 @@
 
 namespace tarn {
 
-/// A stretch of work on one thread whose small output leaves together at its end, such as the answers to many
-/// commands in one write.
+/// A stretch of work on one thread whose small output leaves together: the answers to many commands in one
+/// write.
 ///
-/// A worker holds one burst from the moment it wakes up until it has nothing left to do, and flushes it at
-/// least every millisecond.
+/// Every worker holds one as long as it lives, and flushes it after each turn and before each wait.
 class Burst {
 public:
-    /// Something that can wait for the end of a burst. finishBurst() runs on the thread that deferred it.
+    /// Something whose output can wait. finishBurst() lets it out, on the thread that deferred it.
     class Deferred {
     public:
         virtual ~Deferred() = default;
         virtual void finishBurst() noexcept = 0;
     };
 
-    /// Opens a burst on the calling thread, unless it is in one.
+    /// Begins a burst on the calling thread, unless it is in one; the end flushes.
     Burst();
     ~Burst();
     Burst(const Burst&) = delete;
     Burst& operator=(const Burst&) = delete;
 
-    /// Any thread: calls finishBurst() once at the end of the caller's burst, however often it is deferred
-    /// before; at once when the caller is in no burst.
+    /// Any thread: calls finishBurst() at the caller's next flush, once, however often it is deferred before;
+    /// at once when the calling thread has no burst.
     static void defer(const std::shared_ptr<Deferred>& deferred);
 
-    /// Any thread: finishes what the caller's burst has deferred so far.
+    /// Any thread: lets out what has been deferred on it so far.
     static void flush();
 
 private:

@@ -1,94 +1,98 @@
 #pragma once
 
-#include <chrono>
-#include <condition_variable>
 #include <cstddef>
-#include <deque>
-#include <list>
+#include <functional>
 #include <memory>
-#include <mutex>
-#include <semaphore>
-#include <thread>
-#include <vector>
+
+#include "threads/Primitives.h"
 
 namespace tarn {
 
-/// Threads that are lent to serial queues while these have work.
+/// The threads that run the work of all serial queues.
 ///
-/// A thread is made when work finds none free, and ends when enough others are idle. A worker that gives work
-/// to a queue takes that queue up itself when it is done with its own, rather than wake another thread. Only
-/// a few workers run at a time; those in a BlockingSection do not count.
+/// The problem: there are many serial queues, most of them idle, and a client may make more of them at any
+/// time. A thread for each would cost memory, and waking a thread costs several times as much as what a
+/// command does.
+///
+/// The idea: a queue that has work stands in one line, and the workers go to and from that line. A worker
+/// takes the first queue, runs a turn of it, sends the answers that were made in that turn, and comes back.
+/// With nothing in the line it goes to sleep; when enough others sleep already, it ends.
+///
+///     async() ──> [ queue | queue | queue ]  the line
+///                   │               ▲
+///             takes │               │ puts back what has more to do,
+///                   ▼               │ and what it has given work to
+///                 worker ── a turn ─┘
+///
+/// Two rules keep it going:
+///
+/// 1. While a queue stands in the line, a worker is on its way there. Whoever puts a queue into the line
+///    wakes a sleeping worker or makes a new one. Only a worker that has come from the line need not: it
+///    comes back anyhow. It may rely on this for one queue in each turn; for the next ones it calls somebody,
+///    so that they run beside each other. A worker that is about to wait for something (BlockingSection)
+///    sends somebody else.
+/// 2. There is always a worker. The first one is made with the pool, and one ends only while others sleep.
+///    So when the system has no more threads to give, all that was accepted still runs, only later: at the
+///    latest when the workers that wait have what they wait for.
+///
+/// Nothing here allocates memory but the start of a thread, and that may fail: handing a queue over cannot.
 class WorkerPool {
 public:
-    using TimePoint = std::chrono::steady_clock::time_point;
+    static constexpr std::size_t mostSleeping = 3;
+    /// Four are at work for one client at most. The rest is for those that wait: with so many waiting at
+    /// once, other work waits for one of them.
+    static constexpr std::size_t mostWorkers = 48;
 
-    static constexpr std::size_t maxRunning = 4;
-    static constexpr std::size_t maxIdle = 3;
-    /// With so many threads blocked at once, further work waits for one of them.
-    static constexpr std::size_t maxThreads = 48;
-    /// How long a worker stays with one task, and answers with the worker, while others wait.
-    static constexpr std::chrono::milliseconds slice{1};
-
+    /// What stands in the line: a serial queue.
     class Task {
     public:
         virtual ~Task() = default;
 
-        /// Works until nothing is left or `end` has passed; true when something is left.
-        virtual bool run(TimePoint end) noexcept = 0;
+        /// Does a part of what there is to do, on a worker. Schedules itself again when more is left.
+        virtual void runTurn() noexcept = 0;
+
+    private:
+        friend class WorkerPool;
+        std::shared_ptr<Task> next_; // in the line
     };
 
-    WorkerPool() = default;
+    using StartThread = std::function<bool(std::function<void()> body)>;
 
-    /// Lets all scheduled tasks run out, then ends the threads. Not on a worker.
+    /// `start` says how a thread is made and whether it was. Throws std::system_error when there is no thread
+    /// for the first worker.
+    explicit WorkerPool(StartThread start = startThread);
+
+    /// Lets everything in the line run out, then ends the workers. Not on a worker.
     ~WorkerPool();
     WorkerPool(const WorkerPool&) = delete;
     WorkerPool& operator=(const WorkerPool&) = delete;
 
-    /// Any thread: runs `task` soon. A task must not be scheduled again before it has said that nothing is
-    /// left.
-    void schedule(std::shared_ptr<Task> task);
+    /// Any thread: puts `task` at the end of the line, in which it must not stand already.
+    void schedule(std::shared_ptr<Task> task) noexcept;
 
-    /// Living threads, for tests.
-    std::size_t threads() const;
+    /// The living workers, for tests.
+    std::size_t workers() const;
 
 private:
     friend class BlockingSection;
+    struct Worker;
 
-    struct Worker {
-        explicit Worker(WorkerPool& owner) : pool(owner) {}
+    bool callWorker();
+    void beginWaiting(Worker& worker);
+    void work();
+    std::shared_ptr<Task> takeFirst(Worker& worker);
 
-        WorkerPool& pool;
-        std::shared_ptr<Task> next; // to be taken up by this worker when it is done with its own
-        bool blocked = false;       // in a BlockingSection
+    static thread_local Worker* current_;
 
-        std::counting_semaphore<> wake{0};
-        std::shared_ptr<Task> given; // to an idle worker, before it is woken
-        std::thread thread;          // under the pool's lock
-    };
-    using Workers = std::list<std::shared_ptr<Worker>>;
-
-    void makeReady(std::shared_ptr<Task> task);
-    std::shared_ptr<Worker> giveLocked(std::shared_ptr<Task> task);
-    void spawnLocked();
-    void beginBlocking(Worker& worker);
-    void endBlocking(Worker& worker);
-    void work(Workers::iterator self);
-    void runSlices(Worker& worker, std::shared_ptr<Task> task);
-    std::shared_ptr<Task> takeNext(Worker& worker);
-    std::shared_ptr<Task> takeReadyLocked();
-    std::shared_ptr<Task> waitForTask(Workers::iterator self);
-    void joinFinished();
-
-    static thread_local Worker* currentWorker_;
-
-    mutable std::mutex mutex_;
-    std::condition_variable retired_;
-    std::deque<std::shared_ptr<Task>> ready_; // empty while a worker is idle
-    Workers workers_;
-    Workers finished_;                          // left work() or are about to; to be joined
-    std::vector<std::shared_ptr<Worker>> idle_; // the last one worked last: its memory is the warmest
-    std::size_t blocked_ = 0;
+    const StartThread start_;
+    mutable Mutex mutex_; // guards what follows up to the semaphores
+    std::shared_ptr<Task> first_;
+    Task* last_ = nullptr; // good while there is a first one
+    std::size_t workers_ = 0;
+    std::size_t sleeping_ = 0; // those that nobody has woken yet
     bool stopping_ = false;
+    Semaphore wake_{0};
+    Semaphore lastEnded_{0};
 };
 
 } // namespace tarn

@@ -1,17 +1,18 @@
 #include "threads/WorkerQueue.h"
 
+#include <cassert>
+#include <cstddef>
 #include <deque>
 #include <mutex>
 #include <utility>
 
+#include "threads/BlockingSection.h"
+#include "threads/Primitives.h"
 #include "threads/QueueFrame.h"
-#include "threads/QueueTurn.h"
 #include "threads/WorkerPool.h"
 
 namespace tarn {
 
-/// Whoever holds the queue runs its work: nobody while it is idle, a worker (or the pool on its behalf), or a
-/// thread in sync(). Giving it up means handing it to the next in line, so that the order is kept.
 class WorkerQueue::State final : public WorkerPool::Task, public std::enable_shared_from_this<State> {
 public:
     State(WorkerPool& pool, std::string label) : pool_(pool), label_(std::move(label)) {}
@@ -19,82 +20,94 @@ public:
     const std::string& label() const { return label_; }
 
     void async(Work work) {
-        {
-            std::lock_guard lock(mutex_);
-            line_.push_back({std::move(work), nullptr});
-            if (held_)
-                return;
-            held_ = true;
-        }
-        pool_.schedule(shared_from_this());
+        std::unique_lock lock(mutex_);
+        line_.push_back({std::move(work), false});
+        callWorker(std::move(lock));
     }
 
     void sync(const std::function<void()>& work) {
         QueueFrame::abortIfInside(this, label_);
-        takeTurn();
+        std::unique_lock lock(mutex_);
+        if (isInside_)
+            return waitFor(work, std::move(lock));
+        isInside_ = true;
+        runLine(lock, line_.size());
+        lock.unlock();
         QueueFrame::run(this, work);
-        giveUp();
+        lock.lock();
+        leave(std::move(lock));
     }
 
-    bool run(WorkerPool::TimePoint end) noexcept override {
-        for (bool isFirst = true; !handOver(); isFirst = false) {
-            if (!isFirst && std::chrono::steady_clock::now() >= end)
-                return true;
-            Entry entry = std::move(taken_.front());
-            taken_.pop_front();
-            QueueFrame frame(this);
-            entry.work();
-            entry.work = nullptr; // what it held may be the queue's last owner: still on the queue
-        }
-        return false;
+    void runTurn() noexcept override {
+        std::unique_lock lock(mutex_);
+        isScheduled_ = false;
+        if (isInside_)
+            return;
+        isInside_ = true;
+        runLine(lock, turn);
+        leave(std::move(lock));
     }
 
 private:
-    /// Work for a worker, or a thread that waits in sync().
+    /// How many pieces of work a worker runs before other queues, and the answers, have their turn.
+    static constexpr std::size_t turn = 64;
+
     struct Entry {
         Work work;
-        QueueTurn* turn;
+        bool isWaitedFor;
     };
 
-    void takeTurn() {
-        QueueTurn turn;
-        {
-            std::lock_guard lock(mutex_);
-            if (!std::exchange(held_, true))
-                return;
-            line_.push_back({nullptr, &turn});
-        }
-        turn.wait();
+    void waitFor(const std::function<void()>& work, std::unique_lock<Mutex> lock) {
+        // Shared, because whoever releases it is still at it when this thread goes on.
+        const auto done = std::make_shared<Semaphore>(0);
+        line_.push_back({[&work, done] {
+                             work();
+                             done->release();
+                         },
+                         true});
+        ++waiting_;
+        lock.unlock();
+        BlockingSection blocking;
+        done->acquire();
     }
 
-    void giveUp() {
-        if (!handOver())
-            pool_.schedule(shared_from_this());
+    /// Runs the first `count` entries, and all up to the last one that somebody waits for.
+    void runLine(std::unique_lock<Mutex>& lock, std::size_t count) noexcept {
+        for (std::size_t done = 0; !line_.empty() && (done < count || waiting_ > 0); ++done) {
+            Entry entry = std::move(line_.front());
+            line_.pop_front();
+            waiting_ -= entry.isWaitedFor ? 1 : 0;
+            lock.unlock();
+            {
+                const QueueFrame frame(this);
+                entry.work();
+                entry.work = nullptr; // what it held may be the queue's last owner: still on the queue
+            }
+            lock.lock();
+        }
     }
 
-    /// Lets go of the queue unless the next in line is work for a worker.
-    bool handOver() {
-        if (taken_.empty()) {
-            std::lock_guard lock(mutex_);
-            held_ = !line_.empty();
-            if (!held_)
-                return true;
-            taken_.swap(line_);
-        }
-        QueueTurn* turn = taken_.front().turn;
-        if (turn == nullptr)
-            return false;
-        taken_.pop_front();
-        turn->grant();
-        return true;
+    void leave(std::unique_lock<Mutex> lock) {
+        runLine(lock, 0);
+        isInside_ = false;
+        callWorker(std::move(lock));
+    }
+
+    /// Unless there is nothing to do, or somebody who will see to it.
+    void callWorker(std::unique_lock<Mutex> lock) noexcept {
+        if (line_.empty() || isInside_ || std::exchange(isScheduled_, true))
+            return;
+        lock.unlock();
+        pool_.schedule(shared_from_this());
     }
 
     WorkerPool& pool_;
     const std::string label_;
-    std::deque<Entry> taken_; // from the line, all at once, by whoever holds the queue; before the line
-    std::mutex mutex_;        // guards what follows
+    Mutex mutex_; // guards what follows
     std::deque<Entry> line_;
-    bool held_ = false;
+    std::size_t waiting_ = 0;  // threads, for entries of the line
+    bool isInside_ = false;    // some thread
+    bool isScheduled_ = false; // stands in the pool's line
 };
 
 WorkerQueue::WorkerQueue(WorkerPool& pool, std::string label)

@@ -1,8 +1,11 @@
 #pragma once
 
-#include <semaphore>
+#include <memory>
+#include <string>
+#include <utility>
 
 #include "roles/SerialQueue.h"
+#include "threads/Primitives.h"
 #include "threads/WorkerPool.h"
 #include "threads/WorkerQueue.h"
 
@@ -14,7 +17,11 @@ namespace tarn {
 /// end. Destroying this lets submitted work run to its end, so it must not happen on a queue.
 class WorkerQueues final : public SerialQueues {
 public:
-    std::shared_ptr<SerialQueue> create(std::string label) override;
+    explicit WorkerQueues(WorkerPool::StartThread start = startThread) : pool_(std::move(start)) {}
+
+    std::shared_ptr<SerialQueue> create(std::string label) override {
+        return std::make_shared<WorkerQueue>(pool_, std::move(label));
+    }
     SerialQueue& main() override { return main_; }
 
     /// Waits for endMainLoop(), which may have come before.
@@ -26,7 +33,7 @@ public:
     const WorkerPool& pool() const { return pool_; }
 
 private:
-    std::binary_semaphore ended_{0};
+    Semaphore ended_{0};
     WorkerPool pool_;
     WorkerQueue main_{pool_, "main"};
 };

@@ -17,11 +17,12 @@
 #include "tests/support/CapturedLog.h"
 #include "tests/support/ClientCommands.h"
 #include "threads/LiveObjects.h"
+#include "threads/WorkerQueues.h"
 
 namespace {
 
-/// How many allocations go well until one does not; none fails while this is negative.
-long allocationsLeft = -1;
+/// How many allocations of this thread go well until one does not; none fails while this is negative.
+thread_local long allocationsLeft = -1;
 bool wasReached = false;
 
 } // namespace
@@ -163,6 +164,26 @@ TEST_P(AllocationFailureTest, IsAnsweredWithAnErrorOrEndsTheProcess) {
 
 INSTANTIATE_TEST_SUITE_P(EveryCommand, AllocationFailureTest, testing::ValuesIn(stories),
                          [](const auto& story) { return std::string(story.param.name); });
+
+TEST(WorkerQueueTest, WorkThatCannotBeNotedDownIsRefusedAndNoOtherIsLost) {
+    WorkerQueues queues;
+    auto queue = queues.create("test.queue");
+    int accepted = 0;
+    int ran = 0; // touched on the queue only
+    int refused = 0;
+    for (long failing = 0; failing < 100; ++failing) {
+        allocationsLeft = failing;
+        try {
+            for (int i = 0; i < 20; ++i, ++accepted)
+                queue->async([&] { ++ran; });
+        } catch (const std::bad_alloc&) {
+            ++refused;
+        }
+        allocationsLeft = -1;
+    }
+    queue->sync([&] { EXPECT_EQ(ran, accepted); });
+    EXPECT_GT(refused, 0);
+}
 
 } // namespace
 } // namespace tarn

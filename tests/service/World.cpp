@@ -45,7 +45,9 @@ ThreadedWorld::ThreadedWorld(std::uint64_t seed)
     : random_(seed),
       media_(std::make_unique<NoMedia>()),
       audioSession_(std::make_unique<NoSession>()),
-      listeners_({queues_.create("I/O"), [this](std::size_t limit) { return random(limit); },
+      threadsLeft_(2 + static_cast<int>(seed % 3)),
+      queues_([this](auto body) { return threadsLeft_.fetch_sub(1) > 0 && startThread(std::move(body)); }),
+      listeners_({IOThread_.create("I/O"), [this](std::size_t limit) { return random(limit); },
                   [] { std::this_thread::yield(); }}),
       service_(std::make_shared<VLLongFormAudioServer>(
           Platform{clock_, queues_, listeners_, localization_, notifications_, *media_, *audioSession_,

@@ -56,7 +56,8 @@ private:
     std::shared_ptr<VLLongFormAudioServer> service_;
 };
 
-/// The service on real threads, with every role that it needs for commands that find no object.
+/// The service on real threads, of which the system has only a few, with every role that it needs for
+/// commands that find no object.
 class ThreadedWorld {
 public:
     static constexpr int rounds = 50;
@@ -89,7 +90,9 @@ private:
     RemoteTargets remoteCommands_;
     SimulatedNowPlayingService nowPlaying_;
     SimulatedApplicationRegistry applications_;
+    std::atomic<int> threadsLeft_; // of which one may be parked by a test
     WorkerQueues queues_;
+    WorkerQueues IOThread_;
     SimulatedServiceListeners listeners_;
     std::shared_ptr<VLLongFormAudioServer> service_;
 };
