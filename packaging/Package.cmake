@@ -9,7 +9,7 @@ set(package_documentation tarn-doc)
 # The changes of the program, and those of its packages, which are made anew from every version.
 set(CPACK_PACKAGE_NAME tarn)
 set(CPACK_PACKAGE_CONTACT "tarn developers <tarn@packages.invalid>")
-set(CPACK_DEBIAN_PACKAGE_RELEASE 1)
+set(CPACK_DEBIAN_PACKAGE_RELEASE 0tarn1) # older than any package of this version that Debian may come to have
 set(package_version ${PROJECT_VERSION}-${CPACK_DEBIAN_PACKAGE_RELEASE})
 string(TIMESTAMP package_date "%a, %d %b %Y %H:%M:%S +0000" UTC)
 configure_file(debian/changelog.in changelog.Debian)
@@ -58,6 +58,9 @@ set(CPACK_COMPONENT_LIBRARY_DESCRIPTION "client library of the background audio 
 Programs in C++ play through the service with it.")
 set(CPACK_DEBIAN_LIBRARY_PACKAGE_SECTION libs)
 set(CPACK_DEBIAN_LIBRARY_PACKAGE_RECOMMENDS tarnd)
+configure_file(debian/libtarn.lintian-overrides.in ${package_library} @ONLY)
+install(FILES ${CMAKE_CURRENT_BINARY_DIR}/${package_library}
+    DESTINATION ${CMAKE_INSTALL_DATADIR}/lintian/overrides COMPONENT library)
 file(WRITE ${CMAKE_CURRENT_BINARY_DIR}/shlibs "libtarn ${soversion} ${package_library} (>= ${package_version})\n")
 set(CPACK_DEBIAN_LIBRARY_PACKAGE_CONTROL_EXTRA
     "${CMAKE_CURRENT_BINARY_DIR}/shlibs;${CMAKE_CURRENT_SOURCE_DIR}/debian/triggers")
