@@ -77,8 +77,9 @@ class TheTool(ToolTest):
             self.assertEqual(self.run_tool("play", "--detach", "long.wav")[0], 0)
             self.assertNotEqual(json.loads(self.run_tool("status", "--json")[1])["background"]["process"], first["process"])
             self.assertRegex(self.run_tool("status")[1], r"Playing long\.wav .*\nIn the background, track 1 of 1;.*\n")
-            self.assertEqual(self.run_tool("stop"), (0, ""))
-            self.assertEqual(self.run_tool("status"), (0, "Nothing plays.\n"))
+            with self.start("status", "--follow") as follower:
+                self.assertEqual(self.run_tool("stop"), (0, ""))
+                wait_for_line(follower, b"Nothing plays.")
             self.assertEqual(self.run_tool("play", "--detach", "empty.mp3")[0], 1)
             self.assertEqual(self.run_tool("stop")[0], 1)
 
