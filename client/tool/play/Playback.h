@@ -55,7 +55,8 @@ public:
     const Track* current() const { return current_ ? &*current_ : nullptr; }
     std::size_t size() const { return queue_.size(); }
     bool isPlaying() const { return rate_ != 0; }
-    bool isPaused() const { return !wantsToPlay_; }
+    /// As it is meant; until the first sound, as it is.
+    bool isPaused() const { return !wantsToPlay_ || (!hasStarted_ && rate_ == 0); }
     float usualRate() const { return usualRate_; }
     double position() const;
     /// Since when the service is gone, while that lasts. What plays goes on when it is back.
