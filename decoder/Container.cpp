@@ -4,9 +4,14 @@
 #include <cerrno>
 #include <cstring>
 
+#include "decoder/CodedPcm.h"
+#include "decoder/KnownFormat.h"
+
 namespace tarn {
 
 namespace {
+
+using namespace std::chrono_literals;
 
 constexpr int ioBufferSize = 32 * 1024;
 constexpr std::int64_t probeBytes = 1 << 20;
@@ -15,6 +20,9 @@ constexpr std::int64_t farthestFrame = std::int64_t{1}
                                        << 52; // so that sums of what a file claims cannot overflow
 constexpr int mostStreams = 32;
 constexpr int mostFruitlessReads = 10'000;
+constexpr auto openingLimit = 5s; // on a slow board the index of a book of twelve hours takes one
+constexpr auto seekingLimit = 5s;
+constexpr auto packetLimit = 2s;
 constexpr int mostChannels = 8;
 constexpr int lowestRate = 1'000;
 constexpr int highestRate = 384'000;
@@ -36,6 +44,14 @@ Error readingError(std::int64_t number) {
                       std::strerror(static_cast<int>(number)));
 }
 
+// The decoders that FFmpeg prefers for layers I and II round to 16 bits.
+const AVCodec* decoderFor(AVCodecID id) {
+    const AVCodec* precise = nullptr;
+    if (id == AV_CODEC_ID_MP1 || id == AV_CODEC_ID_MP2)
+        precise = avcodec_find_decoder_by_name(id == AV_CODEC_ID_MP1 ? "mp1float" : "mp2float");
+    return precise != nullptr ? precise : avcodec_find_decoder(id);
+}
+
 } // namespace
 
 std::string ffmpegErrorText(int number) {
@@ -46,9 +62,14 @@ std::string ffmpegErrorText(int number) {
 
 int Container::readBytes(void* self, std::uint8_t* into, int size) {
     auto& container = *static_cast<Container*>(self);
-    std::int64_t count = container.source_->read(container.offset_, reinterpret_cast<std::byte*>(into),
-                                                 static_cast<std::size_t>(size));
+    if (container.limit_.over()) {
+        container.readError_ = ETIMEDOUT;
+        return AVERROR(EIO);
+    }
+    const std::int64_t count = container.source_->read(container.offset_, reinterpret_cast<std::byte*>(into),
+                                                       static_cast<std::size_t>(size));
     if (count > 0) {
+        container.patch(container.offset_, into, count);
         container.offset_ += count;
         return static_cast<int>(count);
     }
@@ -56,6 +77,14 @@ int Container::readBytes(void* self, std::uint8_t* into, int size) {
         return AVERROR_EOF;
     container.readError_ = -count;
     return AVERROR(EIO);
+}
+
+void Container::patch(std::int64_t offset, std::uint8_t* bytes, std::int64_t count) const {
+    for (const Patch& patch : patches_)
+        for (std::size_t i = 0; i < patch.bytes.size(); ++i)
+            if (const std::int64_t at = patch.offset + static_cast<std::int64_t>(i) - offset;
+                at >= 0 && at < count)
+                bytes[at] = static_cast<std::uint8_t>(patch.bytes[i]);
 }
 
 std::int64_t Container::seekBytes(void* self, std::int64_t offset, int whence) {
@@ -90,7 +119,7 @@ Error Container::openingError(int number) const {
 }
 
 // A hostile file must not make us open another, or take all the time and memory there is.
-void Container::prepare(AVFormatContext& context) {
+void Container::prepare(AVFormatContext& context, const AVInputFormat* format) {
     io_.reset(avio_alloc_context(static_cast<unsigned char*>(av_malloc(ioBufferSize)), ioBufferSize, 0, this,
                                  readBytes, nullptr, seekBytes));
     context.pb = io_.get();
@@ -103,28 +132,39 @@ void Container::prepare(AVFormatContext& context) {
     context.protocol_whitelist = av_strdup("");
     context.format_whitelist = av_strdup(formats);
     context.codec_whitelist = av_strdup(codecs);
+    const bool wav = format != nullptr && av_match_name(format->name, "wav,w64") != 0;
+    if (wav && !mayBeCodedAudio(*source_))
+        context.max_probe_packets = 1;
 }
 
-std::optional<Error> Container::open(ByteSource& source, EditLists editLists) {
+std::optional<Error> Container::openHeader(ByteSource& source, std::int64_t largestPicture) {
     source_ = &source;
+    limit_.start(openingLimit);
+    patches_ = hidePictures(source, largestPicture);
     packet_.reset(av_packet_alloc());
     AVFormatContext* context = avformat_alloc_context();
-    prepare(*context);
+    const AVInputFormat* const format = knownFormat(source);
+    prepare(*context, format);
 
     AVDictionary* options = nullptr;
     av_dict_set(&options, "ignore_chapters", "1", 0); // spares a walk through the text track of an audio book
-    if (editLists == EditLists::ignored)
-        av_dict_set(&options, "advanced_editlist", "0", 0);
-    int result = avformat_open_input(&context, "", nullptr, &options);
+    const int result = avformat_open_input(&context, "", format, &options);
     av_dict_free(&options);
     if (result < 0) // has freed the context
         return openingError(result);
     context_.reset(context);
+    return std::nullopt;
+}
 
-    if (result = avformat_find_stream_info(context, nullptr); result < 0)
+std::optional<Error> Container::open(ByteSource& source) {
+    if (auto error = openHeader(source, 0))
+        return error;
+    if (const int result = avformat_find_stream_info(context_.get(), nullptr); result < 0)
         return openingError(result);
     return chooseStream();
 }
+
+bool Container::isNamed(const char* name) const { return av_match_name(name, context_->iformat->name) != 0; }
 
 std::optional<Error> Container::chooseStream() {
     const int index = av_find_best_stream(context_.get(), AVMEDIA_TYPE_AUDIO, -1, -1, nullptr, 0);
@@ -143,6 +183,7 @@ std::optional<Error> Container::chooseStream() {
 }
 
 AVPacket* Container::next() {
+    limit_.start(packetLimit);
     for (int attempt = 0; attempt < mostFruitlessReads; ++attempt) {
         av_packet_unref(packet_.get());
         const int result = av_read_frame(context_.get(), packet_.get());
@@ -154,7 +195,7 @@ AVPacket* Container::next() {
             continue;
         if (result < 0)
             return nullptr;
-        if (packet_->stream_index == stream_->index)
+        if (packet_->stream_index == stream_->index && packet_->size > 0) // an empty one would end the codec
             return packet_.get();
     }
     failure_ = mediaError(MediaErrorCode::damaged, "The file has lost its audio.");
@@ -162,23 +203,39 @@ AVPacket* Container::next() {
 }
 
 bool Container::seek(std::int64_t time) {
+    limit_.start(seekingLimit);
     return av_seek_frame(context_.get(), stream_->index, time, AVSEEK_FLAG_BACKWARD) >= 0;
 }
 
+bool Container::seekToByte(std::int64_t offset) {
+    limit_.start(seekingLimit);
+    return av_seek_frame(context_.get(), stream_->index, offset, AVSEEK_FLAG_BYTE) >= 0;
+}
+
 FfmpegPointer<AVCodecContext> Container::openCodec() {
-    const AVCodec* codec = avcodec_find_decoder(stream_->codecpar->codec_id);
+    const AVCodec* codec = decoderFor(stream_->codecpar->codec_id);
     if (codec == nullptr)
         return nullptr;
     FfmpegPointer<AVCodecContext> context(avcodec_alloc_context3(codec));
     if (avcodec_parameters_to_context(context.get(), stream_->codecpar) < 0)
         return nullptr;
-    context->pkt_timebase = stream_->time_base;
+    context->pkt_timebase = {1, stream_->codecpar->sample_rate}; // packets are stamped anew, in frames
     context->thread_count = 1;
     context->flags2 |= AV_CODEC_FLAG2_SKIP_MANUAL; // what encoders added is cut by our own count
     context->codec_whitelist = av_strdup(codecs);
     if (avcodec_open2(context.get(), codec, nullptr) < 0)
         return nullptr;
     return context;
+}
+
+AVSampleFormat Container::sampleFormat() {
+    const AVCodecParameters& parameters = *stream_->codecpar;
+    const auto found = static_cast<AVSampleFormat>(parameters.format);
+    if (found != AV_SAMPLE_FMT_NONE && parameters.codec_id != AV_CODEC_ID_MP1 &&
+        parameters.codec_id != AV_CODEC_ID_MP2)
+        return found;
+    const auto codec = openCodec();
+    return codec ? codec->sample_fmt : AV_SAMPLE_FMT_NONE;
 }
 
 std::int64_t Container::toFrames(std::int64_t time) const {

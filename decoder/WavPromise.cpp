@@ -1,43 +1,42 @@
 #include "decoder/WavPromise.h"
 
-#include <array>
-#include <cstring>
+#include "decoder/Bytes.h"
 
 namespace tarn {
 
 namespace {
 
-constexpr std::int64_t chunkHeader = 8;
-constexpr std::int64_t firstChunk = 12;
+constexpr std::size_t chunkHeader = 8;
+constexpr std::size_t firstChunk = 12;
 constexpr int mostChunks = 1'000;
 constexpr std::uint32_t unknownLength = 0x7FFF0000; // and all above: what writers to pipes put there
 
-bool readExactly(ByteSource& source, std::int64_t offset, char* into, std::size_t size) {
-    return source.read(offset, reinterpret_cast<std::byte*>(into), size) == static_cast<std::int64_t>(size);
-}
-
 } // namespace
 
-std::optional<std::int64_t> brokenWavPromise(ByteSource& source) {
-    std::array<char, firstChunk> riff{};
-    if (!readExactly(source, 0, riff.data(), riff.size()) || std::memcmp(riff.data(), "RIFF", 4) != 0 ||
-        std::memcmp(riff.data() + 8, "WAVE", 4) != 0)
+std::optional<WavData> findWavData(ByteSource& source) {
+    const std::string riff = readPiece(source, 0, firstChunk);
+    if (riff.size() < firstChunk || (!riff.starts_with("RIFF") && !riff.starts_with("RF64")) ||
+        !riff.ends_with("WAVE"))
         return std::nullopt;
-    std::int64_t at = firstChunk;
+    auto at = static_cast<std::int64_t>(firstChunk);
     for (int i = 0; i < mostChunks; ++i) {
-        std::array<char, chunkHeader> chunk{};
-        if (!readExactly(source, at, chunk.data(), chunk.size()))
+        const std::string chunk = readPiece(source, at, chunkHeader);
+        if (chunk.size() < chunkHeader)
             return std::nullopt;
-        std::uint32_t size = 0;
-        std::memcpy(&size, chunk.data() + 4,
-                    sizeof size); // little-endian, like every machine that this runs on
-        at += chunkHeader;
-        if (std::memcmp(chunk.data(), "data", 4) == 0)
-            return size < unknownLength && at + size > source.size() ? std::optional<std::int64_t>(size)
-                                                                     : std::nullopt;
-        at += size + (size & 1);
+        const auto size = static_cast<std::uint32_t>(littleEndian(std::string_view(chunk).substr(4)));
+        at += static_cast<std::int64_t>(chunkHeader);
+        if (chunk.starts_with("data"))
+            return WavData{at, size};
+        at += std::int64_t{size} + (size & 1);
     }
     return std::nullopt;
+}
+
+std::optional<std::int64_t> brokenWavPromise(ByteSource& source) {
+    const auto data = findWavData(source);
+    if (!data || data->size >= unknownLength || data->offset + std::int64_t{data->size} <= source.size())
+        return std::nullopt;
+    return data->size;
 }
 
 } // namespace tarn

@@ -1,0 +1,21 @@
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <string>
+#include <string_view>
+
+#include "decoder/ByteSource.h"
+
+namespace tarn {
+
+/// `size` bytes of a file from `offset` on; fewer where it ends or cannot be read.
+std::string readPiece(ByteSource& source, std::int64_t offset, std::size_t size);
+
+/// The number whose digits are the (at most eight) bytes of `digits`, the most significant first.
+std::uint64_t bigEndian(std::string_view digits);
+
+/// The same with the least significant first.
+std::uint64_t littleEndian(std::string_view digits);
+
+} // namespace tarn
