@@ -2,11 +2,11 @@
 
 #include <algorithm>
 #include <cstdlib>
-#include <cstring>
 
 #include "decoder/Container.h"
 #include "decoder/Gapless.h"
-#include "decoder/PacketTimeline.h"
+#include "decoder/LengthFinder.h"
+#include "decoder/Mp4Atoms.h"
 #include "decoder/Samples.h"
 #include "decoder/Tags.h"
 #include "decoder/WavPromise.h"
@@ -15,106 +15,18 @@ namespace tarn {
 
 namespace {
 
-constexpr std::int64_t tailSeconds = 5;
 constexpr std::int64_t longestSeconds = 365L * 24 * 3600; // whatever claims more does not know
 constexpr std::int64_t editListToleranceMilliseconds = 2;
 
-bool isMatroska(const AVFormatContext& context) {
-    return std::strstr(context.iformat->name, "matroska") != nullptr;
-}
-
-bool isMpeg4(const AVFormatContext& context) { return std::strstr(context.iformat->name, "mp4") != nullptr; }
-
-bool isOgg(const AVFormatContext& context) { return std::strcmp(context.iformat->name, "ogg") == 0; }
-
-/// Finds where the audible part of a container begins and ends, in frames of the decoder's raw output.
-class LengthFinder {
-public:
-    explicit LengthFinder(Container& container) : container_(container) {}
-
-    /// False when the file holds no packet of audio.
-    bool readFirstPacket() {
-        AVPacket* packet = container_.next();
-        if (packet == nullptr)
-            return false;
-        timeline_ = PacketTimeline(container_, *packet);
-        position_ = packet->pos;
-        end_ = timeline_.first();
-        note(*packet);
-        return true;
-    }
-
-    std::int64_t firstPacketPosition() const { return position_; }
-
-    /// By the container's own account.
-    std::int64_t origin() const {
-        const std::int64_t origin = timeline_.first() + timeline_.skipped();
-        return timeline_.first() > 0 ? origin : std::max<std::int64_t>(0, origin);
-    }
-
-    std::optional<std::int64_t> end() {
-        const AVFormatContext& context = container_.context();
-        const AVStream& stream = container_.stream();
-        if (isMatroska(context))
-            return endOfTail();
-        if (context.duration_estimation_method == AVFMT_DURATION_FROM_BITRATE ||
-            stream.duration == AV_NOPTS_VALUE)
-            return endOfPackets();
-        const std::int64_t duration = container_.toFrames(stream.duration);
-        if (stream.codecpar->codec_id == AV_CODEC_ID_MP3) // counted from the first packet on
-            return duration;
-        const std::int64_t start =
-            stream.start_time == AV_NOPTS_VALUE ? 0 : container_.toFrames(stream.start_time);
-        if (stream.codecpar->codec_id == AV_CODEC_ID_OPUS && isOgg(context)) // counts what is skipped
-            return start + duration - timeline_.skipped();
-        return start + duration;
-    }
-
-private:
-    void note(const AVPacket& packet) {
-        if (packet.pts != AV_NOPTS_VALUE)
-            end_ = timeline_.frameAt(packet.pts);
-        const int constant = container_.stream().codecpar->frame_size;
-        end_ += constant > 0 ? constant : container_.toFrames(packet.duration);
-        discarded_ = trimOf(packet).end;
-    }
-
-    std::optional<std::int64_t> endOfPackets() {
-        while (const AVPacket* packet = container_.next())
-            note(*packet);
-        if (container_.failure())
-            return std::nullopt;
-        return end_ - discarded_;
-    }
-
-    // Only the last packets tell, to the frame, where it ends.
-    std::optional<std::int64_t> endOfTail() {
-        const std::int64_t duration = container_.context().duration;
-        constexpr std::int64_t tail = tailSeconds * AV_TIME_BASE;
-        if (duration > tail)
-            container_.seek(
-                av_rescale_q(duration - tail, AVRational{1, AV_TIME_BASE}, container_.stream().time_base));
-        return endOfPackets();
-    }
-
-    Container& container_;
-    PacketTimeline timeline_;
-    std::int64_t position_ = -1;
-    std::int64_t end_ = 0;
-    std::int64_t discarded_ = 0;
-};
-
 // An edit list tells the end in coarse units. Where it means the end of the media, that one is exact.
-std::int64_t unroundedEnd(std::int64_t end, ByteSource& source) {
-    Container whole;
-    if (whole.open(source, Container::EditLists::ignored))
+std::int64_t unroundedEnd(std::int64_t end, const Container& container, std::int64_t first,
+                          ByteSource& source) {
+    const auto duration = mp4MediaDuration(source, container.stream().id);
+    if (!duration || *duration == 0)
         return end;
-    const AVStream& stream = whole.stream();
-    const AVPacket* first = whole.next();
-    if (first == nullptr || first->pts == AV_NOPTS_VALUE || stream.duration == AV_NOPTS_VALUE)
-        return end;
-    const std::int64_t mediaEnd = whole.toFrames(first->pts) + whole.toFrames(stream.duration);
-    const std::int64_t tolerance = stream.codecpar->sample_rate * editListToleranceMilliseconds / 1000;
+    const std::int64_t mediaEnd = first + container.toFrames(*duration);
+    const std::int64_t tolerance =
+        container.stream().codecpar->sample_rate * editListToleranceMilliseconds / 1000;
     return std::abs(mediaEnd - end) <= tolerance ? mediaEnd : end;
 }
 
@@ -123,7 +35,7 @@ std::optional<std::int64_t> promisedWavFrames(const Container& container, ByteSo
     const AVCodecParameters& parameters = *container.stream().codecpar;
     const std::int64_t frameSize = parameters.block_align;
     const bool pcm = av_get_exact_bits_per_sample(parameters.codec_id) > 0;
-    if (std::strcmp(container.context().iformat->name, "wav") != 0 || !pcm || frameSize <= 0)
+    if (!container.isNamed("wav") || !pcm || frameSize <= 0)
         return std::nullopt;
     const auto bytes = brokenWavPromise(source);
     return bytes ? std::optional(*bytes / frameSize) : std::nullopt;
@@ -136,15 +48,15 @@ DecoderModule::Examined examineFile(ByteSource& source) {
     if (auto error = container.open(source))
         return {std::nullopt, *std::move(error)};
 
-    LengthFinder length(container);
-    if (!container.openCodec() || !length.readFirstPacket())
+    LengthFinder length(container, source);
+    const AVSampleFormat samples = container.sampleFormat();
+    if (samples == AV_SAMPLE_FMT_NONE || !length.readFirstPacket())
         return {std::nullopt, container.failure().value_or(mediaError(
                                   MediaErrorCode::notAudio, "The file holds no audio that can be played."))};
 
     const AVCodecParameters& parameters = *container.stream().codecpar;
     AudioFileInfo info;
-    info.format = {decodedSampleFormat(static_cast<AVSampleFormat>(parameters.format)),
-                   static_cast<std::uint32_t>(parameters.sample_rate),
+    info.format = {decodedSampleFormat(samples), static_cast<std::uint32_t>(parameters.sample_rate),
                    static_cast<std::uint32_t>(parameters.ch_layout.nb_channels)};
     info.title = readTag(container.context(), container.stream(), "title");
     info.album = readTag(container.context(), container.stream(), "album");
@@ -158,8 +70,8 @@ DecoderModule::Examined examineFile(ByteSource& source) {
         end = length.end();
     if (container.failure())
         return {std::nullopt, *container.failure()};
-    if (end && !tag && isMpeg4(container.context()))
-        end = unroundedEnd(*end, source);
+    if (end && !tag && container.isNamed("mp4"))
+        end = unroundedEnd(*end, container, length.timeline().first(), source);
     if (tag && tag->recording)
         end = end ? std::min(*end, info.firstFrame + *tag->recording) : info.firstFrame + *tag->recording;
     else if (tag && mp3 && end)

@@ -9,10 +9,13 @@ namespace tarn {
 
 namespace {
 
+using namespace std::chrono_literals;
+
 constexpr int mostBadPackets = 64;
 constexpr int mostRetries = 3;
 constexpr int toleratedShortfallParts = 10; // a tenth of a second
 constexpr std::int64_t longestHoleSeconds = 10;
+constexpr auto longestRead = 250ms; // of processor time
 
 // How far before its target a decoder must begin so that nothing of its start is left in what is heard.
 std::int64_t prerollOf(const AVCodecParameters& parameters) {
@@ -46,6 +49,7 @@ std::optional<Error> FileDecoder::open() {
         return container_.failure().value_or(
             mediaError(MediaErrorCode::notAudio, "The file holds no audio that can be played."));
     timeline_ = PacketTimeline(container_, *first);
+    seeker_.emplace(container_, timeline_, source_, *first);
     frame_.reset(av_frame_alloc());
     end_ = info_.frames ? info_.firstFrame + *info_.frames : std::numeric_limits<std::int64_t>::max();
     seek(0);
@@ -60,7 +64,7 @@ void FileDecoder::seek(std::int64_t frame) {
 }
 
 void FileDecoder::moveTo(std::int64_t frame) {
-    container_.seek(container_.fromFrames(std::max(frame, timeline_.first())));
+    seeker_->begin(std::max(frame, timeline_.first()));
     avcodec_flush_buffers(codec_.get());
     av_frame_unref(frame_.get());
     placed_ = false;
@@ -74,23 +78,30 @@ FileDecoder::Step FileDecoder::fail(Error error) {
     return Step::failed;
 }
 
+FileDecoder::Step FileDecoder::failDamaged(int result) {
+    return fail(mediaError(MediaErrorCode::damaged, "The file is damaged and cannot be played any further.",
+                           ffmpegErrorText(result)));
+}
+
 // Gives the codec one more packet, or tells it that there is none.
 FileDecoder::Step FileDecoder::feed() {
     AVPacket* packet = container_.next();
     if (packet == nullptr && container_.failure())
         return fail(*container_.failure());
     draining_ = packet == nullptr;
+    if (packet != nullptr)
+        packet->pts = packet->dts = timeline_.begin(*packet).value_or(AV_NOPTS_VALUE);
     const int result = avcodec_send_packet(codec_.get(), packet);
     if (result == AVERROR(ENOMEM) || (result < 0 && ++badPackets_ > mostBadPackets))
-        return fail(mediaError(MediaErrorCode::damaged,
-                               "The file is damaged and cannot be played any further.",
-                               ffmpegErrorText(result)));
+        return failDamaged(result);
     return Step::frame;
 }
 
 // Makes frame_ the next decoded frame, wherever it lies.
-FileDecoder::Step FileDecoder::decode() {
+FileDecoder::Step FileDecoder::decode(const WorkLimit& limit) {
     for (;;) {
+        if (limit.over() || !seeker_->proceed())
+            return Step::unfinished;
         const int result = avcodec_receive_frame(codec_.get(), frame_.get());
         if (result == 0) {
             if (!decodedFormatHolds())
@@ -102,9 +113,7 @@ FileDecoder::Step FileDecoder::decode() {
         if (result == AVERROR_EOF)
             return Step::ended;
         if (result != AVERROR(EAGAIN) && ++badPackets_ > mostBadPackets)
-            return fail(mediaError(MediaErrorCode::damaged,
-                                   "The file is damaged and cannot be played any further.",
-                                   ffmpegErrorText(result)));
+            return failDamaged(result);
         if (draining_)
             return Step::ended;
         if (feed() == Step::failed)
@@ -123,7 +132,7 @@ bool FileDecoder::placeDecodedFrame() {
     const bool stamped = frame_->pts != AV_NOPTS_VALUE;
     if (!stamped && !placed_)
         return false;
-    const std::int64_t stamp = stamped ? timeline_.frameAt(frame_->pts) : decodedEnd_;
+    const std::int64_t stamp = stamped ? frame_->pts : decodedEnd_;
     const bool afterHole = badPackets_ > 0 && stamp > decodedEnd_ &&
                            stamp - decodedEnd_ < longestHoleSeconds * info_.format.rate;
     frameStart_ = placed_ && !afterHole ? decodedEnd_ : stamp;
@@ -146,36 +155,41 @@ bool FileDecoder::placeDecodedFrame() {
 
 // Appends what lies at position_ already: of a hole, or of frame_.
 std::size_t FileDecoder::take(PcmBuffer& buffer, std::size_t frames) {
+    // Compared in 64 bits: where size_t has 32, more may be left of a file than that holds.
+    const auto most = std::min(static_cast<std::int64_t>(frames), end_ - position_);
     if (silence_ > 0) {
-        const std::size_t count = std::min(frames, static_cast<std::size_t>(silence_));
-        buffer.bytes.resize(buffer.bytes.size() + count * info_.format.bytesPerFrame());
-        silence_ -= static_cast<std::int64_t>(count);
-        position_ = silence_ == 0 ? frameStart_ : position_ + static_cast<std::int64_t>(count);
-        buffer.frames += count;
-        return count;
+        const std::int64_t count = std::min(most, silence_);
+        buffer.bytes.resize(buffer.bytes.size() +
+                            static_cast<std::size_t>(count) * info_.format.bytesPerFrame());
+        silence_ -= count;
+        position_ = silence_ == 0 ? frameStart_ : position_ + count;
+        buffer.frames += static_cast<std::size_t>(count);
+        return static_cast<std::size_t>(count);
     }
     if (!placed_ || decodedEnd_ <= position_)
         return 0;
-    const std::size_t count = std::min(frames, static_cast<std::size_t>(decodedEnd_ - position_));
+    const std::int64_t count = std::min(most, decodedEnd_ - position_);
     appendInterleaved(*frame_, static_cast<int>(position_ - frameStart_), static_cast<int>(count),
                       info_.format, buffer);
-    position_ += static_cast<std::int64_t>(count);
-    return count;
+    position_ += count;
+    return static_cast<std::size_t>(count);
 }
 
 Decoder::State FileDecoder::read(PcmBuffer& buffer, std::size_t maxFrames) {
+    const WorkLimit worktime(longestRead);
     const std::size_t limit = buffer.frames + maxFrames;
     while (buffer.frames < limit && position_ < end_) {
-        const auto left = static_cast<std::size_t>(end_ - position_);
-        if (take(buffer, std::min(limit - buffer.frames, left)) > 0)
+        if (take(buffer, limit - buffer.frames) > 0)
             continue;
-        switch (decode()) {
+        switch (decode(worktime)) {
         case Step::frame:
             break;
         case Step::ended:
             return finish();
         case Step::failed:
             return State::failed;
+        case Step::unfinished:
+            return State::more;
         }
     }
     return position_ < end_ ? State::more : State::ended;

@@ -3,12 +3,14 @@
 #include "decoder/Decoder.h"
 
 #include "decoder/Container.h"
+#include "decoder/PacketSeeker.h"
 #include "decoder/PacketTimeline.h"
 
 namespace tarn {
 
 /// Decodes one file; exact to the frame after every seek, because it goes to a packet well before the target
-/// and drops what it decodes until it is there.
+/// and drops what it decodes until it is there. A read() that takes long returns without frames, and the
+/// next one goes on.
 class FileDecoder final : public Decoder {
 public:
     FileDecoder(ByteSource& source, const AudioFileInfo& info);
@@ -21,11 +23,12 @@ public:
     const Error& error() const override { return error_; }
 
 private:
-    enum class Step { frame, ended, failed };
+    enum class Step { frame, ended, failed, unfinished };
 
     void moveTo(std::int64_t frame);
-    Step decode();
+    Step decode(const WorkLimit& limit);
     Step feed();
+    Step failDamaged(int result);
     bool decodedFormatHolds() const;
     bool placeDecodedFrame();
     std::size_t take(PcmBuffer& buffer, std::size_t frames);
@@ -36,6 +39,7 @@ private:
     const AudioFileInfo info_;
     Container container_;
     PacketTimeline timeline_;
+    std::optional<PacketSeeker> seeker_;
     FfmpegPointer<AVCodecContext> codec_;
     FfmpegPointer<AVFrame> frame_;
 

@@ -34,8 +34,8 @@ const FileFormat formats[] = {
     {"a.ogg", "-c:a libvorbis -q:a 6", 44100, false, true, 0},
     {"a.opus", "-c:a libopus -b:a 160k", 48000, false, true, 0},
     {"opus.webm", "-c:a libopus -b:a 160k", 48000, false, true, 0},
-    {"vorbis.mka", "-c:a libvorbis -q:a 6", 44100, false, false, 45},
-    {"flac.mka", "-c:a flac", 44100, true, false, 45},
+    {"vorbis.mka", "-c:a libvorbis -q:a 6", 44100, false, false, 0},
+    {"flac.mka", "-c:a flac", 44100, true, true, 0},
 };
 
 struct DecoderTest : testing::TestWithParam<FileFormat> {
