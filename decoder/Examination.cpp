@@ -41,18 +41,46 @@ std::optional<std::int64_t> promisedWavFrames(const Container& container, ByteSo
     return bytes ? std::optional(*bytes / frameSize) : std::nullopt;
 }
 
+Error noAudio(const Container& container) {
+    return container.failure().value_or(
+        mediaError(MediaErrorCode::notAudio, "The file holds no audio that can be played."));
+}
+
+std::optional<std::int64_t> saneLength(std::optional<std::int64_t> end, const AudioFileInfo& info) {
+    if (!end || *end <= info.firstFrame || *end - info.firstFrame > longestSeconds * info.format.rate)
+        return std::nullopt;
+    return *end - info.firstFrame;
+}
+
+// Where the audible part begins, and how long it is.
+void findExtent(Container& container, ByteSource& source, LengthFinder& length, AudioFileInfo& info) {
+    const AVCodecID codec = container.stream().codecpar->codec_id;
+    const auto tag = readGaplessTag(container, source, length.firstPacketPosition());
+    info.firstFrame = tag && codec == AV_CODEC_ID_MP3 ? tag->delay + mp3DecoderDelay : length.origin();
+    std::optional<std::int64_t> end = promisedWavFrames(container, source);
+    if (!end)
+        end = length.end();
+    if (end && tag)
+        end = endOfRecording(*end, info.firstFrame, *tag, codec);
+    else if (tag && tag->recording)
+        end = info.firstFrame + *tag->recording;
+    else if (end && container.isNamed("mp4"))
+        end = unroundedEnd(*end, container, length.timeline().first(), source);
+    info.frames = saneLength(end, info);
+    if (!info.frames)
+        info.estimatedFrames = saneLength(length.estimate(), info);
+}
+
 } // namespace
 
 DecoderModule::Examined examineFile(ByteSource& source) {
     Container container;
     if (auto error = container.open(source))
         return {std::nullopt, *std::move(error)};
-
     LengthFinder length(container, source);
     const AVSampleFormat samples = container.sampleFormat();
     if (samples == AV_SAMPLE_FMT_NONE || !length.readFirstPacket())
-        return {std::nullopt, container.failure().value_or(mediaError(
-                                  MediaErrorCode::notAudio, "The file holds no audio that can be played."))};
+        return {std::nullopt, noAudio(container)};
 
     const AVCodecParameters& parameters = *container.stream().codecpar;
     AudioFileInfo info;
@@ -61,24 +89,9 @@ DecoderModule::Examined examineFile(ByteSource& source) {
     info.title = readTag(container.context(), container.stream(), "title");
     info.album = readTag(container.context(), container.stream(), "album");
     info.artist = readTag(container.context(), container.stream(), "artist");
-
-    const auto tag = readGaplessTag(container, source, length.firstPacketPosition());
-    const bool mp3 = parameters.codec_id == AV_CODEC_ID_MP3;
-    info.firstFrame = tag && mp3 ? tag->delay + mp3DecoderDelay : length.origin();
-    std::optional<std::int64_t> end = promisedWavFrames(container, source);
-    if (!end)
-        end = length.end();
+    findExtent(container, source, length, info);
     if (container.failure())
         return {std::nullopt, *container.failure()};
-    if (end && !tag && container.isNamed("mp4"))
-        end = unroundedEnd(*end, container, length.timeline().first(), source);
-    if (tag && tag->recording)
-        end = end ? std::min(*end, info.firstFrame + *tag->recording) : info.firstFrame + *tag->recording;
-    else if (tag && mp3 && end)
-        end = *end - std::max<std::int64_t>(0, tag->padding - mp3DecoderDelay);
-    const std::int64_t most = longestSeconds * parameters.sample_rate;
-    if (end && *end > info.firstFrame && *end - info.firstFrame <= most)
-        info.frames = *end - info.firstFrame;
     return {std::move(info), {}};
 }
 

@@ -76,6 +76,14 @@ std::optional<GaplessTag> readLameTag(ByteSource& source, std::int64_t firstPack
     return GaplessTag{field >> 12, field & 0xFFF, std::nullopt};
 }
 
+std::int64_t endOfRecording(std::int64_t end, std::int64_t first, const GaplessTag& tag, AVCodecID codec) {
+    if (tag.recording)
+        return std::min(end, first + *tag.recording);
+    if (codec == AV_CODEC_ID_MP3)
+        return end - std::max<std::int64_t>(0, tag.padding - mp3DecoderDelay);
+    return end;
+}
+
 std::optional<GaplessTag> readGaplessTag(const Container& container, ByteSource& source,
                                          std::int64_t firstPacket) {
     for (const AVDictionary* dictionary : {container.context().metadata, container.stream().metadata})

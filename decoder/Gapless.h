@@ -27,6 +27,10 @@ std::optional<GaplessTag> readLameTag(ByteSource& source, std::int64_t firstPack
 std::optional<GaplessTag> readGaplessTag(const Container& container, ByteSource& source,
                                          std::int64_t firstPacket);
 
+/// Where the recording ends, in a file whose last frame ends at `end` and whose audible part begins at
+/// `first`.
+std::int64_t endOfRecording(std::int64_t end, std::int64_t first, const GaplessTag& tag, AVCodecID codec);
+
 /// An MP3 decoder puts out this many frames before the first one that was encoded.
 inline constexpr std::int64_t mp3DecoderDelay = 529;
 

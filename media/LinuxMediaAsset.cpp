@@ -16,9 +16,10 @@ LinuxMediaAsset::LinuxMediaAsset(std::string URL, SharedFile file, AudioFileInfo
 }
 
 MediaTime LinuxMediaAsset::duration() const {
-    if (!info_.frames)
+    const auto frames = info_.frames ? info_.frames : info_.estimatedFrames;
+    if (!frames)
         return {};
-    return {*info_.frames, static_cast<std::int32_t>(info_.format.rate)};
+    return {*frames, static_cast<std::int32_t>(info_.format.rate)};
 }
 
 } // namespace tarn

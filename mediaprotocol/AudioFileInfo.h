@@ -19,6 +19,10 @@ struct AudioFileInfo {
     std::int64_t firstFrame = 0;
     std::optional<std::int64_t> frames;
 
+    /// Without `frames`: about how many there are, to be shown and for nothing else. To know it exactly all
+    /// of the file has to be read (LengthMeasurement).
+    std::optional<std::int64_t> estimatedFrames;
+
     // Valid UTF-8 without control characters, cut to a sane length.
     std::optional<std::string> title;
     std::optional<std::string> album;

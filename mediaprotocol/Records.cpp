@@ -39,18 +39,25 @@ std::optional<PcmFormat> FormatRecord::checked() const {
 }
 
 InfoRecord InfoRecord::of(const AudioFileInfo& info) {
-    return {FormatRecord::of(info.format), info.frames ? 1U : 0U, info.firstFrame, info.frames.value_or(0)};
+    InfoRecord record{FormatRecord::of(info.format), Length::unknown, info.firstFrame, 0};
+    if (info.frames || info.estimatedFrames) {
+        record.length = info.frames ? Length::exact : Length::estimated;
+        record.frames = info.frames ? *info.frames : *info.estimatedFrames;
+    }
+    return record;
 }
 
 std::optional<AudioFileInfo> InfoRecord::checked() const {
     const auto known = format.checked();
-    if (!known || !isFrame(firstFrame) || !isFrame(frames) || frames < 0 || hasFrames > 1)
+    if (!known || !isFrame(firstFrame) || !isFrame(frames) || frames < 0 || length > Length::estimated)
         return std::nullopt;
     AudioFileInfo info;
     info.format = *known;
     info.firstFrame = firstFrame;
-    if (hasFrames == 1)
+    if (length == Length::exact)
         info.frames = frames;
+    else if (length == Length::estimated)
+        info.estimatedFrames = frames;
     return info;
 }
 

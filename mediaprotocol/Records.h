@@ -24,8 +24,10 @@ struct FormatRecord {
 
 /// What an AudioFileInfo says besides its texts.
 struct InfoRecord {
+    enum class Length : std::uint32_t { unknown, exact, estimated };
+
     FormatRecord format;
-    std::uint32_t hasFrames = 0;
+    Length length = Length::unknown; ///< what `frames` is
     std::int64_t firstFrame = 0;
     std::int64_t frames = 0;
 

@@ -146,6 +146,7 @@ TEST(Records, AreCheckedBeforeTheyAreBelieved) {
     AudioFileInfo info{.format = {SampleFormat::f32, 48000, 2},
                        .firstFrame = -7,
                        .frames = 99,
+                       .estimatedFrames = {},
                        .title = {},
                        .album = "\xC3\xA9",
                        .artist = ""};
@@ -159,6 +160,7 @@ TEST(Records, AreCheckedBeforeTheyAreBelieved) {
         [](InfoRecord& record) { record.format.channels = 1 << 20; },
         [](InfoRecord& record) { record.format.sample = 9; },
         [](InfoRecord& record) { record.frames = -1; },
+        [](InfoRecord& record) { record.length = static_cast<InfoRecord::Length>(3); },
         [](InfoRecord& record) { record.firstFrame = INT64_MIN; },
     };
     for (const auto& lie : lies) {
