@@ -20,7 +20,9 @@ public:
     PcmBuffer get(std::int64_t index, std::size_t frames) const;
 
 private:
-    std::size_t placeOf(std::int64_t index) const { return static_cast<std::size_t>(index) % capacity_; }
+    std::size_t placeOf(std::int64_t index) const {
+        return static_cast<std::size_t>(index % static_cast<std::int64_t>(capacity_));
+    }
 
     std::size_t frameSize_ = 0;
     std::size_t capacity_ = 0;
