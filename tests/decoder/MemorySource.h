@@ -1,0 +1,35 @@
+#pragma once
+
+#include <algorithm>
+#include <cstring>
+#include <string>
+
+#include "decoder/ByteSource.h"
+
+namespace tarn {
+
+/// A file in memory.
+class MemorySource final : public ByteSource {
+public:
+    explicit MemorySource(std::string bytes) : bytes_(std::move(bytes)) {}
+
+    std::int64_t size() const override { return static_cast<std::int64_t>(bytes_.size()); }
+    std::int64_t read(std::int64_t offset, std::byte* into, std::size_t size) override {
+        if (offset >= this->size())
+            return 0;
+        size = std::min(size, bytes_.size() - static_cast<std::size_t>(offset));
+        std::memcpy(into, bytes_.data() + offset, size);
+        read_ += static_cast<std::int64_t>(size);
+        return static_cast<std::int64_t>(size);
+    }
+    bool expired() const override { return false; }
+
+    /// How many bytes were read so far.
+    std::int64_t bytesRead() const { return read_; }
+
+private:
+    const std::string bytes_;
+    std::int64_t read_ = 0;
+};
+
+} // namespace tarn
