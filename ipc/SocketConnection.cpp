@@ -5,9 +5,9 @@
 #include <algorithm>
 #include <utility>
 
-#include "ipc/CallAnswer.h"
 #include "ipc/TransportMessages.h"
 #include "log/SystemLog.h"
+#include "wire/ProtoWriter.h"
 
 namespace tarn {
 
@@ -16,6 +16,43 @@ namespace {
 constexpr std::size_t longFrame = 65'536; // no client of good will comes near
 
 } // namespace
+
+/// One call on this connection. It is unfinished until it goes, and when it goes without an answer the client
+/// is told so.
+class SocketConnection::Call final : public Reply::Call {
+public:
+    /// `id` 0: the client wants no answer, so none is sent. `bytes` is the length of the call.
+    Call(std::shared_ptr<ConnectionSocket> socket, std::uint64_t id, std::size_t bytes)
+        : socket_(std::move(socket)), id_(id), bytes_(bytes) {
+        socket_->beginCall(bytes_);
+    }
+
+    ~Call() override {
+        if (id_ != 0 && !isAnswered_)
+            socket_->send(FrameKind::released, id_, {});
+        socket_->finishCall(bytes_);
+    }
+
+    void answer(std::optional<Data> data, const std::optional<Error>& error) override {
+        if (id_ == 0 || isAnswered_)
+            return;
+        ProtoWriter reply;
+        writeReply(std::move(data), error, reply);
+        if (reply.bytes().size() > FrameHeader::largestBody) {
+            SystemLog::error(__func__, __LINE__, "%{public}s:%d: dropped an answer of %d bytes: too long",
+                             reply.bytes().size());
+            return;
+        }
+        isAnswered_ = true;
+        socket_->send(FrameKind::reply, id_, reply.bytes());
+    }
+
+private:
+    const std::shared_ptr<ConnectionSocket> socket_;
+    const std::uint64_t id_;
+    const std::size_t bytes_;
+    bool isAnswered_ = false;
+};
 
 SocketConnection::SocketConnection(std::shared_ptr<ConnectionSocket> socket, std::uint64_t key,
                                    TokenTable& tokens)
@@ -97,8 +134,8 @@ void SocketConnection::deliver(std::vector<Frame> frames) {
             beginNews(frame.callId);
             continue;
         }
-        auto callback = std::make_unique<CallAnswer>(socket_, frame.callId, frame.body.size());
-        calls.push_back({std::move(frame.body), std::move(callback)});
+        auto call = std::make_shared<Call>(socket_, frame.callId, frame.body.size());
+        calls.push_back({std::move(frame.body), Reply(std::move(call))});
     }
     if (!calls.empty() && exportedObject_)
         exportedObject_->receiveData(std::move(calls));

@@ -50,6 +50,7 @@ public:
     int socket() const { return socket_->socket(); }
 
 private:
+    class Call;
     enum class Loss { none, interruption, invalidation };
 
     void receiveData(const Data& data) override;

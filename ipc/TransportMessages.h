@@ -17,7 +17,7 @@ struct Extension {
     std::string path;
 };
 
-/// How a callback was called.
+/// How a call was answered.
 struct CallReply {
     std::optional<Data> data;
     std::optional<Error> error;

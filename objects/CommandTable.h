@@ -4,7 +4,7 @@
 #include <tuple>
 #include <utility>
 
-#include "reply/Reply.h"
+#include "roles/Reply.h"
 
 namespace tarn {
 

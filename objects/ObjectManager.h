@@ -6,8 +6,8 @@
 #include <string_view>
 
 #include "reply/EventSink.h"
-#include "reply/Reply.h"
 #include "roles/Platform.h"
+#include "roles/Reply.h"
 #include "threads/LiveObjects.h"
 #include "threads/MutexProtected.h"
 

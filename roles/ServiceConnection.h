@@ -2,31 +2,17 @@
 
 #include <functional>
 #include <memory>
-#include <optional>
 #include <vector>
 
 #include "roles/Data.h"
-#include "roles/Error.h"
+#include "roles/Reply.h"
 
 namespace tarn {
 
-/// The way back to the client for one call. Move-only through unique_ptr; any thread may use or destroy it.
-///
-/// Destroying it uncalled tells the client that no answer will come. A second call is ignored.
-class ClientCallback {
-public:
-    virtual ~ClientCallback() = default;
-    virtual void call(std::optional<Data> data, const std::optional<Error>& error) = 0;
-};
-
-/// One call as it arrived: the bytes of an envelope, and its callback. When the client wants no answer, the
-/// callback is null or drops what it is called with.
-///
-/// A callback is kept until its call is done with: by the callbacks that live the transport knows how much a
-/// client has sent ahead, and when to stop reading.
+/// One call as it arrived: the bytes of an envelope, and the way to answer it.
 struct ReceivedCall {
     Data data;
-    std::unique_ptr<ClientCallback> callback;
+    Reply reply;
 };
 
 /// What the service offers on every connection.
@@ -34,8 +20,7 @@ class VLLongFormAudioServerProtocol {
 public:
     virtual ~VLLongFormAudioServerProtocol() = default;
 
-    /// On the I/O thread. Takes the calls that arrived together, in order; they are queued before anything
-    /// that the thread calls next.
+    /// On the I/O thread. Takes the calls that one read brought, in order; when this returns they are queued.
     virtual void receiveData(std::vector<ReceivedCall> calls) = 0;
 };
 

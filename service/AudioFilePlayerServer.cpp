@@ -18,7 +18,7 @@ VLTorviAudioFilePlayerServer::VLTorviAudioFilePlayerServer(const Platform& platf
 VLTorviAudioFilePlayerServer::~VLTorviAudioFilePlayerServer() = default;
 
 void VLTorviAudioFilePlayerServer::handleMessage(std::shared_ptr<VLProtoAudioFilePlayerMessage> message,
-                                                 std::shared_ptr<Reply> reply) {
+                                                 Reply reply) {
     using Router = VLTorviAudioFilePlayerServer;
     using Message = VLProtoAudioFilePlayerMessage;
     if (message == nullptr)
@@ -38,15 +38,14 @@ void VLTorviAudioFilePlayerServer::handleMessage(std::shared_ptr<VLProtoAudioFil
 template <auto managerCreateIfNeeded, auto part>
 void VLTorviAudioFilePlayerServer::submit(SerialQueue& queue,
                                           std::shared_ptr<VLProtoAudioFilePlayerMessage> message,
-                                          std::shared_ptr<Reply> reply) {
-    queue.async([self = shared_from_this(), message = std::move(message), reply = std::move(reply)] {
-        ((*self).*managerCreateIfNeeded)()->handleMessage(((*message).*part)(),
-                                                          reply ? std::move(*reply) : Reply());
-    });
+                                          Reply reply) {
+    queue.async(
+        [self = shared_from_this(), message = std::move(message), reply = std::move(reply)]() mutable {
+            ((*self).*managerCreateIfNeeded)()->handleMessage(((*message).*part)(), std::move(reply));
+        });
 }
 
 void VLTorviAudioFilePlayerServer::close() {
-    setAppConnction({}); // what the work still makes is no business of the next client
     // Made if need be: work that has not begun would make one that is not closed.
     queuePlayerManagerCreateIfNeeded()->close();
 }

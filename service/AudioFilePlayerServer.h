@@ -3,8 +3,8 @@
 #include <memory>
 
 #include "reply/EventSink.h"
-#include "reply/Reply.h"
 #include "roles/Platform.h"
+#include "roles/Reply.h"
 #include "roles/SerialQueue.h"
 #include "threads/LiveObjects.h"
 #include "threads/MutexProtected.h"
@@ -28,11 +28,11 @@ public:
     ~VLTorviAudioFilePlayerServer();
 
     /// On the command queue. Returns as soon as the work is submitted. A message without a part that can be
-    /// routed, or none at all, is dropped: its reply goes unanswered. Both may be null.
-    void handleMessage(std::shared_ptr<VLProtoAudioFilePlayerMessage> message, std::shared_ptr<Reply> reply);
+    /// routed, or none at all (null), is dropped, and its reply goes unanswered.
+    void handleMessage(std::shared_ptr<VLProtoAudioFilePlayerMessage> message, Reply reply);
 
     /// The client is gone: its queue players go at once, though work that waits may keep the router and its
-    /// other objects for a while, and what that still makes reports to nobody. Once.
+    /// other objects for a while. Once.
     void close();
 
     std::shared_ptr<VLTorviAudioFilePlayerAssetManager> assetManagerCreateIfNeeded();
@@ -69,8 +69,7 @@ private:
     };
 
     template <auto managerCreateIfNeeded, auto part>
-    void submit(SerialQueue& queue, std::shared_ptr<VLProtoAudioFilePlayerMessage> message,
-                std::shared_ptr<Reply> reply);
+    void submit(SerialQueue& queue, std::shared_ptr<VLProtoAudioFilePlayerMessage> message, Reply reply);
 
     template <class Manager>
     std::shared_ptr<Manager> createIfNeeded(std::shared_ptr<Manager> Managers::*slot);

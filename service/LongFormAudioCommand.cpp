@@ -8,9 +8,4 @@ void VLLongFormAudioCommand::runOnAudioPlayer(VLTorviAudioFilePlayerServer& audi
     audioPlayer.handleMessage(message_, completion_);
 }
 
-void VLLongFormAudioCommand::cancelWithError(const Error& error) const {
-    if (completion_ != nullptr)
-        completion_->error(error);
-}
-
 } // namespace tarn

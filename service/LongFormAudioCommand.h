@@ -3,38 +3,36 @@
 #include <memory>
 #include <utility>
 
-#include "reply/Reply.h"
 #include "roles/Error.h"
+#include "roles/Reply.h"
 
 namespace tarn {
 
 class VLProtoAudioFilePlayerMessage;
 class VLTorviAudioFilePlayerServer;
 
-/// One message of the client on its way to the router, with the reply that answers it. Made on the main
-/// queue, run once on the command queue.
+/// One message of the client on its way to the router, with the reply that answers it. It is made on the main
+/// queue and runs once, on the command queue.
 class VLLongFormAudioCommand {
 public:
-    /// Both may be null.
-    VLLongFormAudioCommand(std::shared_ptr<VLProtoAudioFilePlayerMessage> message,
-                           std::shared_ptr<Reply> completion)
+    /// `message` may be null, and `completion` empty.
+    VLLongFormAudioCommand(std::shared_ptr<VLProtoAudioFilePlayerMessage> message, Reply completion)
         : message_(std::move(message)), completion_(std::move(completion)) {}
 
     const std::shared_ptr<VLProtoAudioFilePlayerMessage>& message() const { return message_; }
     void setMessage(std::shared_ptr<VLProtoAudioFilePlayerMessage> message) { message_ = std::move(message); }
 
-    /// Shared with the work that the router submits.
-    const std::shared_ptr<Reply>& completion() const { return completion_; }
-    void setCompletion(std::shared_ptr<Reply> completion) { completion_ = std::move(completion); }
+    const Reply& completion() const { return completion_; }
+    void setCompletion(Reply completion) { completion_ = std::move(completion); }
 
+    /// The command keeps its own copy of the reply, for the case that this fails.
     void runOnAudioPlayer(VLTorviAudioFilePlayerServer& audioPlayer) const;
 
-    /// Answers with the error, unless there is no completion.
-    void cancelWithError(const Error& error) const;
+    void cancelWithError(const Error& error) { completion_.error(error); }
 
 private:
     std::shared_ptr<VLProtoAudioFilePlayerMessage> message_;
-    std::shared_ptr<Reply> completion_;
+    Reply completion_;
 };
 
 } // namespace tarn

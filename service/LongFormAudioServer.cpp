@@ -12,7 +12,6 @@
 #include "roles/Localization.h"
 #include "roles/NowPlayingService.h"
 #include "service/AudioFilePlayerServer.h"
-#include "wire/BlockCache.h"
 
 namespace tarn {
 
@@ -29,6 +28,26 @@ std::shared_ptr<VLProtoVelmoMessage> envelopeFromData(const Data& data) {
 }
 
 } // namespace
+
+/// The sink of one router's objects. They hold it, and may report after the router has gone: that reaches
+/// their own client or nobody.
+class VLLongFormAudioServer::ClientEvents final : public EventSink {
+public:
+    ClientEvents(std::weak_ptr<const VLLongFormAudioServer> service,
+                 std::weak_ptr<ServiceConnection> connection)
+        : service_(std::move(service)), connection_(std::move(connection)) {}
+
+    void sendData(const Data& data) override {
+        const auto service = service_.lock();
+        const auto current = service ? service->validConnection() : nullptr;
+        if (current != nullptr && current == connection_.lock())
+            current->remoteObjectProxy().receiveData(data);
+    }
+
+private:
+    const std::weak_ptr<const VLLongFormAudioServer> service_;
+    const std::weak_ptr<ServiceConnection> connection_;
+};
 
 std::shared_ptr<VLLongFormAudioServer>
 VLLongFormAudioServer::sharedLongFormAudioServer(const Platform& platform) {
@@ -74,6 +93,7 @@ void VLLongFormAudioServer::_replaceCurrentConnectionWithConnection(
     assert(!commandServiceQueue_->isCurrent() && !platform_.queues.main().isCurrent());
     _setConnectionIsValid(false); // cancels the commands that have not begun
     commandServiceQueue_->sync([&] {
+        clientEvents_ = nullptr;
         if (auto router = std::exchange(audioFilePlayerServer_, nullptr))
             router->close();
         install(connection);
@@ -90,17 +110,16 @@ void VLLongFormAudioServer::install(std::shared_ptr<ServiceConnection>& connecti
 }
 
 void VLLongFormAudioServer::receiveData(std::vector<ReceivedCall> calls) {
-    std::vector<std::pair<std::shared_ptr<VLProtoVelmoMessage>, std::shared_ptr<Reply>>> arrived;
+    std::vector<std::pair<std::shared_ptr<VLProtoVelmoMessage>, Reply>> arrived;
     arrived.reserve(calls.size());
     for (auto& call : calls)
         if (auto envelope = envelopeFromData(call.data))
-            arrived.emplace_back(std::move(envelope), makeCached<Reply>(std::move(call.callback)));
+            arrived.emplace_back(std::move(envelope), std::move(call.reply));
     if (arrived.empty())
         return;
     platform_.queues.main().sync([&] {
         for (auto& [envelope, reply] : arrived)
-            _enqueueAudioCommand(makeCached<const VLLongFormAudioCommand>(envelope->audioFilePlayerMessage(),
-                                                                          std::move(reply)));
+            _enqueueAudioCommand({envelope->audioFilePlayerMessage(), std::move(reply)});
     });
 }
 
@@ -135,13 +154,13 @@ void VLLongFormAudioServer::_setConnectionIsValid(bool isValid) {
     connectionValidStateGuardQueue_->sync([&] { connectionIsValid_ = isValid; });
 }
 
-void VLLongFormAudioServer::_enqueueAudioCommand(std::shared_ptr<const VLLongFormAudioCommand> command) {
+void VLLongFormAudioServer::_enqueueAudioCommand(VLLongFormAudioCommand command) {
     assert(platform_.queues.main().isCurrent());
     commandServiceQueue_->async(
-        [self = shared_from_this(), command = std::move(command)] { self->runCommand(*command); });
+        [self = shared_from_this(), command = std::move(command)]() mutable { self->runCommand(command); });
 }
 
-void VLLongFormAudioServer::runCommand(const VLLongFormAudioCommand& command) {
+void VLLongFormAudioServer::runCommand(VLLongFormAudioCommand& command) {
     assert(commandServiceQueue_->isCurrent());
     if (!_connectionIsValid()) {
         command.cancelWithError(VLError::errorWithCode(platform_.localization, VLError::connectionLost));
@@ -168,7 +187,8 @@ void VLLongFormAudioServer::routeCommand(const VLLongFormAudioCommand& command) 
 void VLLongFormAudioServer::createAudioFilePlayerServer() {
     assert(platform_.queues.main().isCurrent());
     audioFilePlayerServer_ = std::make_shared<VLTorviAudioFilePlayerServer>(platform_);
-    audioFilePlayerServer_->setAudioServer(weak_from_this());
+    clientEvents_ = std::make_shared<ClientEvents>(weak_from_this(), clientConnection());
+    audioFilePlayerServer_->setAudioServer(clientEvents_);
 }
 
 } // namespace tarn

@@ -39,10 +39,12 @@ public:
     bool listenerShouldAcceptNewConnection(ServiceListener& listener,
                                            const std::shared_ptr<ServiceConnection>& connection) override;
 
-    /// Data that is no envelope costs a log line; its callback is let go. The commands are submitted when
-    /// this returns.
+    /// Data that is no envelope costs a log line, and is not answered. The commands are submitted when this
+    /// returns.
     void receiveData(std::vector<ReceivedCall> calls) override;
 
+    /// To the client of the moment. Objects of a client do not use it but the sink of their router, so that
+    /// what they report never reaches the next client.
     void sendData(const Data& data) override;
 
     /// Clears the current connection, whichever was lost. On the I/O thread.
@@ -52,7 +54,7 @@ public:
     void _replaceCurrentConnectionWithConnection(std::shared_ptr<ServiceConnection> connection);
 
     /// On the main queue, so that commands are submitted in the order of their arrival.
-    void _enqueueAudioCommand(std::shared_ptr<const VLLongFormAudioCommand> command);
+    void _enqueueAudioCommand(VLLongFormAudioCommand command);
 
     /// Any thread but the guard queue.
     bool _connectionIsValid() const;
@@ -68,9 +70,11 @@ public:
     const std::shared_ptr<SerialQueue>& commandServiceQueue() const { return commandServiceQueue_; }
 
 private:
+    class ClientEvents;
+
     std::shared_ptr<ServiceConnection> validConnection() const;
     void install(std::shared_ptr<ServiceConnection>& connection);
-    void runCommand(const VLLongFormAudioCommand& command);
+    void runCommand(VLLongFormAudioCommand& command);
     void routeCommand(const VLLongFormAudioCommand& command);
     void createAudioFilePlayerServer();
 
@@ -82,6 +86,7 @@ private:
     const std::shared_ptr<SerialQueue> connectionValidStateGuardQueue_;
     const std::shared_ptr<SerialQueue> longFormAudioConnectionInvalidated_; // never given work
     std::shared_ptr<VLTorviAudioFilePlayerServer> audioFilePlayerServer_;
+    std::shared_ptr<ClientEvents> clientEvents_; // the router's sink; there with it
     LiveObject<"service"> live_;
 };
 

@@ -18,10 +18,10 @@ public:
     SimulatedClient(const SimulatedClient&) = delete;
     SimulatedClient& operator=(const SimulatedClient&) = delete;
 
-    /// Calls with a callback; the result names the call. Calls are numbered from 1.
+    /// Calls and wants an answer; the result names the call. Calls are numbered from 1.
     std::uint64_t call(Data data);
 
-    /// Calls without a callback.
+    /// Calls and wants no answer.
     void send(Data data) { connection_->call(0, std::move(data)); }
 
     void hangUp() { connection_->lose(Loss::invalidated); }

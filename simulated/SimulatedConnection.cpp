@@ -5,19 +5,18 @@
 
 namespace tarn {
 
-/// The way back for one call; knows its own connection only.
-class SimulatedConnection::Callback final : public ClientCallback {
+class SimulatedConnection::Call final : public Reply::Call {
 public:
-    Callback(std::weak_ptr<SimulatedConnection> connection, std::uint64_t id)
+    Call(std::weak_ptr<SimulatedConnection> connection, std::uint64_t id)
         : connection_(std::move(connection)), id_(id) {}
 
-    ~Callback() override {
-        if (!called_)
+    ~Call() override {
+        if (!isAnswered_)
             deliver({SimulatedDelivery::Kind::released, id_, {}, {}});
     }
 
-    void call(std::optional<Data> data, const std::optional<Error>& error) override {
-        if (!std::exchange(called_, true))
+    void answer(std::optional<Data> data, const std::optional<Error>& error) override {
+        if (!std::exchange(isAnswered_, true))
             deliver({SimulatedDelivery::Kind::answer, id_, std::move(data), error});
     }
 
@@ -29,7 +28,7 @@ private:
 
     const std::weak_ptr<SimulatedConnection> connection_;
     const std::uint64_t id_;
-    bool called_ = false;
+    bool isAnswered_ = false;
 };
 
 SimulatedConnection::SimulatedConnection(std::shared_ptr<const SimulatedIO> io) : io_(std::move(io)) {}
@@ -65,11 +64,13 @@ void SimulatedConnection::receiveData(const Data& data) {
 }
 
 void SimulatedConnection::call(std::uint64_t id, Data data) {
-    auto callback = id == 0 ? nullptr : std::make_unique<Callback>(weak_from_this(), id);
+    Reply reply;
+    if (id != 0)
+        reply = Reply(std::make_shared<Call>(weak_from_this(), id));
     bool isSent = state_.withLocked([&](State& state) {
         if (state.loss != Loss::none)
             return false;
-        state.arrived.push_back({std::move(data), std::move(callback)});
+        state.arrived.push_back({std::move(data), std::move(reply)});
         return true;
     });
     if (isSent)

@@ -75,7 +75,7 @@ public:
     void finishLoss();
 
 private:
-    class Callback;
+    class Call;
 
     struct State {
         Loss loss = Loss::none;

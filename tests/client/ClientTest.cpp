@@ -35,7 +35,7 @@ TEST(AClient, TurnsCommandsIntoEnvelopesAndAnswersIntoValues) {
     const TestServer server([&](ReceivedCall call) {
         asked = VLProtoVelmoMessage::fromData(call.data);
         if (!answer.empty())
-            call.callback->call(answer, std::nullopt);
+            call.reply.data(answer);
     });
     Client client;
 

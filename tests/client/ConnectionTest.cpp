@@ -24,11 +24,11 @@ Data bytes(std::string_view text) { return {text.begin(), text.end()}; }
 /// Answers a call as its text asks for.
 void answerAsAsked(ReceivedCall call) {
     if (call.data == bytes("answer"))
-        call.callback->call(bytes("data"), std::nullopt);
+        call.reply.data(bytes("data"));
     else if (call.data == bytes("nothing"))
-        call.callback->call(std::nullopt, std::nullopt);
+        call.reply.nothing();
     else if (call.data == bytes("fail"))
-        call.callback->call(std::nullopt, Error{"domain", 26, {{localizedDescriptionKey, "Went wrong."}}});
+        call.reply.error({"domain", 26, {{localizedDescriptionKey, "Went wrong."}}});
 }
 
 /// Calls and waits for the end.
@@ -123,7 +123,7 @@ TEST(AConnection, TellsEventsAndAnswersInTheServicesOrder) {
     FakeService* service = nullptr;
     TestServer server([&](ReceivedCall call) {
         service->connection()->remoteObjectProxy().receiveData(call.data);
-        call.callback->call(call.data, std::nullopt);
+        call.reply.data(call.data);
     });
     service = &server.service;
     std::vector<std::string> told;

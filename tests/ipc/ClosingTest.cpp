@@ -90,7 +90,7 @@ TEST_P(ClosingTest, IsWaitedForByNobody) {
             begun.set_value();
             mayGoOn.get_future().wait();
         }
-        call.callback->call(std::nullopt, std::nullopt);
+        call.reply.nothing();
     });
     auto other = server.connect();
     ASSERT_TRUE(other.send(FrameKind::call, 1, "wait"));

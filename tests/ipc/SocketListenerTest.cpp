@@ -25,7 +25,7 @@ using testing::HasSubstr;
 using testing::IsEmpty;
 using testing::SizeIs;
 
-void echo(ReceivedCall call) { call.callback->call(call.data, std::nullopt); }
+void echo(ReceivedCall call) { call.reply.data(call.data); }
 
 TEST(SocketListener, AnswersEveryCallOnTheConnectionThatItCameOn) {
     TestServer server;
@@ -38,9 +38,10 @@ TEST(SocketListener, AnswersEveryCallOnTheConnectionThatItCameOn) {
 
     auto calls = server.service.takeKeptCalls();
     ASSERT_THAT(calls, SizeIs(2));
-    calls[1].callback->call(std::nullopt, Error{"domain", -3, {{"key", "text"}}});
-    calls[0].callback->call(bytes("data"), std::nullopt);
-    calls[0].callback->call(bytes("again"), std::nullopt);
+    calls[1].reply.error({"domain", -3, {{"key", "text"}}});
+    auto copy = calls[0].reply;
+    calls[0].reply.data(bytes("data"));
+    copy.data(bytes("again"));
     calls.clear();
 
     const auto toFirst = first.receive();
@@ -158,8 +159,7 @@ TEST(SocketListener, ReadsAllOfItWhenItSeesTheHangUpFirst) {
 }
 
 TEST(SocketListener, SendsNothingThatIsTooLongForAFrame) {
-    TestServer server(
-        [](ReceivedCall call) { call.callback->call(Data(FrameHeader::largestBody), std::nullopt); });
+    TestServer server([](ReceivedCall call) { call.reply.data(Data(FrameHeader::largestBody)); });
     auto client = server.connect();
     ASSERT_TRUE(client.send(FrameKind::call, 1));
     EXPECT_EQ(client.receive()->kind, FrameKind::released);

@@ -98,5 +98,29 @@ TEST(LeavingClientsTest, AreSilentWhicheverOfTheirWorkHasBegun) {
     }
 }
 
+// Rates and jumps are under way when it is replaced, on the queues and on the player thread.
+TEST(LeavingClientsTest, AreNotHeardOfByTheNextOneWhateverTheyAreAboutToReport) {
+    CapturedLog log;
+    for (std::uint64_t seed = 1; seed <= 500; ++seed) {
+        SimulatedPlatform device(seed);
+        device.media.addFile("file:///a");
+        auto service = std::make_shared<VLLongFormAudioServer>(device.roles());
+        service->run();
+        SimulatedClient first(device.listeners);
+        for (const auto& command : {commands::upsertAsset({.identifier = "a", .URL = "file:///a"}),
+                                    commands::upsertItem("a", "a"), commands::upsertPlayer("p", {"a"})}) {
+            first.send(commands::encoded(command));
+            device.scheduler.runReady();
+        }
+        for (int rate = 1; rate <= 3; ++rate) {
+            first.send(commands::encoded(commands::setRate("p", static_cast<float>(rate))));
+            first.send(commands::encoded(commands::setCurrentTime("a", rate)));
+        }
+        SimulatedClient next(device.listeners);
+        device.scheduler.runReady();
+        EXPECT_TRUE(next.deliveries().empty()) << seed;
+    }
+}
+
 } // namespace
 } // namespace tarn

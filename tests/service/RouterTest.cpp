@@ -69,14 +69,14 @@ TEST_F(RouterTest, OnlyTheFirstPartOfAMessageIsServed) {
     for (const auto& part : {commands::upsertAsset({.identifier = "a", .URL = "file:///none"}),
                              commands::getCurrentTime("a"), commands::appendItem("a", "a")})
         message->mergeFrom(*part);
-    router_->handleMessage(message, std::make_shared<Reply>());
+    router_->handleMessage(message, Reply());
     platform_.scheduler.runReady();
     EXPECT_THAT(log.errors(), testing::ElementsAre(testing::HasSubstr("QueuePlayerManager")));
 }
 
 TEST_F(RouterTest, AMessageWithoutAWayToAnswerIsServed) {
     CapturedLog log;
-    router_->handleMessage(commands::getCurrentTime("unknown"), nullptr);
+    router_->handleMessage(commands::getCurrentTime("unknown"), {});
     platform_.scheduler.runReady();
     EXPECT_THAT(log.errors(), testing::ElementsAre(testing::HasSubstr("unknown")));
 }

@@ -40,7 +40,7 @@ void MirroredClient::send(const commands::Command& command) {
         reply = transcript_->reply<VLProtoAudioFilePlayerCurrentTime>(name);
     else
         reply = transcript_->reply<VLProtoAudioFilePlayerStatus>(name);
-    router_->handleMessage(command, std::make_shared<Reply>(std::move(reply)));
+    router_->handleMessage(command, std::move(reply));
 }
 
 } // namespace tarn

@@ -38,21 +38,21 @@ struct TextOfValue {
 
 std::string textOf(const DictionaryValue& value) { return std::visit(TextOfValue{}, value.value); }
 
-/// The answer to one command; letting it go uncalled is seen too.
-class TranscriptCallback final : public ClientCallback {
+/// One command, as the transcript shows it; that it was not answered is shown, too.
+class TranscriptCall final : public Reply::Call {
 public:
     using Decode = std::function<std::shared_ptr<ProtoCodable>(const Data&)>;
 
-    TranscriptCallback(std::shared_ptr<Transcript> transcript, std::string command, Decode decode)
+    TranscriptCall(std::shared_ptr<Transcript> transcript, std::string command, Decode decode)
         : transcript_(std::move(transcript)), command_(std::move(command)), decode_(std::move(decode)) {}
 
-    ~TranscriptCallback() override {
-        if (!called_)
+    ~TranscriptCall() override {
+        if (!isAnswered_)
             transcript_->add(command_ + ": no answer");
     }
 
-    void call(std::optional<Data> data, const std::optional<Error>& error) override {
-        called_ = true;
+    void answer(std::optional<Data> data, const std::optional<Error>& error) override {
+        isAnswered_ = true;
         transcript_->add(command_ + ": " + outcome(data, error));
     }
 
@@ -74,7 +74,7 @@ private:
     const std::shared_ptr<Transcript> transcript_;
     const std::string command_;
     const Decode decode_;
-    bool called_ = false;
+    bool isAnswered_ = false;
 };
 
 } // namespace
@@ -115,7 +115,7 @@ std::function<void()> Transcript::actFor(const std::string& line) {
 }
 
 Reply Transcript::makeReply(const std::string& command, Decode decode) {
-    return Reply(std::make_unique<TranscriptCallback>(shared_from_this(), command, std::move(decode)));
+    return Reply(std::make_shared<TranscriptCall>(shared_from_this(), command, std::move(decode)));
 }
 
 void Transcript::add(const std::string& line) {

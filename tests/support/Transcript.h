@@ -6,7 +6,7 @@
 #include <string>
 
 #include "reply/EventSink.h"
-#include "reply/Reply.h"
+#include "roles/Reply.h"
 #include "wire/Dictionary.h"
 #include "wire/ProtoCodable.h"
 
