@@ -9,7 +9,7 @@ namespace tarn {
 namespace {
 
 /// A buffer that grew beyond this for a slow reader is given back.
-constexpr std::size_t keptCapacity = 16'384;
+constexpr std::size_t keptBufferCapacity = 16'384;
 
 } // namespace
 
@@ -39,7 +39,7 @@ SendBuffer::Result SendBuffer::flush(int socket) {
 void SendBuffer::clear() {
     bytes_.clear();
     sent_ = 0;
-    if (bytes_.capacity() > keptCapacity)
+    if (bytes_.capacity() > keptBufferCapacity)
         bytes_ = {};
 }
 
