@@ -51,6 +51,7 @@ void SoundServerProcess::start() {
     process_ = std::make_unique<ChildProcess>(command, environment(), ChildProcess::ErrorOutput::withOutput);
     if (!process_->readUntil("Daemon startup complete"))
         throw std::runtime_error("the sound server does not start");
+    process_->discardOutput(); // it stops when nobody reads its log
 }
 
 void SoundServerProcess::kill() {
