@@ -3,6 +3,8 @@
 #include <algorithm>
 #include <cmath>
 
+#include "client/libtarn/Overloaded.h"
+
 namespace tarn {
 
 namespace {
@@ -12,13 +14,6 @@ using Item = Mirror::Item;
 using Time = Mirror::Time;
 
 constexpr std::size_t mostGrants = 64; // what the service keeps
-
-template <class... Handlers>
-struct Overloaded : Handlers... {
-    using Handlers::operator()...;
-};
-template <class... Handlers>
-Overloaded(Handlers...) -> Overloaded<Handlers...>;
 
 void setPosition(Item& item, double seconds, Time now) {
     item.position = seconds;

@@ -29,7 +29,7 @@ constexpr std::int64_t connectionLostCode = 25;
 
 // A service that was killed is back within a tenth of a second, one that is installed anew within seconds.
 constexpr std::chrono::milliseconds firstPause = 25ms;
-constexpr std::chrono::milliseconds longestPause = 800ms;
+constexpr std::chrono::milliseconds longestPause = 250ms;
 
 // Between questions for positions, since something began to move. What was heard begins to move late, and
 // the clock of what is heard is not ours.
@@ -162,7 +162,8 @@ void Session::handleEvent(const client::Bytes& envelope) {
     if (survives()) {
         const std::lock_guard lock(mutex_);
         const bool isNews = mirror_.happened(*event, Clock::now());
-        noteAdvance(*event);
+        if (state_ == State::connected)
+            noteAdvance(*event);
         if (state_ == State::away && mustBeTold(*event))
             untold_.push_back(*event);
         if (state_ == State::away || !isNews)

@@ -62,4 +62,7 @@ using Event = std::variant<ItemStatusChanged, ItemTimeJumped, ItemPlayedToEnd, I
                            PlayerStatusChanged, PlayerRateChanged, CurrentItemChanged, ConnectionLost,
                            Reconnecting, Reconnected, TakenOver>;
 
+/// One line for a log, such as "a: played to its end". Not for a person to read, and not translated.
+std::string describe(const Event& event);
+
 } // namespace tarn::client
