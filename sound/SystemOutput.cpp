@@ -103,9 +103,15 @@ void SystemOutput::adoptStream() {
     format_ = stream_->format();
     capacity_ = capacityFor(format_);
     stream_->setDescription(title_, artist_);
-    if (running_)
-        stream_->cork(false);
     beginAnew(Mode::sounding);
+}
+
+// A stream that runs with nothing in it moves on all the same, and what is written then comes too late.
+void SystemOutput::beginToSound() {
+    if (running_ && corked_ && writeIndex_ > base_) {
+        stream_->cork(false);
+        corked_ = false;
+    }
 }
 
 // What was written is lost; what comes next is heard next.
@@ -135,6 +141,7 @@ void SystemOutput::beginAnew(Mode mode) {
 void SystemOutput::loseStream() {
     stream_.reset();
     toBeSilent_ = false;
+    corked_ = true; // as every stream begins
     interruptions_.streamGone(this);
 }
 
@@ -165,6 +172,7 @@ void SystemOutput::streamKilled() {
 
 void SystemOutput::streamMovedOffVanishedDevice() {
     stream_->cork(true);
+    corked_ = true;
     clock_.await(loop_.now());
     later([](SystemOutput& self) { self.listener_.outputDeviceVanished(); });
 }
@@ -207,7 +215,7 @@ void SystemOutput::start() {
         break;
     case Mode::sounding:
         clock_.await(now);
-        stream_->cork(false);
+        beginToSound();
         updateTimingSoon();
         break;
     }
@@ -226,6 +234,7 @@ void SystemOutput::stop() {
         return;
     takenWhileStopped_ = firstReplaceable();
     stream_->cork(true);
+    corked_ = true;
     stream_->updateTiming();
 }
 
@@ -295,13 +304,15 @@ void SystemOutput::write(const PcmBuffer& buffer) {
     writeIndex_ += static_cast<std::int64_t>(buffer.frames);
     filledTo_ = std::max(filledTo_, writeIndex_);
     clock_.setLimit(writeIndex_);
+    if (mode_ == Mode::sounding)
+        beginToSound();
     armWritable();
 }
 
 void SystemOutput::send(const PcmBuffer& buffer, bool standing) {
     history_.put(writeIndex_, buffer);
-    if (standing && running_ && filledTo_ > writeIndex_) {
-        // Silence has begun to be heard behind the last frame: go on as soon as can be.
+    if (standing && running_ && filledTo_ > base_) {
+        // Silence is heard behind the last frame by now: go on as soon as can be.
         stream_->writeSoon(static_cast<std::size_t>(framesIn(renderingMargin)), buffer.bytes.data(),
                            buffer.frames);
         filledTo_ = writeIndex_;

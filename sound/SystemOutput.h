@@ -59,6 +59,7 @@ private:
     void adoptStream();
     void loseStream();
     void beginAnew(Mode mode);
+    void beginToSound();
     void updateTimingSoon();
     std::chrono::nanoseconds pauseBeforeTiming(const SoundStream::Timing& timing);
     void send(const PcmBuffer& buffer, bool standing);
@@ -76,6 +77,7 @@ private:
     std::size_t capacity_ = 0; // frames
     Mode mode_ = Mode::idle;
     bool running_ = false;
+    bool corked_ = true;      // the stream: it stands still whether we run or not
     bool toBeSilent_ = false; // the server has asked for silence and not taken it back
     std::int64_t writeIndex_ = 0;
     HeardClock clock_;
