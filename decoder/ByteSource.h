@@ -13,11 +13,8 @@ public:
     virtual std::int64_t size() const = 0;
 
     /// Reads up to `size` bytes at `offset`. Returns how many; 0 at the end; a negative errno when the file
-    /// cannot be read, -ETIMEDOUT when it does not answer in time.
+    /// cannot be read. May wait as long as the file's system likes.
     virtual std::int64_t read(std::int64_t offset, std::byte* into, std::size_t size) = 0;
-
-    /// The time that may be spent on this file has passed: whoever works on it gives up.
-    virtual bool expired() const = 0;
 };
 
 } // namespace tarn

@@ -35,11 +35,7 @@ constexpr char codecs[] = "mp3float,mp3,mp2float,mp2,mp1float,mp1,aac,alac,flac,
 
 int refuseToOpen(AVFormatContext*, AVIOContext**, const char*, int, AVDictionary**) { return AVERROR(EPERM); }
 
-int isExpired(void* source) { return static_cast<ByteSource*>(source)->expired() ? 1 : 0; }
-
 Error readingError(std::int64_t number) {
-    if (number == ETIMEDOUT)
-        return mediaError(MediaErrorCode::timedOut, "The file did not answer in time.");
     return mediaError(MediaErrorCode::cannotRead, "The file could not be read.",
                       std::strerror(static_cast<int>(number)));
 }
@@ -112,8 +108,6 @@ std::int64_t Container::seekBytes(void* self, std::int64_t offset, int whence) {
 Error Container::openingError(int number) const {
     if (readError_ != 0)
         return readingError(readError_);
-    if (source_->expired())
-        return readingError(ETIMEDOUT);
     return mediaError(MediaErrorCode::notAudio, "The file holds no audio that can be played.",
                       ffmpegErrorText(number));
 }
@@ -125,7 +119,6 @@ void Container::prepare(AVFormatContext& context, const AVInputFormat* format) {
     context.pb = io_.get();
     context.flags |= AVFMT_FLAG_CUSTOM_IO;
     context.io_open = refuseToOpen;
-    context.interrupt_callback = {isExpired, source_};
     context.probesize = probeBytes;
     context.max_analyze_duration = probeMicroseconds;
     context.max_streams = mostStreams;
@@ -187,8 +180,8 @@ AVPacket* Container::next() {
     for (int attempt = 0; attempt < mostFruitlessReads; ++attempt) {
         av_packet_unref(packet_.get());
         const int result = av_read_frame(context_.get(), packet_.get());
-        if (readError_ != 0 || source_->expired()) {
-            failure_ = readingError(readError_ != 0 ? readError_ : ETIMEDOUT);
+        if (readError_ != 0) {
+            failure_ = readingError(readError_);
             return nullptr;
         }
         if (result == AVERROR(EAGAIN))

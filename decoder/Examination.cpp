@@ -73,7 +73,7 @@ void findExtent(Container& container, ByteSource& source, LengthFinder& length, 
 
 } // namespace
 
-DecoderModule::Examined examineFile(ByteSource& source) {
+ExaminedFile examineFile(ByteSource& source) {
     Container container;
     if (auto error = container.open(source))
         return {std::nullopt, *std::move(error)};

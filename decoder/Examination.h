@@ -1,11 +1,20 @@
 #pragma once
 
-#include "decoder/Decoder.h"
+#include <optional>
+
+#include "decoder/ByteSource.h"
+#include "mediaprotocol/AudioFileInfo.h"
+#include "roles/Error.h"
 
 namespace tarn {
 
-/// Opens `source` and finds out all of AudioFileInfo. Reads packets to the end where the container only
-/// guesses how long it is.
-DecoderModule::Examined examineFile(ByteSource& source);
+/// What a file says about itself, or why it is not to be played.
+struct ExaminedFile {
+    std::optional<AudioFileInfo> info;
+    Error error; ///< meaningful when there is no info
+};
+
+/// Reads format, tags and exact length.
+ExaminedFile examineFile(ByteSource& source);
 
 } // namespace tarn

@@ -1,10 +1,11 @@
 #pragma once
 
-#include "decoder/Decoder.h"
-
+#include "decoder/ByteSource.h"
 #include "decoder/Container.h"
+#include "decoder/Decoder.h"
 #include "decoder/PacketSeeker.h"
 #include "decoder/PacketTimeline.h"
+#include "mediaprotocol/AudioFileInfo.h"
 
 namespace tarn {
 

@@ -63,12 +63,13 @@ void TokenTable::release(std::int64_t handle) {
     auto gone = state_.withLocked([&](State& state) { return state.held.extract(handle); });
 }
 
-FileDescriptor TokenTable::open(const std::string& path) {
-    return state_.withLocked([&](State& state) {
+SharedFile TokenTable::open(const std::string& path) {
+    return state_.withLocked([&](State& state) -> SharedFile {
         for (const auto& [handle, granted] : state.held)
             if (granted.path == path)
-                return FileDescriptor(::fcntl(granted.file.get(), F_DUPFD_CLOEXEC, 0));
-        return FileDescriptor();
+                return std::make_shared<HeldFile>(HeldFile{
+                    FileForm::open, FileDescriptor(::fcntl(granted.file.get(), F_DUPFD_CLOEXEC, 0))});
+        return nullptr;
     });
 }
 

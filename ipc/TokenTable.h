@@ -30,7 +30,7 @@ public:
 
     std::int64_t consume(const char* token) override;
     void release(std::int64_t handle) override;
-    FileDescriptor open(const std::string& path) override;
+    SharedFile open(const std::string& path) override;
 
 private:
     struct GrantedFile {

@@ -1,6 +1,8 @@
 #pragma once
 
-#include "media/DecoderLoader.h"
+#include <memory>
+
+#include "media/FileExaminer.h"
 #include "roles/MediaEngine.h"
 #include "system/FileAccess.h"
 
@@ -10,15 +12,17 @@ namespace tarn {
 /// handed over or else the service's own. Any thread may call.
 class AssetOpener {
 public:
-    /// Both outlive the opener.
-    AssetOpener(FileAccess& access, DecoderLoader& loader) : access_(access), loader_(loader) {}
+    /// All outlive the opener.
+    AssetOpener(FileAccess& access, FilePorter& porter, FileExaminer& examiner)
+        : access_(access), porter_(porter), examiner_(examiner) {}
 
     /// Takes ten seconds at most.
     MediaAssetOutcome open(const std::string& URL) const;
 
 private:
     FileAccess& access_;
-    DecoderLoader& loader_;
+    FilePorter& porter_;
+    FileExaminer& examiner_;
 };
 
 } // namespace tarn

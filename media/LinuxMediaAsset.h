@@ -1,12 +1,12 @@
 #pragma once
 
-#include "decoder/Decoder.h"
-#include "media/MediaFile.h"
+#include "mediaprotocol/AudioFileInfo.h"
 #include "roles/MediaAsset.h"
+#include "system/HeldFile.h"
 
 namespace tarn {
 
-/// An audio file held open, with what was read from it.
+/// An audio file that the service holds without reading it, with what an examiner has read from it.
 class LinuxMediaAsset final : public MediaAsset {
 public:
     LinuxMediaAsset(std::string URL, SharedFile file, AudioFileInfo info);
@@ -15,7 +15,7 @@ public:
     const std::vector<MediaMetadataItem>& commonMetadata() const override { return metadata_; }
     MediaTime duration() const override;
 
-    const SharedFile& file() const { return file_; }
+    const HeldFile& file() const { return *file_; }
 
     /// Without its tags: they are in commonMetadata().
     const AudioFileInfo& info() const { return info_; }

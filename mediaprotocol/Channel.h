@@ -61,6 +61,10 @@ public:
     static std::optional<std::pair<Channel, Channel>> makePair();
 
     int socket() const { return socket_.get(); }
+
+    /// The socket itself; the channel is of no use then.
+    FileDescriptor takeSocket() { return std::move(socket_); }
+
     explicit operator bool() const { return static_cast<bool>(socket_); }
 
     /// Never waits. `files` stay the caller's.

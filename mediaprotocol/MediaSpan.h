@@ -14,9 +14,9 @@ struct MediaSpan {
     };
 
     std::uint32_t generation = 0; ///< of the seek that it follows on
-    std::uint32_t frames = 0;
     State state = State::more;
-    std::uint32_t zero = 0;
+    std::uint32_t frames = 0;
+    std::uint32_t bytes = 0; ///< of those frames
     std::int64_t start = 0;
     std::int64_t end = 0;
 };

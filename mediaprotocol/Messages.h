@@ -5,6 +5,7 @@
 #include <string>
 
 #include "mediaprotocol/Records.h"
+#include "system/HeldFile.h"
 
 namespace tarn {
 
@@ -19,7 +20,7 @@ enum class MessageKind : std::uint32_t {
     receiveFile,
     dropFile,
     ported,
-    porterIsIdle,
+    childIsIdle,
     examine,
     examined,
     openItem,
@@ -30,6 +31,16 @@ enum class MessageKind : std::uint32_t {
     renderingFailed,
 };
 
+/// What can hold a process that reads a stranger's file.
+enum LockDown : std::uint32_t {
+    lockedSystemCalls = 1, ///< only those that reading, decoding and answering take
+    lockedMemory = 2,      ///< no more than its own size and a margin
+    lockedEverything = lockedSystemCalls | lockedMemory,
+};
+
+/// For people: what is in force.
+std::string lockDownText(std::uint32_t locks);
+
 /// What a fork of the parent becomes.
 enum class ChildKind : std::uint32_t {
     porter = 1, ///< opens files and receives those of clients; reads none
@@ -37,17 +48,9 @@ enum class ChildKind : std::uint32_t {
     renderer,   ///< makes one file's frames
 };
 
-/// How a file comes along with a message.
-enum class FileForm : std::uint32_t {
-    none,
-    open,   ///< as it is
-    parked, ///< in flight in a socket, of which this is the receiving end
-    path,   ///< a descriptor that only names it (O_PATH)
-};
-
 // Service to parent.
 
-/// Make a child; its end of a socket comes along.
+/// Make a child. Its end of a socket comes along, and to a renderer its ring.
 struct ForkRequest {
     MessageKind kind = MessageKind::fork;
     ChildKind child = ChildKind::porter;
@@ -104,17 +107,19 @@ struct DropFile {
 
 /// The file that was asked for comes along, or there is none.
 struct Ported {
-    enum class Refusal : std::uint32_t { none, cannotOpen, notRegular, notReadable, severalFiles };
+    enum class Refusal : std::uint32_t { none, cannotOpen, notRegular, notReadable, notOneFile };
 
     MessageKind kind = MessageKind::ported;
     Refusal refusal = Refusal::none;
     FileForm form = FileForm::none;
     std::int32_t error = 0; ///< the system's reason, of cannotOpen
+    std::uint32_t idle = 0; ///< 1: nothing is left to be done; 0: ChildIsIdle follows
+    std::uint32_t zero = 0;
 };
 
-/// Nothing is left to do that may take long: follows every answer.
-struct PorterIsIdle {
-    MessageKind kind = MessageKind::porterIsIdle;
+/// Of a porter or an examiner: nothing is left to be done that may take long, such as closing a file.
+struct ChildIsIdle {
+    MessageKind kind = MessageKind::childIsIdle;
     std::uint32_t zero = 0;
 };
 
@@ -128,7 +133,9 @@ struct Examine {
 
 struct Examined {
     MessageKind kind = MessageKind::examined;
-    std::uint32_t lockDown = 0; ///< what holds the examiner, as bits of LockDown
+    std::uint32_t locks = 0; ///< what holds the examiner, as bits of LockDown
+    std::uint32_t idle = 0;  ///< 1: nothing is left to be done; 0: ChildIsIdle follows
+    std::uint32_t zero = 0;
     InfoRecord info;
     TagsRecord tags;
     ErrorRecord error; ///< without one the rest is meaningful
@@ -164,7 +171,7 @@ struct Taken {
 
 struct ItemOpened {
     MessageKind kind = MessageKind::itemOpened;
-    std::uint32_t lockDown = 0;
+    std::uint32_t locks = 0;
     ErrorRecord error;
 };
 

@@ -42,6 +42,7 @@ struct TagsRecord {
     FixedText<1024> title;
     FixedText<1024> album;
     FixedText<1024> artist;
+    std::uint32_t zero = 0;
 
     static TagsRecord of(const AudioFileInfo& info);
 

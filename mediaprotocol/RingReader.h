@@ -13,40 +13,45 @@ class RingReader {
 public:
     explicit RingReader(RingMemory memory) : memory_(std::move(memory)) {}
 
-    int descriptor() const { return memory_.descriptor(); }
-    std::size_t capacity() const { return memory_.capacity(); }
+    /// From here on what is of `generation` counts, in this format. What is there of earlier ones will be
+    /// thrown away.
+    void begin(std::uint32_t generation, const PcmFormat& format);
 
     struct Taken {
         enum class What {
             span,
-            nothing, ///< of this generation is there yet
+            nothing, ///< is there yet
             lie,     ///< what is there cannot be
         };
         What what = What::nothing;
         MediaSpan span; ///< as much of it as was taken
     };
 
-    /// Appends to `buffer` at most `maxFrames` frames of the oldest span of `generation`. What is there of
-    /// earlier generations is thrown away.
-    Taken take(std::uint32_t generation, PcmBuffer& buffer, std::size_t maxFrames);
+    /// Appends to `buffer` at most `maxFrames` frames of the oldest span.
+    Taken take(PcmBuffer& buffer, std::size_t maxFrames);
 
-    /// Nothing is there: the renderer shall send word when there are `frames` frames, or the last ones. To be
-    /// followed by another take().
+    /// Nothing is there: the renderer shall send word when there are `frames` frames, or all that follow. To
+    /// be followed by another take().
     void want(std::size_t frames);
     void wantNothing();
 
-    /// How many frames have been taken since this was last asked for `frames` or more; true when so many.
-    bool hasTaken(std::size_t frames);
+    /// True when half of what is kept at hand has been taken since it last was.
+    bool hasTakenHalf();
 
 private:
-    bool readSpan();
-    void copyFrames(PcmBuffer& buffer, std::size_t frames) const;
-    void release(std::size_t frames);
+    enum class Next { span, nothing, lie };
+
+    Next readSpan();
+    void copy(PcmBuffer& buffer, std::size_t frames) const;
+    void release(std::uint32_t frames);
 
     RingMemory memory_;
-    std::uint64_t frames_ = 0; // taken
-    std::uint64_t spans_ = 0;  // taken
-    std::uint64_t framesTold_ = 0;
+    std::uint32_t generation_ = 0;
+    std::size_t capacity_ = 0; // in bytes
+    std::size_t frameSize_ = 1;
+    std::uint64_t bytes_ = 0; // taken
+    std::uint64_t spans_ = 0; // taken
+    std::uint64_t bytesTold_ = 0;
     std::optional<MediaSpan> current_; // what is left of the span that take() is at
 };
 

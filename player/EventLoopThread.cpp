@@ -124,6 +124,7 @@ EventLoopThread::EventLoopThread()
 void EventLoopThread::sleepIn(Poller& poller) {
     poller.watch(wakeUp_.get(), [this] { takeCount(wakeUp_.get()); });
     poller.watch(timers_->descriptor(), [this] { timers_->runDue(); });
+    poller.watch(watches_.descriptor(), [this] { watches_.callReady(); });
     poller_ = &poller;
 }
 

@@ -6,6 +6,7 @@
 #include <thread>
 #include <vector>
 
+#include "player/DescriptorWatches.h"
 #include "player/EventLoop.h"
 #include "player/SystemPoller.h"
 #include "system/FileDescriptor.h"
@@ -32,6 +33,12 @@ public:
     bool isCurrent() const override;
     std::chrono::nanoseconds now() const override;
 
+    /// Has `readable` called while there is something to be read from `descriptor`, or its other end is gone.
+    /// The registration goes before the descriptor and the loop do. Player thread.
+    [[nodiscard]] RegistrationHandle watch(int descriptor, std::function<void()> readable) {
+        return watches_.add(descriptor, std::move(readable));
+    }
+
     /// From its next turn on the thread sleeps with `poller`, which lives until stop(). Player thread.
     void sleepIn(Poller& poller);
 
@@ -43,6 +50,7 @@ private:
 
     const FileDescriptor wakeUp_;
     const std::shared_ptr<Timers> timers_;
+    DescriptorWatches watches_; // player thread
     SystemPoller firstPoller_;
     Poller* poller_ = nullptr; // player thread
 

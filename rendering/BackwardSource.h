@@ -1,5 +1,6 @@
 #pragma once
 
+#include "pcm/PcmFormat.h"
 #include "rendering/FrameSource.h"
 
 namespace tarn {

@@ -12,12 +12,11 @@ constexpr std::int64_t filterFrames = 256; // more than a resampler looks back, 
 
 } // namespace
 
-ForwardSource::ForwardSource(Decoder& decoder, const DecoderModule& module, const AudioFileInfo& info,
-                             const PcmFormat& format)
+ForwardSource::ForwardSource(Decoder& decoder, const AudioFileInfo& info, const PcmFormat& format)
     : decoder_(decoder),
       from_(info.format),
       to_(format),
-      converter_(info.format == format ? nullptr : module.makeConverter(info.format, format)) {
+      converter_(info.format == format ? nullptr : std::make_unique<Converter>(info.format, format)) {
     if (info.frames)
         length_ = (*info.frames * to_.rate + from_.rate / 2) / from_.rate;
 }

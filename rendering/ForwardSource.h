@@ -3,6 +3,8 @@
 #include <memory>
 #include <optional>
 
+#include "decoder/Converter.h"
+#include "mediaprotocol/AudioFileInfo.h"
 #include "rendering/FrameSource.h"
 
 namespace tarn {
@@ -12,8 +14,7 @@ namespace tarn {
 class ForwardSource final : public FrameSource {
 public:
     /// `decoder` outlives the source.
-    ForwardSource(Decoder& decoder, const DecoderModule& module, const AudioFileInfo& info,
-                  const PcmFormat& format);
+    ForwardSource(Decoder& decoder, const AudioFileInfo& info, const PcmFormat& format);
 
     /// In frames of the source's format; none when the file does not tell.
     std::optional<std::int64_t> length() const { return length_; }
@@ -30,7 +31,7 @@ private:
     Decoder& decoder_;
     const PcmFormat from_;
     const PcmFormat to_;
-    const std::unique_ptr<SampleConverter> converter_; // null when the formats agree
+    const std::unique_ptr<Converter> converter_; // null when the formats agree
     std::optional<std::int64_t> length_;
 
     // Of the conversion; without one the decoder knows all this.

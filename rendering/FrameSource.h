@@ -5,7 +5,7 @@
 
 namespace tarn {
 
-/// The frames of a file one after the other, in some format and direction. Player thread.
+/// The frames of a file one after the other, in some format and direction.
 class FrameSource {
 public:
     virtual ~FrameSource() = default;

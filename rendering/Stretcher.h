@@ -8,7 +8,7 @@
 
 namespace tarn {
 
-/// Plays frames faster or slower without changing their pitch. Player thread.
+/// Plays frames faster or slower without changing their pitch.
 ///
 /// Runs one or more stages, none of which changes the speed by more than a factor of two: there the library
 /// is at its best. Each is steered so that what comes out stays where it belongs in time, however long it

@@ -7,7 +7,7 @@ LinuxMediaEngine::LinuxMediaEngine(NotificationCenter& notifications, FileAccess
     : LinuxMediaParts(session),
       PlaybackEngine(LinuxMediaParts::loop, LinuxMediaParts::renderings, LinuxMediaParts::outputs,
                      notifications),
-      opener_(files, loader) {}
+      opener_(files, porter, examiner) {}
 
 LinuxMediaEngine::~LinuxMediaEngine() { LinuxMediaParts::loop.stop(); }
 

@@ -1,8 +1,8 @@
 #pragma once
 
 #include "media/AssetOpener.h"
+#include "media/ChildRenderingFactory.h"
 #include "player/PlaybackEngine.h"
-#include "rendering/LinuxRendering.h"
 #include "service/IdleHeap.h"
 #include "sound/LinuxAudioSession.h"
 #include "sound/SystemOutput.h"
@@ -14,13 +14,15 @@ namespace tarn {
 struct LinuxMediaParts {
     explicit LinuxMediaParts(InterruptionListener& interruptions) : outputs(loop, interruptions) {}
 
-    DecoderLoader loader;
+    MediaProcess process;
+    FilePorter porter{process};
+    FileExaminer examiner{process, porter};
     EventLoopThread loop;
-    LinuxRenderingFactory renderings{loop, loader};
+    ChildRenderingFactory renderings{loop, process, porter};
     SystemOutputFactory outputs;
 };
 
-/// The media engine of this machine: FFmpeg reads, the sound server plays.
+/// The media engine of this machine: processes of their own read, the sound server plays.
 class LinuxMediaEngine final : private LinuxMediaParts, public PlaybackEngine {
 public:
     /// All of these outlive the engine.

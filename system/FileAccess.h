@@ -2,7 +2,7 @@
 
 #include <string>
 
-#include "system/FileDescriptor.h"
+#include "system/HeldFile.h"
 
 namespace tarn {
 
@@ -11,11 +11,11 @@ class FileAccess {
 public:
     virtual ~FileAccess() = default;
 
-    /// The open file that is held for exactly this path while a consumed token has not been released; none
-    /// when there is none, and then the service's own rights decide.
+    /// The file that is held for exactly this path while a consumed token has not been released; null when
+    /// there is none, and then the service's own rights decide.
     ///
-    /// A regular file, readable, close-on-exec. It shares its offset with the client: read it with pread().
-    virtual FileDescriptor open(const std::string& path) = 0;
+    /// A regular file, readable. It shares its offset with the client: it is to be read with pread().
+    virtual SharedFile open(const std::string& path) = 0;
 };
 
 } // namespace tarn

@@ -4,7 +4,6 @@
 
 #include <cstddef>
 #include <filesystem>
-#include <optional>
 #include <string>
 #include <vector>
 
@@ -29,7 +28,9 @@ std::vector<std::string> programLibraryFolders() {
     return folders;
 }
 
-std::optional<std::string> findModule(const char* file) {
+} // namespace
+
+std::optional<std::string> findBesideModules(const char* file) {
     for (const std::string& folder : programLibraryFolders()) {
         const auto path = std::filesystem::path(folder) / file;
         std::error_code ignored;
@@ -39,10 +40,8 @@ std::optional<std::string> findModule(const char* file) {
     return std::nullopt;
 }
 
-} // namespace
-
 ModuleSymbol loadFromModule(const char* file, const char* symbol) {
-    const auto path = findModule(file);
+    const auto path = findBesideModules(file);
     if (!path)
         return {nullptr, "not found"};
     void* library = dlopen(path->c_str(), RTLD_NOW | RTLD_LOCAL);

@@ -1,8 +1,12 @@
 #pragma once
 
+#include <optional>
 #include <string>
 
 namespace tarn {
+
+/// The full path of `file`, which is installed beside the modules; none when it is not there.
+std::optional<std::string> findBesideModules(const char* file);
 
 /// What was found in a module: its function, or why there is none.
 struct ModuleSymbol {

@@ -35,7 +35,6 @@ public:
     std::int64_t read(std::int64_t offset, std::byte* into, std::size_t size) override {
         return pread(descriptor_, into, size, offset);
     }
-    bool expired() const override { return false; }
 
 private:
     const int descriptor_;

@@ -1,9 +1,7 @@
-#include "tests/support/MediaFixture.h"
+#include "tests/support/DecodingFixture.h"
 
 namespace tarn {
 namespace {
-
-using namespace std::chrono_literals;
 
 struct FileFormat {
     const char* name;
@@ -44,39 +42,24 @@ struct DecoderTest : testing::TestWithParam<FileFormat> {
 
     DecoderTest() {
         writeWav(folder / "source.wav", source);
-        path = folder / GetParam().name;
-        encodeAudio(folder / "source.wav", GetParam().arguments, path);
-        asset = openFile(path);
-        if (asset) {
-            reader = std::make_unique<FileReader>(asset->file());
-            decoder = sharedLoader().load()->open(*reader, asset->info()).decoder;
-        }
+        encodeAudio(folder / "source.wav", GetParam().arguments, folder / GetParam().name);
+        file.emplace(folder / GetParam().name);
     }
 
-    void SetUp() override { ASSERT_NE(decoder, nullptr); }
-
     std::vector<float> readFrames(std::size_t frames) {
-        PcmBuffer buffer;
-        state = Decoder::State::more;
-        while (state == Decoder::State::more && buffer.frames < frames)
-            state = decoder->read(buffer, frames - buffer.frames);
-        return toFloats(buffer, asset->info().format.sample);
+        return toFloats(file->read(frames), file->info.format.sample);
     }
 
     const Recording source = makeSweep(length, GetParam().rate, 2);
     TemporaryFolder folder;
-    std::filesystem::path path;
-    std::shared_ptr<LinuxMediaAsset> asset;
-    std::unique_ptr<FileReader> reader;
-    std::unique_ptr<Decoder> decoder;
-    Decoder::State state = Decoder::State::more;
+    std::optional<DecodedFile> file;
 };
 
 TEST_P(DecoderTest, DecodesExactlyWhatWasEncoded) {
     const std::vector<float> whole = toFloats(source);
     const std::vector<float> decoded = readFrames(2 * length);
-    EXPECT_EQ(state, Decoder::State::ended);
-    EXPECT_EQ(decoded.size() / 2, static_cast<std::size_t>(asset->info().frames.value_or(-1)))
+    EXPECT_EQ(file->state, Decoder::State::ended);
+    EXPECT_EQ(decoded.size() / 2, static_cast<std::size_t>(file->info.frames.value_or(-1)))
         << "the duration is not what comes out";
     if (GetParam().gapless) {
         ASSERT_EQ(decoded.size(), whole.size());
@@ -93,16 +76,16 @@ TEST_P(DecoderTest, SeeksToTheFrame) {
     const std::vector<float> whole = readFrames(2 * length);
     const std::int64_t tolerance = GetParam().seekTolerance;
     for (const std::int64_t target : {150'001L, 3L, 0L, 44'100L, 200'000L, 1'151L, 209'000L, 100'000L}) {
-        decoder->seek(target);
+        file->decoder->seek(target);
         const std::vector<float> part = readFrames(2'000);
         ASSERT_EQ(part.size(), 4'000u) << "at " << target;
         const std::int64_t shift = displacement(part, whole, target, 2, tolerance + 1);
         EXPECT_LE(std::abs(shift), tolerance) << "at " << target;
         EXPECT_LT(difference(part, whole, target + shift, 2), GetParam().noise) << "at " << target;
     }
-    decoder->seek(static_cast<std::int64_t>(whole.size() / 2) + 10);
+    file->decoder->seek(static_cast<std::int64_t>(whole.size() / 2) + 10);
     EXPECT_TRUE(readFrames(100).empty());
-    EXPECT_EQ(state, Decoder::State::ended);
+    EXPECT_EQ(file->state, Decoder::State::ended);
 }
 
 INSTANTIATE_TEST_SUITE_P(Formats, DecoderTest, testing::ValuesIn(formats), [](const auto& information) {

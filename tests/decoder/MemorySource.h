@@ -22,7 +22,6 @@ public:
         read_ += static_cast<std::int64_t>(size);
         return static_cast<std::int64_t>(size);
     }
-    bool expired() const override { return false; }
 
     /// How many bytes were read so far.
     std::int64_t bytesRead() const { return read_; }

@@ -20,7 +20,7 @@ protected:
     std::string read(const std::string& path) {
         const auto file = table_.open(path);
         char text[16] = {};
-        return file && ::pread(file.get(), text, sizeof(text) - 1, 0) >= 0 ? text : "none";
+        return file && ::pread(file->descriptor.get(), text, sizeof(text) - 1, 0) >= 0 ? text : "none";
     }
 
     TemporaryFolder folder_;

@@ -17,16 +17,14 @@ namespace {
 using namespace std::chrono_literals;
 using What = RingReader::Taken::What;
 
-constexpr PcmFormat format{SampleFormat::s16, 44100, 2};
-
-constexpr std::size_t capacity = 1'000;
+constexpr PcmFormat format{SampleFormat::s16, 1000, 2};
+constexpr std::size_t capacity = 2'000; // two seconds
 
 struct Ends {
-    explicit Ends(RingMemory memory = *RingMemory::create(format, capacity))
-        : descriptor(::dup(memory.descriptor())),
-          reader(std::move(memory)),
-          writer(*RingMemory::map(descriptor, format, capacity)),
-          raw(*RingMemory::map(descriptor, format, capacity)) {}
+    Ends() {
+        reader.begin(1, format);
+        EXPECT_TRUE(writer.begin(format, capacity));
+    }
 
     /// `frames` frames that hold their own numbers, and a nanosecond each.
     void put(std::uint32_t generation, std::size_t frames, MediaSpan::State state = MediaSpan::State::more) {
@@ -40,10 +38,11 @@ struct Ends {
         writer.put(buffer, {.generation = generation, .state = state, .start = start, .end = next});
     }
 
-    FileDescriptor descriptor;
-    RingReader reader;
-    RingWriter writer;
-    RingMemory raw;
+    RingMemory memory = *RingMemory::create();
+    FileDescriptor descriptor{::dup(memory.descriptor())};
+    RingReader reader{std::move(memory)};
+    RingWriter writer{*RingMemory::map(descriptor)};
+    RingMemory raw = *RingMemory::map(descriptor);
     std::uint32_t next = 0;
 };
 
@@ -55,7 +54,7 @@ TEST_F(Ring, CarriesFramesAndWhereTheyLieThroughManyTurns) {
         put(1, piece);
         for (std::size_t taken = 0; taken < piece;) {
             PcmBuffer buffer;
-            const auto part = reader.take(1, buffer, 150);
+            const auto part = reader.take(buffer, 150);
             ASSERT_EQ(part.what, What::span);
             ASSERT_EQ(part.span.start, expected) << "spans join, in parts too";
             for (std::size_t i = 0; i < buffer.frames; ++i, ++expected) {
@@ -73,39 +72,45 @@ TEST_F(Ring, CarriesFramesAndWhereTheyLieThroughManyTurns) {
 TEST_F(Ring, ThrowsAwayWhatWasMadeBeforeASeek) {
     PcmBuffer buffer;
     put(1, 300);
-    EXPECT_EQ(reader.take(1, buffer, 100).span.frames, 100u);
+    EXPECT_EQ(reader.take(buffer, 100).span.frames, 100u);
     put(1, 300);
-    EXPECT_EQ(reader.take(2, buffer, 100).what, What::nothing);
+    const PcmFormat other{SampleFormat::f32, 8000, 1};
+    reader.begin(2, other);
+    EXPECT_EQ(reader.take(buffer, 100).what, What::nothing);
     EXPECT_EQ(writer.room(), capacity);
+    put(1, 500); // on its way when the seek came
+    ASSERT_TRUE(writer.begin(other, RingMemory::capacityFor(other)));
+    EXPECT_EQ(writer.room(), 16'000u);
     put(2, 50, MediaSpan::State::ended);
-    const auto last = reader.take(2, buffer, 100);
-    EXPECT_EQ(last.span.start, 600);
+    const auto last = reader.take(buffer, 100);
+    EXPECT_EQ(last.span.start, 1'100);
     EXPECT_EQ(last.span.state, MediaSpan::State::ended);
 }
 
 TEST_F(Ring, OwesWordOnceWhenEnoughIsThere) {
     PcmBuffer buffer;
     reader.want(200);
-    EXPECT_EQ(reader.take(1, buffer, 100).what, What::nothing);
+    EXPECT_EQ(reader.take(buffer, 100).what, What::nothing);
     put(1, 100);
     EXPECT_FALSE(writer.owesWord());
     put(1, 100);
     EXPECT_TRUE(writer.owesWord());
     put(1, 100);
     EXPECT_FALSE(writer.owesWord());
-    reader.want(900);
+    reader.want(400);
     put(1, 1, MediaSpan::State::ended);
     EXPECT_TRUE(writer.owesWord()) << "no more will come";
 }
 
 TEST_F(Ring, IsNotBelievedWhenItLies) {
     const std::function<void(RingHeader&)> lies[] = {
-        [](RingHeader& header) { header.framesWritten = capacity + 101; },
-        [](RingHeader& header) { header.framesWritten = ~std::uint64_t{0}; },
+        [](RingHeader& header) { header.bytesWritten = 2 * RingMemory::size + 401; },
+        [](RingHeader& header) { header.bytesWritten = ~std::uint64_t{0}; },
         [](RingHeader& header) { header.spansWritten = RingHeader::mostSpans + 2; },
         [](RingHeader& header) { header.spansWritten = 0; },
-        [](RingHeader& header) { header.spans[1].frames = 500; },
-        [](RingHeader& header) { header.spans[1].frames = 0; },
+        [](RingHeader& header) { header.spans[1].frames = 101; },
+        [](RingHeader& header) { header.spans[1].frames = header.spans[1].bytes = 0; },
+        [](RingHeader& header) { header.spans[1].frames = (header.spans[1].bytes = 404) / 4; },
         [](RingHeader& header) { header.spans[1].state = static_cast<MediaSpan::State>(3); },
         [](RingHeader& header) { header.spans[1].generation = 2; },
         [](RingHeader& header) { header.spans[1].start = -1; },
@@ -116,9 +121,9 @@ TEST_F(Ring, IsNotBelievedWhenItLies) {
         PcmBuffer buffer;
         ring.put(1, 100);
         ring.put(1, 100);
-        ASSERT_EQ(ring.reader.take(1, buffer, 100).what, What::span);
+        ASSERT_EQ(ring.reader.take(buffer, 100).what, What::span);
         lie(ring.raw.header());
-        EXPECT_EQ(ring.reader.take(1, buffer, 100).what, What::lie) << &lie - lies;
+        EXPECT_EQ(ring.reader.take(buffer, 100).what, What::lie) << &lie - lies;
     }
     EXPECT_NE(::ftruncate(descriptor.get(), 0), 0) << "nor can it be taken away";
 }

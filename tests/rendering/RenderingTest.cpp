@@ -1,10 +1,9 @@
 #include <cmath>
 #include <numbers>
-#include <semaphore>
+#include <optional>
 
-#include "player/EventLoopThread.h"
-#include "rendering/LinuxRendering.h"
-#include "tests/support/MediaFixture.h"
+#include "rendering/ItemRendering.h"
+#include "tests/support/DecodingFixture.h"
 
 namespace tarn {
 namespace {
@@ -15,11 +14,11 @@ using std::chrono::nanoseconds;
 /// All that a rendering makes from a seek on, and what media each of its frames plays.
 struct Rendered {
     PcmBuffer buffer;
-    std::vector<RenderedSpan> spans;
+    std::vector<MediaSpan> spans;
 
-    nanoseconds positionOf(std::size_t frame) const {
+    std::int64_t positionOf(std::size_t frame) const {
         std::size_t first = 0;
-        for (const RenderedSpan& span : spans) {
+        for (const MediaSpan& span : spans) {
             if (frame < first + span.frames)
                 return span.start + (span.end - span.start) * static_cast<std::int64_t>(frame - first) /
                                         static_cast<std::int64_t>(span.frames);
@@ -29,97 +28,63 @@ struct Rendered {
     }
 };
 
-Rendered renderAll(Rendering& rendering, std::size_t limit = 100'000'000) {
+Rendered renderAll(ItemRendering& rendering, std::size_t limit = 100'000'000) {
     Rendered all;
     do {
         const std::size_t before = all.buffer.frames;
         all.spans.push_back(rendering.render(all.buffer, 5'000));
         EXPECT_EQ(all.spans.back().frames, all.buffer.frames - before);
-        const RenderedSpan& previous =
-            all.spans[all.spans.size() - std::min<std::size_t>(2, all.spans.size())];
+        const MediaSpan& previous = all.spans[all.spans.size() - std::min<std::size_t>(2, all.spans.size())];
         EXPECT_EQ(all.spans.back().start, all.spans.size() > 1 ? previous.end : all.spans.back().start)
             << "spans join";
-    } while (all.spans.back().state == RenderedSpan::State::more && all.buffer.frames < limit);
+    } while (all.spans.back().state == MediaSpan::State::more && all.buffer.frames < limit);
     return all;
 }
 
-struct RenderingTest : testing::Test {
-    std::unique_ptr<Rendering> open(const std::filesystem::path& path) {
-        LinuxRenderingFactory factory(loop, sharedLoader());
-        auto outcome = factory.open(openFile(path), [] {});
-        EXPECT_NE(outcome.rendering, nullptr);
-        return std::move(outcome.rendering);
-    }
+struct RenderedFile {
+    explicit RenderedFile(const std::filesystem::path& path)
+        : file(path), rendering(*file.decoder, file.info) {}
 
-    std::unique_ptr<Rendering> open(const Recording& recording) {
+    DecodedFile file;
+    ItemRendering rendering;
+};
+
+struct RenderingTest : testing::Test {
+    ItemRendering& open(const std::filesystem::path& path) { return opened.emplace(path).rendering; }
+
+    ItemRendering& open(const Recording& recording) {
         writeWav(folder / "recording.wav", recording);
         return open(folder / "recording.wav");
     }
 
     TemporaryFolder folder;
-    EventLoopThread loop;
+    std::optional<RenderedFile> opened;
 };
 
 constexpr PcmFormat sixteenBits{SampleFormat::s16, 44100, 2};
 
-TEST_F(RenderingTest, ARemoteFileIsRenderedToTheSameSamples) {
-    const Recording recording = makeSweep(200'001, 44100, 2);
-    writeWav(folder / "recording.wav", recording);
-    const auto local = openFile(folder / "recording.wav");
-    auto file = std::make_shared<MediaFile>(FileDescriptor(dup(local->file()->descriptor.get())));
-    EXPECT_FALSE(file->remote);
-    file->remote = true;
-    LinuxRenderingFactory factory(loop, sharedLoader());
-    const auto more = std::make_shared<std::counting_semaphore<>>(0);
-    const auto rendering = factory
-                               .open(std::make_shared<LinuxMediaAsset>("file:///a", file, local->info()),
-                                     [more] { more->release(); })
-                               .rendering;
-    for (const std::size_t first : {0u, 150'000u, 44'100u}) {
-        PcmBuffer buffer;
-        rendering->seek(nanoseconds(first * 1'000'000'000 / 44100), 1, sixteenBits);
-        nanoseconds position = -1ns;
-        for (RenderedSpan span; span.state != RenderedSpan::State::ended;) {
-            span = rendering->render(buffer, 4'321);
-            ASSERT_NE(span.state, RenderedSpan::State::failed);
-            if (span.frames > 0 && position > 0ns) {
-                EXPECT_EQ(span.start, position) << "spans join";
-            }
-            position = span.frames > 0 ? span.end : position;
-            if (span.state == RenderedSpan::State::waiting) {
-                ASSERT_TRUE(more->try_acquire_for(10s));
-            }
-        }
-        ASSERT_EQ(buffer.frames, 200'001 - first);
-        EXPECT_EQ(std::memcmp(buffer.bytes.data(), recording.samples.data() + first * 2, buffer.bytes.size()),
-                  0);
-        while (more->try_acquire()) {
-        }
-    }
-}
-
 TEST_F(RenderingTest, TouchesNoSampleAtRateOneInTheFilesOwnFormat) {
     const Recording recording = makeSweep(100'001, 44100, 2);
-    auto rendering = open(recording);
-    rendering->seek(0ns, 1, sixteenBits);
-    const Rendered all = renderAll(*rendering);
+    ItemRendering& rendering = open(recording);
+    rendering.seek(0ns, 1, sixteenBits);
+    const Rendered all = renderAll(rendering);
     ASSERT_EQ(all.buffer.bytes.size(), recording.samples.size() * 2);
     EXPECT_EQ(std::memcmp(all.buffer.bytes.data(), recording.samples.data(), all.buffer.bytes.size()), 0);
-    EXPECT_EQ(all.spans.back().end, nanoseconds((100'001 * 1'000'000'000LL + 22'050) / 44100));
+    EXPECT_EQ(all.spans.back().end, (100'001 * 1'000'000'000LL + 22'050) / 44100);
 
     for (const SampleFormat wider : {SampleFormat::s24In32, SampleFormat::s32, SampleFormat::f32}) {
-        rendering->seek(1s, 1, {wider, 44100, 2});
-        const auto samples = toFloats(renderAll(*rendering).buffer, wider);
+        rendering.seek(1s, 1, {wider, 44100, 2});
+        const auto samples = toFloats(renderAll(rendering).buffer, wider);
         EXPECT_EQ(difference(samples, toFloats(recording), 44'100, 2), 0.0) << static_cast<int>(wider);
     }
 }
 
 TEST_F(RenderingTest, ConvertsTheRateToTheSamePlacesAfterEverySeek) {
     const Recording recording = makeSweep(150'000, 44100, 2);
-    auto rendering = open(recording);
+    ItemRendering& rendering = open(recording);
     const PcmFormat format{SampleFormat::f32, 48000, 2};
-    rendering->seek(0ns, 1, format);
-    const Rendered all = renderAll(*rendering);
+    rendering.seek(0ns, 1, format);
+    const Rendered all = renderAll(rendering);
     EXPECT_EQ(all.buffer.frames, (150'000u * 480 + 220) / 441);
     const auto whole = toFloats(all.buffer, format.sample);
     EXPECT_LT(difference(std::vector<float>(whole.begin(), whole.begin() + 96'000),
@@ -127,33 +92,33 @@ TEST_F(RenderingTest, ConvertsTheRateToTheSamePlacesAfterEverySeek) {
               1e-3)
         << "the same sweep, sampled at the other rate, but for its noise";
     for (const nanoseconds position : {1'234'567'890ns, 1ns, 2'999'999'999ns, 1'500'000'000ns}) {
-        rendering->seek(position, 1, format);
-        const auto part = toFloats(renderAll(*rendering, 4'000).buffer, format.sample);
+        rendering.seek(position, 1, format);
+        const auto part = toFloats(renderAll(rendering, 4'000).buffer, format.sample);
         const auto frame = std::llround(static_cast<double>(position.count()) * 48e-6);
         EXPECT_LT(difference(part, whole, frame, 2), 1e-9) << position.count();
     }
-    rendering->seek(0ns, 1, {SampleFormat::s16, 48000, 1});
-    EXPECT_EQ(renderAll(*rendering).buffer.frames, all.buffer.frames);
+    rendering.seek(0ns, 1, {SampleFormat::s16, 48000, 1});
+    EXPECT_EQ(renderAll(rendering).buffer.frames, all.buffer.frames);
 }
 
 TEST_F(RenderingTest, PlaysBackwards) {
     Recording recording = makeSweep(120'000, 44100, 2);
-    auto rendering = open(recording);
-    rendering->seek(2s, -1, sixteenBits);
-    const Rendered all = renderAll(*rendering);
-    EXPECT_EQ(all.spans.front().start, 2s);
-    EXPECT_EQ(all.spans.back().end, 0s);
-    EXPECT_EQ(all.spans.back().state, RenderedSpan::State::ended);
+    ItemRendering& rendering = open(recording);
+    rendering.seek(2s, -1, sixteenBits);
+    const Rendered all = renderAll(rendering);
+    EXPECT_EQ(all.spans.front().start, nanoseconds(2s).count());
+    EXPECT_EQ(all.spans.back().end, nanoseconds(0s).count());
+    EXPECT_EQ(all.spans.back().state, MediaSpan::State::ended);
     ASSERT_EQ(all.buffer.frames, 88'200u);
     const auto samples = toFloats(all.buffer, SampleFormat::s16);
     const auto forward = toFloats(recording);
     for (std::size_t frame = 0; frame < 88'200; ++frame)
         ASSERT_EQ(samples[frame * 2], forward[(88'199 - frame) * 2]) << frame;
 
-    rendering->seek(2s, -2, sixteenBits);
-    EXPECT_NEAR(static_cast<double>(renderAll(*rendering).buffer.frames), 44'100, 100);
-    rendering->seek(0s, -1, sixteenBits);
-    EXPECT_EQ(renderAll(*rendering).buffer.frames, 0u);
+    rendering.seek(2s, -2, sixteenBits);
+    EXPECT_NEAR(static_cast<double>(renderAll(rendering).buffer.frames), 44'100, 100);
+    rendering.seek(0s, -1, sixteenBits);
+    EXPECT_EQ(renderAll(rendering).buffer.frames, 0u);
 }
 
 /// How often a signal crosses zero upwards, per second.
@@ -173,11 +138,11 @@ TEST_F(RenderingTest, OtherRatesKeepThePitchAndTheirPlaceInTime) {
         recording.samples.push_back(
             static_cast<std::int16_t>(32767 * loud * std::sin(2 * std::numbers::pi * 440 * i / 48000)));
     }
-    auto rendering = open(recording);
+    ItemRendering& rendering = open(recording);
     for (const float rate : {0.25F, 0.4F, 0.9F, 1.1F, 1.75F, 2.0F, 3.0F, 4.0F, 7.0F, -1.5F}) {
-        rendering->seek(rate > 0 ? 0s : nanoseconds(seconds * 1'000'000'000LL), rate,
-                        {SampleFormat::f32, 48000, 1});
-        const Rendered all = renderAll(*rendering);
+        rendering.seek(rate > 0 ? 0s : nanoseconds(seconds * 1'000'000'000LL), rate,
+                       {SampleFormat::f32, 48000, 1});
+        const Rendered all = renderAll(rendering);
         const auto samples = toFloats(all.buffer, SampleFormat::f32);
         const double length = 48000.0 * seconds / std::fabs(rate);
         EXPECT_NEAR(static_cast<double>(samples.size()), length, 480) << rate;
@@ -192,7 +157,7 @@ TEST_F(RenderingTest, OtherRatesKeepThePitchAndTheirPlaceInTime) {
             for (std::size_t i = at; i < at + window; ++i)
                 peak = std::max(peak, static_cast<double>(std::fabs(samples[i])));
             if (before != 0 && (before < 0.3) != (peak < 0.3)) {
-                const double position = static_cast<double>(all.positionOf(at).count()) / 1e9;
+                const double position = static_cast<double>(all.positionOf(at)) / 1e9;
                 EXPECT_NEAR(position, std::round(position), 0.02 + 0.015 * std::fabs(rate))
                     << rate << " at " << position;
                 ++changes;
@@ -204,14 +169,14 @@ TEST_F(RenderingTest, OtherRatesKeepThePitchAndTheirPlaceInTime) {
 }
 
 TEST_F(RenderingTest, ARateBeyondAllMeansIsRenderedAsTheSpansTell) {
-    auto rendering = open(makeSweep(441'000, 44100, 2));
-    rendering->seek(0s, 1'000, sixteenBits);
-    const Rendered fast = renderAll(*rendering);
+    ItemRendering& rendering = open(makeSweep(441'000, 44100, 2));
+    rendering.seek(0s, 1'000, sixteenBits);
+    const Rendered fast = renderAll(rendering);
     EXPECT_NEAR(static_cast<double>(fast.buffer.frames), 441'000 / Stretcher::fastest, 2'000);
-    EXPECT_EQ(fast.spans.back().end, 10s);
-    rendering->seek(5s, 1e-6F, sixteenBits);
-    const Rendered slow = renderAll(*rendering, 441'000);
-    EXPECT_NEAR(static_cast<double>((slow.spans.back().end - slow.spans.front().start).count()),
+    EXPECT_EQ(fast.spans.back().end, nanoseconds(10s).count());
+    rendering.seek(5s, 1e-6F, sixteenBits);
+    const Rendered slow = renderAll(rendering, 441'000);
+    EXPECT_NEAR(static_cast<double>(slow.spans.back().end - slow.spans.front().start),
                 1e9 * static_cast<double>(slow.buffer.frames) / 44100 * Stretcher::slowest, 1e6);
 }
 
@@ -223,9 +188,9 @@ TEST_F(RenderingTest, TwoHalvesJoinToTheWholeInEveryLosslessFormat) {
             writeWav(folder / "part.wav", part);
             encodeAudio(folder / "part.wav", name == std::string("half.m4a") ? "-c:a alac" : "",
                         folder / name);
-            auto rendering = open(folder / name);
-            rendering->seek(0s, 1, sixteenBits);
-            while (rendering->render(joined, 4'000).state == RenderedSpan::State::more) {
+            ItemRendering& rendering = open(folder / name);
+            rendering.seek(0s, 1, sixteenBits);
+            while (rendering.render(joined, 4'000).state == MediaSpan::State::more) {
             }
         }
         ASSERT_EQ(joined.frames, 100'000u) << name;

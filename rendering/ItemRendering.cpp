@@ -1,43 +1,26 @@
-#include "rendering/LinuxRendering.h"
+#include "rendering/ItemRendering.h"
 
 #include <algorithm>
 #include <cassert>
 #include <cmath>
-
-#include "mediaprotocol/MediaError.h"
-#include "player/MediaTimes.h"
-#include "rendering/RemoteRendering.h"
+#include <utility>
 
 namespace tarn {
 
 namespace {
 
-using namespace std::chrono_literals;
-using std::chrono::nanoseconds;
-
 constexpr std::size_t pieceFrames = 4096;
 
-RenderingFactory::Outcome openNow(const std::shared_ptr<LinuxMediaAsset>& asset,
-                                  const DecoderModule& module) {
-    auto reader = std::make_unique<FileReader>(asset->file());
-    DecoderModule::Opened opened = module.open(*reader, asset->info());
-    if (!opened.decoder)
-        return {nullptr, std::move(opened.error)};
-    return {std::make_unique<LinuxRendering>(asset, module, std::move(reader), std::move(opened.decoder)),
-            std::nullopt};
 }
 
-} // namespace
+ItemRendering::ItemRendering(Decoder& decoder, AudioFileInfo info)
+    : decoder_(decoder), info_(std::move(info)) {}
 
-LinuxRendering::LinuxRendering(std::shared_ptr<LinuxMediaAsset> asset, const DecoderModule& module,
-                               std::unique_ptr<FileReader> reader, std::unique_ptr<Decoder> decoder)
-    : asset_(std::move(asset)), module_(module), reader_(std::move(reader)), decoder_(std::move(decoder)) {}
-
-void LinuxRendering::seek(nanoseconds position, float rate, const PcmFormat& format) {
+void ItemRendering::seek(std::chrono::nanoseconds position, float rate, const PcmFormat& format) {
     assert(rate != 0);
     if (!forward_ || format != format_) {
         backward_.reset();
-        forward_.emplace(*decoder_, module_, asset_->info(), format);
+        forward_.emplace(decoder_, info_, format);
         backward_.emplace(*forward_, format);
         format_ = format;
     }
@@ -61,22 +44,21 @@ void LinuxRendering::seek(nanoseconds position, float rate, const PcmFormat& for
     source_->seek(frame);
 }
 
-nanoseconds LinuxRendering::timeOf(double frame) const {
+std::int64_t ItemRendering::timeOf(double frame) const {
     const double latest = forward_->length() ? static_cast<double>(*forward_->length()) : frame;
-    return nanoseconds(std::llround(std::clamp(frame, 0.0, latest) * 1e9 / format_.rate));
+    return std::llround(std::clamp(frame, 0.0, latest) * 1e9 / format_.rate);
 }
 
-nanoseconds LinuxRendering::endTime() const {
+std::int64_t ItemRendering::endTime() const {
     if (speed_ < 0)
-        return 0ns;
-    const auto& info = asset_->info();
-    if (!info.frames)
+        return 0;
+    if (!info_.frames)
         return timeOf(start_ + static_cast<double>(rendered_) * speed_);
-    return nanoseconds(std::llround(static_cast<double>(*info.frames) * 1e9 / info.format.rate));
+    return std::llround(static_cast<double>(*info_.frames) * 1e9 / info_.format.rate);
 }
 
-RenderedSpan LinuxRendering::render(PcmBuffer& buffer, std::size_t maxFrames) {
-    RenderedSpan span;
+MediaSpan ItemRendering::render(PcmBuffer& buffer, std::size_t maxFrames) {
+    MediaSpan span;
     span.start = timeOf(start_ + static_cast<double>(rendered_) * speed_);
     const std::size_t before = buffer.frames;
     if (stretcher_) {
@@ -85,24 +67,23 @@ RenderedSpan LinuxRendering::render(PcmBuffer& buffer, std::size_t maxFrames) {
     } else {
         state_ = source_->read(buffer, maxFrames);
     }
-    span.frames = buffer.frames - before;
-    rendered_ += static_cast<std::int64_t>(span.frames);
+    span.frames = static_cast<std::uint32_t>(buffer.frames - before);
+    rendered_ += span.frames;
     span.end = timeOf(start_ + static_cast<double>(rendered_) * speed_);
 
     if (state_ == Decoder::State::more || taken_ < stretched_.frames)
         return span;
     if (state_ == Decoder::State::failed) {
-        span.state = RenderedSpan::State::failed;
-        span.error = source_->error();
+        span.state = MediaSpan::State::failed;
     } else {
-        span.state = RenderedSpan::State::ended;
+        span.state = MediaSpan::State::ended;
         span.end = endTime();
     }
     return span;
 }
 
 // Has the stretcher make `frames` frames, or all that the file still gives.
-void LinuxRendering::fillStretched(std::size_t frames) {
+void ItemRendering::fillStretched(std::size_t frames) {
     if (taken_ == stretched_.frames) {
         stretched_.clear();
         taken_ = 0;
@@ -124,30 +105,11 @@ void LinuxRendering::fillStretched(std::size_t frames) {
     }
 }
 
-std::size_t LinuxRendering::takeStretched(PcmBuffer& buffer, std::size_t maxFrames) {
+void ItemRendering::takeStretched(PcmBuffer& buffer, std::size_t maxFrames) {
     const std::size_t count = std::min(maxFrames, stretched_.frames - taken_);
     const std::size_t size = format_.bytesPerFrame();
     buffer.append(stretched_.bytes.data() + taken_ * size, count, size);
     taken_ += count;
-    return count;
-}
-
-RenderingFactory::Outcome LinuxRenderingFactory::open(const std::shared_ptr<MediaAsset>& asset,
-                                                      std::function<void()> goesOn) {
-    const auto file = std::dynamic_pointer_cast<LinuxMediaAsset>(asset);
-    const DecoderModule* module = loader_.load();
-    if (!file || module == nullptr)
-        return {nullptr, mediaError(MediaErrorCode::noDecoder, "The audio decoder is not installed.")};
-    if (!file->file()->remote)
-        return openNow(file, *module);
-    RemoteRendering::Options options;
-    if (file->info().frames)
-        options.length = nanosecondsOf(file->duration());
-    auto remote = RemoteRendering::create(
-        loop_, [file, module] { return openNow(file, *module); }, std::move(goesOn), options);
-    if (!remote)
-        return {nullptr, mediaError(MediaErrorCode::timedOut, "Too many files do not answer.")};
-    return {std::move(remote), std::nullopt};
 }
 
 } // namespace tarn

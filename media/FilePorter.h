@@ -1,0 +1,44 @@
+#pragma once
+
+#include <string>
+
+#include "media/ChildPool.h"
+#include "roles/Error.h"
+#include "system/HeldFile.h"
+
+namespace tarn {
+
+/// Has files opened by processes that may hang in a file system for as long as it likes. Any thread may call.
+class FilePorter {
+public:
+    explicit FilePorter(MediaProcess& process) : process_(process), porters_(process, ChildKind::porter) {}
+
+    struct Opened {
+        SharedFile file;
+        Error error; ///< meaningful when there is no file
+    };
+
+    /// Opens a regular file. Waits until the deadline at most.
+    Opened open(const std::string& path, Channel::Deadline deadline);
+
+    /// A file as it is sent to a child. Stays good as long as the file does.
+    struct Loan {
+        FileForm form = FileForm::none;
+        int descriptor = -1;
+        FileDescriptor owned; ///< is `descriptor`, when there had to be one for this
+    };
+
+    /// Never waits: a file that is only named will be opened by the time the child needs it, or not.
+    Loan lend(const HeldFile& file);
+
+    /// Lets all processes go that are not in use.
+    void clear() { porters_.clear(); }
+
+private:
+    Opened outcome(ReceivedMessage& message, const Ported& answer) const;
+
+    MediaProcess& process_;
+    ChildPool porters_;
+};
+
+} // namespace tarn
