@@ -8,7 +8,7 @@ namespace tarn {
 namespace {
 
 /// A buffer that grew beyond this for one big frame is given back.
-constexpr std::size_t keptCapacity = 4096;
+constexpr std::size_t keptUnfinishedCapacity = 4096;
 
 } // namespace
 
@@ -27,7 +27,7 @@ std::optional<std::string_view> FrameReader::take(std::span<const std::uint8_t> 
         const auto cut = static_cast<std::ptrdiff_t>(unfinished_.size() - rest.size());
         unfinished_.erase(unfinished_.begin(), unfinished_.begin() + cut);
     }
-    if (unfinished_.empty() && unfinished_.capacity() > keptCapacity)
+    if (unfinished_.empty() && unfinished_.capacity() > keptUnfinishedCapacity)
         unfinished_ = {};
     checkLeftOverFiles();
     if (broken_) {

@@ -70,7 +70,7 @@ SimulatedActivity::SimulatedActivity(SimulatedScheduler& scheduler)
     getcontext(&stack_->context);
     stack_->context.uc_stack.ss_sp = stack_->memory.get();
     stack_->context.uc_stack.ss_size = Stack::ownSize;
-    auto address = reinterpret_cast<std::uintptr_t>(this);
+    auto address = std::uint64_t{reinterpret_cast<std::uintptr_t>(this)};
     makecontext(&stack_->context, reinterpret_cast<void (*)()>(&begin), 2,
                 static_cast<unsigned>(address >> 32), static_cast<unsigned>(address));
 }
@@ -86,7 +86,7 @@ void SimulatedActivity::switchTo(SimulatedActivity& next) {
 }
 
 void SimulatedActivity::begin(unsigned high, unsigned low) {
-    auto address = static_cast<std::uintptr_t>(high) << 32 | low;
+    auto address = static_cast<std::uintptr_t>(std::uint64_t{high} << 32 | low);
     // NOLINTNEXTLINE(performance-no-int-to-ptr): makecontext passes integers only
     auto& activity = *reinterpret_cast<SimulatedActivity*>(address);
     activity.stack_->afterEntering();

@@ -78,7 +78,9 @@ RegistrationHandle SimulatedScheduler::at(Time time, const std::shared_ptr<Simul
     return std::make_unique<TimerRegistration>(std::move(timer), std::move(wanted));
 }
 
-std::size_t SimulatedScheduler::random(std::size_t limit) { return engine_() % limit; }
+std::size_t SimulatedScheduler::random(std::size_t limit) {
+    return static_cast<std::size_t>(engine_() % limit);
+}
 
 void SimulatedScheduler::yieldPoint() {
     if (current_ == activities_.front().get() || random(yieldOneIn) != 0)

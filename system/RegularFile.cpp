@@ -13,7 +13,7 @@ std::optional<std::string> readRegularFile(const std::filesystem::path& path, st
     if (error || size > sizeLimit)
         return std::nullopt;
     std::ifstream file(path, std::ios::binary);
-    std::string content(size, '\0');
+    std::string content(static_cast<std::size_t>(size), '\0');
     if (!file.read(content.data(), static_cast<std::streamsize>(size)))
         return std::nullopt;
     return content;

@@ -55,7 +55,7 @@ public:
         const std::uint32_t start = position_;
         if (!skipBytes(count))
             return std::nullopt;
-        return std::span(bytes_ + start, count);
+        return std::span(bytes_ + start, position_ - start);
     }
 
     /// A length-delimited value; none when it is not UTF-8, which is no error, or runs past the end, which

@@ -69,8 +69,14 @@ public:
     }
 
 private:
+    /// Lies within `bytes`, as the caller has seen; so nothing is lost where sizes have 32 bits.
+    static std::span<const std::uint8_t> part(std::span<const std::uint8_t> bytes, std::uint64_t offset,
+                                              std::uint64_t count) {
+        return bytes.subspan(static_cast<std::size_t>(offset), static_cast<std::size_t>(count));
+    }
+
     std::uint64_t reference(const Object& dictionary, std::uint64_t index) const {
-        return bigEndian(dictionary.content.subspan(index * referenceSize_, referenceSize_));
+        return bigEndian(part(dictionary.content, index * referenceSize_, referenceSize_));
     }
 
     std::optional<Object> object(std::uint64_t index) const {
@@ -78,11 +84,12 @@ private:
         if (index >= objectCount_ || offsetSize_ == 0 || offsetSize_ > 8 || tableOffset_ > body ||
             index >= (body - tableOffset_) / offsetSize_)
             return std::nullopt;
-        const auto offset = bigEndian(list_.subspan(tableOffset_ + index * offsetSize_, offsetSize_));
+        const auto offset = bigEndian(part(list_, tableOffset_ + index * offsetSize_, offsetSize_));
         if (offset >= body)
             return std::nullopt;
-        const unsigned marker = list_[offset];
-        Object found{marker >> 4U, marker & 0xFU, list_.subspan(offset + 1, body - offset - 1)};
+        const auto rest = part(list_, offset, body - offset);
+        const unsigned marker = rest.front();
+        Object found{marker >> 4U, marker & 0xFU, rest.subspan(1)};
         if (found.count == 0xF && !readLongCount(found))
             return std::nullopt;
         return found;
@@ -106,7 +113,7 @@ private:
             return std::string(found->content.begin(),
                                found->content.begin() + static_cast<std::ptrdiff_t>(found->count));
         if (found && found->type == utf16Type && found->count <= found->content.size() / 2)
-            return utf8Of(found->content.first(2 * found->count));
+            return utf8Of(found->content.first(static_cast<std::size_t>(2 * found->count)));
         return std::nullopt;
     }
 

@@ -129,7 +129,7 @@ TEST_F(AnApplicationRegistry, SeesWhatIsWrittenOverInPlace) {
 TEST_F(AnApplicationRegistry, AnswersFromMemoryWhileNothingChanges) {
     const fs::path entry = system.write("applications/org.example.A.desktop", entryText);
     const FileDescriptor file(open(entry.c_str(), O_RDWR | O_CLOEXEC));
-    const std::size_t length = fs::file_size(entry);
+    const auto length = static_cast<std::size_t>(fs::file_size(entry));
     EXPECT_THAT(registry.applicationName("org.example.A"), Optional(Eq("Player")));
 
     void* mapped = mmap(nullptr, length, PROT_READ | PROT_WRITE, MAP_SHARED, file.get(), 0);

@@ -53,7 +53,7 @@ public:
         }
     }
 
-    std::size_t pick(std::size_t limit) { return engine_() % limit; }
+    std::size_t pick(std::size_t limit) { return static_cast<std::size_t>(engine_() % limit); }
 
 private:
     void interrupt() {

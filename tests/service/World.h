@@ -68,7 +68,9 @@ public:
     VLLongFormAudioServer& service() { return *service_; }
     SimulatedServiceListeners& listeners() { return listeners_; }
     SimulatedNowPlayingService& nowPlaying() { return nowPlaying_; }
-    std::size_t random(std::size_t limit) { return (random_ += 0x9e3779b97f4a7c15u) / 257 % limit; }
+    std::size_t random(std::size_t limit) {
+        return static_cast<std::size_t>((random_ += 0x9e3779b97f4a7c15u) / 257 % limit);
+    }
     std::shared_ptr<SerialQueue> createQueue(const std::string& label) { return queues_.create(label); }
     Clock& clock() { return clock_; }
     void progress() { std::this_thread::yield(); }
