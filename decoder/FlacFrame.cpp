@@ -11,8 +11,6 @@ namespace {
 constexpr std::size_t fixedPart = 4;
 constexpr std::size_t streamInfoSize = 34;
 
-unsigned byteAt(std::string_view bytes, std::size_t at) { return static_cast<unsigned char>(bytes[at]); }
-
 bool checkSumHolds(std::string_view header) {
     unsigned sum = 0;
     for (const char byte : header) {

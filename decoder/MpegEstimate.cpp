@@ -10,12 +10,12 @@ namespace tarn {
 namespace {
 
 constexpr int places = 64;
-constexpr std::size_t pieceSize = 8 * 1024;
-constexpr int convincingFrames = 3;
+constexpr std::size_t sampleSize = 8 * 1024;
+constexpr int framesOfARun = 3;
 
 MpegFrameRun firstRun(std::string_view piece) {
     for (std::size_t at = piece.find('\xFF'); at != piece.npos; at = piece.find('\xFF', at + 1))
-        if (const MpegFrameRun run = readMpegFrames(piece.substr(at)); run.frames >= convincingFrames)
+        if (const MpegFrameRun run = readMpegFrames(piece.substr(at)); run.frames >= framesOfARun)
             return run;
     return {};
 }
@@ -28,7 +28,7 @@ std::optional<std::int64_t> estimateMpegSamples(ByteSource& source, std::int64_t
     double sum = 0;
     int found = 0;
     for (int place = 0; place < places; ++place) {
-        const MpegFrameRun run = firstRun(readPiece(source, begin + size / places * place, pieceSize));
+        const MpegFrameRun run = firstRun(readPiece(source, begin + size / places * place, sampleSize));
         if (run.frames == 0)
             continue;
         sum += static_cast<double>(run.samples) / static_cast<double>(run.bytes);

@@ -2,6 +2,8 @@
 
 #include <array>
 
+#include "decoder/Bytes.h"
+
 namespace tarn {
 
 namespace {
@@ -21,8 +23,6 @@ constexpr int bitrates[5][15] = {
 constexpr int mpegRates[3] = {44'100, 48'000, 32'000};
 constexpr int adtsRates[13] = {96'000, 88'200, 64'000, 48'000, 44'100, 32'000, 24'000,
                                22'050, 16'000, 12'000, 11'025, 8'000,  7'350};
-
-unsigned byteAt(std::string_view bytes, std::size_t at) { return static_cast<unsigned char>(bytes[at]); }
 
 std::optional<MpegFrame> parseAdts(std::string_view bytes) {
     const unsigned rate = byteAt(bytes, 2) >> 2 & 15;

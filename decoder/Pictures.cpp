@@ -12,7 +12,7 @@ namespace tarn {
 namespace {
 
 constexpr int mostFrames = 1'000;
-constexpr int mostTags = 8;
+constexpr int mostId3Tags = 8;
 constexpr std::int64_t largestPicture = 4 << 20;
 
 // Frames of an ID3 tag that hold pictures and other files.
@@ -116,7 +116,7 @@ bool isFront(const AVStream& stream) {
 std::vector<Patch> hidePictures(ByteSource& source, std::int64_t largest) {
     std::vector<Patch> patches;
     std::int64_t at = 0;
-    for (int i = 0; i < mostTags; ++i) {
+    for (int i = 0; i < mostId3Tags; ++i) {
         const auto tag = Id3Tag::at(source, at);
         if (!tag)
             break;

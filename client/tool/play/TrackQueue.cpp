@@ -22,7 +22,7 @@ std::string identifierOf(std::size_t number) {
     return std::to_string(::getpid()) + "-" + std::to_string(number);
 }
 
-constexpr auto ignore = [](const client::Completion&) {};
+constexpr auto ignoreOutcome = [](const client::Completion&) {};
 
 } // namespace
 
@@ -104,7 +104,7 @@ void TrackQueue::queueWhatIsReady() {
         if (!hasPlayer_)
             makePlayer(item);
         else
-            client_.appendItem(player_, item, ignore);
+            client_.appendItem(player_, item, ignoreOutcome);
     }
     skipWhatIsQueued();
 }
@@ -143,7 +143,7 @@ void TrackQueue::skip() {
 
 void TrackQueue::skipWhatIsQueued() {
     for (; skips_ > 0 && (reached_ < inQueue_ || isAtEnd()); --skips_) {
-        client_.advanceToNextItem(player_, ignore);
+        client_.advanceToNextItem(player_, ignoreOutcome);
         reached_ = std::min(reached_ + 1, inQueue_);
     }
     fill();
@@ -152,8 +152,8 @@ void TrackQueue::skipWhatIsQueued() {
 void TrackQueue::forgetBehind(std::size_t index) {
     for (; index > mostBehind; --index) {
         const auto& old = tracks_.front().track.identifier;
-        client_.destroyItem(old, ignore);
-        client_.destroyAsset(old, ignore);
+        client_.destroyItem(old, ignoreOutcome);
+        client_.destroyAsset(old, ignoreOutcome);
         tracks_.pop_front();
         --inQueue_;
         --reached_;
