@@ -8,12 +8,12 @@ namespace tarn {
 
 namespace {
 
-constexpr std::chrono::seconds patience{10};
+constexpr std::chrono::seconds examinerPatience{10};
 
 }
 
 void Examiner::run() {
-    service_.limitWaits(patience);
+    service_.limitWaits(examinerPatience);
     ReceivedMessage message;
     while (service_.receive(message, 1) == Channel::Result::done) {
         const auto request = message.as<Examine>();

@@ -13,8 +13,8 @@ namespace tarn {
 
 namespace {
 
-constexpr std::chrono::seconds patience{10};
-constexpr std::size_t mostFiles = 253; // what the system lets through at once
+constexpr std::chrono::seconds porterPatience{10};
+constexpr std::size_t mostReceivedFiles = 253; // what the system lets through at once
 
 // Asks no file system: what is known of an open file will do.
 bool isRegular(int file) {
@@ -40,7 +40,7 @@ ParkedFile openNamed(int named) {
 std::vector<FileDescriptor> receiveFiles(int connection, std::size_t bytes) {
     std::vector<char> ignored(bytes);
     iovec part{ignored.data(), ignored.size()};
-    alignas(cmsghdr) std::byte control[CMSG_SPACE(mostFiles * sizeof(int))];
+    alignas(cmsghdr) std::byte control[CMSG_SPACE(mostReceivedFiles * sizeof(int))];
     msghdr message{};
     message.msg_iov = &part;
     message.msg_iovlen = 1;
@@ -65,7 +65,7 @@ std::vector<FileDescriptor> receiveFiles(int connection, std::size_t bytes) {
 } // namespace
 
 void Porter::run() {
-    service_.limitWaits(patience);
+    service_.limitWaits(porterPatience);
     ReceivedMessage message;
     while (service_.receive(message, ReceivedMessage::mostFiles) == Channel::Result::done)
         if (!serve(message) && service_.send(ChildIsIdle{}) != Channel::Result::done)
