@@ -9,11 +9,6 @@
 namespace tarn {
 namespace {
 
-std::string contentOf(const std::filesystem::path& path) {
-    std::ifstream stream(path, std::ios::binary);
-    return {std::istreambuf_iterator<char>(stream), {}};
-}
-
 /// All that a file holds, and why no more of it; no error when it ends by itself.
 std::pair<PcmBuffer, Error> playThrough(DecodedFile& file) {
     PcmBuffer buffer = file.read(10'000'000);

@@ -13,11 +13,6 @@
 namespace tarn {
 namespace {
 
-std::string contentOf(const std::filesystem::path& path) {
-    std::ifstream stream(path, std::ios::binary);
-    return {std::istreambuf_iterator<char>(stream), {}};
-}
-
 std::string bytesOf(std::uint64_t value, int count) {
     std::string digits;
     for (int i = count - 1; i >= 0; --i)

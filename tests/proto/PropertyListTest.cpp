@@ -29,8 +29,7 @@ std::string readByPython(const Data& list) {
     const std::string command = "python3 " + script.string() + " " + input.string() + " " + output.string();
     if (std::system(command.c_str()) != 0) // NOLINT(cert-env33-c): the paths are ours
         return "unreadable";
-    std::ifstream texts(output, std::ios::binary);
-    return {std::istreambuf_iterator<char>(texts), {}};
+    return contentOf(output);
 }
 
 TEST(PropertyList, IsReadByAnIndependentReader) {

@@ -3,6 +3,7 @@
 #include <cerrno>
 #include <cstdlib>
 #include <fstream>
+#include <iterator>
 #include <system_error>
 
 namespace tarn {
@@ -27,6 +28,11 @@ std::filesystem::path TemporaryFolder::write(std::string_view name, std::string_
     if (!stream.flush())
         throw std::system_error(errno, std::generic_category(), file);
     return file;
+}
+
+std::string contentOf(const std::filesystem::path& file) {
+    std::ifstream stream(file, std::ios::binary);
+    return {std::istreambuf_iterator<char>(stream), {}};
 }
 
 } // namespace tarn

@@ -25,4 +25,7 @@ private:
     std::filesystem::path path_;
 };
 
+/// All bytes of a file; none when it cannot be read.
+std::string contentOf(const std::filesystem::path& file);
+
 } // namespace tarn
