@@ -46,8 +46,10 @@ int spawn(const std::string& path, int control, pid_t& process) {
 
 } // namespace
 
+std::optional<std::string> mediaProgram() { return findBesideModules(program); }
+
 std::shared_ptr<MediaParent> MediaParent::start() {
-    const auto path = findBesideModules(program);
+    const auto path = mediaProgram();
     auto ends = Channel::makePair();
     pid_t process = -1;
     int error = path ? EMFILE : ENOENT;

@@ -4,11 +4,16 @@
 
 #include <cstdint>
 #include <memory>
+#include <optional>
 #include <span>
+#include <string>
 
 #include "mediaprotocol/Channel.h"
 
 namespace tarn {
+
+/// Where the program that touches media is installed; none when it is not.
+std::optional<std::string> mediaProgram();
 
 /// The running program that touches media, from its start to its end. Its children end with it.
 ///

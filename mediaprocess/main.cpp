@@ -43,7 +43,7 @@ std::uint32_t locksOfAChild() {
 
 int main(int argc, char** argv) {
     if (argc == 2 && argv[1] == std::string_view("--lock-down")) {
-        std::cout << tarn::lockDownText(locksOfAChild()) << "\n";
+        std::cout << "What decodes media is locked down: " << tarn::lockDownText(locksOfAChild()) << "\n";
         return EXIT_SUCCESS;
     }
     if (argc > 1 || !isSocket(serviceSocket)) {

@@ -2,8 +2,8 @@
 
 #include "media/AssetOpener.h"
 #include "media/ChildRenderingFactory.h"
+#include "media/MediaUse.h"
 #include "player/PlaybackEngine.h"
-#include "service/IdleHeap.h"
 #include "sound/LinuxAudioSession.h"
 #include "sound/SystemOutput.h"
 #include "system/FileAccess.h"
@@ -34,8 +34,10 @@ public:
     MediaAssetOutcome openAsset(const std::string& URL) override;
 
 private:
+    void giveBack();
+
     const AssetOpener opener_;
-    IdleHeap heap_{LinuxMediaParts::loop};
+    MediaUse use_;
 };
 
 } // namespace tarn

@@ -1,3 +1,5 @@
+#include <unistd.h>
+
 #include <cstdlib>
 #include <exception>
 #include <iostream>
@@ -5,6 +7,7 @@
 #include <string_view>
 
 #include "log/SystemSink.h"
+#include "media/MediaParent.h"
 #include "service/LinuxPlatform.h"
 #include "service/LongFormAudioServer.h"
 #include "system/Process.h"
@@ -17,6 +20,15 @@ Plays audio files in the background for the programs that connect to it. It list
 "ostrel.tarnd" in $XDG_RUNTIME_DIR, or in /run without it, unless the service manager hands it over.
 There is nothing to configure. To play something: tarnctl play FILE
 )";
+
+/// Also what holds those who read media: the program that does can tell.
+int tellVersion() {
+    std::cout << "tarnd " TARN_VERSION << std::endl;
+    if (const auto path = tarn::mediaProgram())
+        ::execl(path->c_str(), path->c_str(), "--lock-down", nullptr);
+    std::cout << "The program that decodes media is not installed.\n";
+    return EXIT_FAILURE;
+}
 
 int runService() {
     tarn::prepareSignals();
@@ -35,8 +47,7 @@ int runService() {
 int main(int argc, char** argv) {
     const std::string_view option = argc > 1 ? argv[1] : "";
     if (argc == 2 && option == "--version") {
-        std::cout << "tarnd " TARN_VERSION "\n";
-        return EXIT_SUCCESS;
+        return tellVersion();
     }
     if (argc > 1) {
         const bool wantsHelp = argc == 2 && option == "--help";

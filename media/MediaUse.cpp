@@ -1,6 +1,4 @@
-#include "service/IdleHeap.h"
-
-#include <malloc.h>
+#include "media/MediaUse.h"
 
 #include <chrono>
 #include <mutex>
@@ -10,13 +8,13 @@ namespace tarn {
 
 namespace {
 
-constexpr std::chrono::milliseconds patience{200}; // the rest of a client goes, or the next one comes
+constexpr std::chrono::milliseconds untilUnused{200};
 
 }
 
-class IdleHeap::Count {
+class MediaUse::Count {
 public:
-    explicit Count(EventLoop& loop) : loop_(&loop) {}
+    Count(EventLoop& loop, std::function<void()> unused) : loop_(&loop), unused_(std::move(unused)) {}
 
     void begin() {
         RegistrationHandle dropped; // behind the lock
@@ -28,7 +26,7 @@ public:
     void end() {
         std::lock_guard lock(mutex_);
         if (--assets_ == 0 && loop_ != nullptr)
-            timer_ = loop_->at(loop_->now() + patience, [] { malloc_trim(0); });
+            timer_ = loop_->at(loop_->now() + untilUnused, unused_);
     }
 
     void close() {
@@ -41,15 +39,17 @@ public:
 private:
     std::mutex mutex_;
     EventLoop* loop_; // null when it is gone
+    const std::function<void()> unused_;
     std::size_t assets_ = 0;
     RegistrationHandle timer_;
 };
 
-IdleHeap::IdleHeap(EventLoop& loop) : count_(std::make_shared<Count>(loop)) {}
+MediaUse::MediaUse(EventLoop& loop, std::function<void()> unused)
+    : count_(std::make_shared<Count>(loop, std::move(unused))) {}
 
-IdleHeap::~IdleHeap() { count_->close(); }
+MediaUse::~MediaUse() { count_->close(); }
 
-std::shared_ptr<MediaAsset> IdleHeap::counted(std::shared_ptr<MediaAsset> asset) {
+std::shared_ptr<MediaAsset> MediaUse::counted(std::shared_ptr<MediaAsset> asset) {
     struct Use {
         Use(std::shared_ptr<MediaAsset> counted, std::shared_ptr<Count> by)
             : asset(std::move(counted)), count(std::move(by)) {

@@ -2,7 +2,7 @@
 
 #include <optional>
 
-#include "service/IdleHeap.h"
+#include "media/MediaUse.h"
 
 namespace tarn {
 namespace {
@@ -36,20 +36,20 @@ private:
     const std::vector<MediaMetadataItem> metadata_{};
 };
 
-TEST(IdleHeap, IsTidiedOnlyWhenTheLastAssetHasGone) {
+TEST(MediaUse, EndsWithTheLastAsset) {
     CountingLoop loop;
-    std::optional<IdleHeap> heap(loop);
+    std::optional<MediaUse> use(std::in_place, loop, [] {});
     const auto plain = std::make_shared<NoAsset>();
-    auto first = heap->counted(plain);
-    auto second = heap->counted(std::make_shared<NoAsset>());
+    auto first = use->counted(plain);
+    auto second = use->counted(std::make_shared<NoAsset>());
     EXPECT_EQ(std::dynamic_pointer_cast<NoAsset>(first), plain) << "it is the asset itself";
     first.reset();
     EXPECT_EQ(loop.timers, 0);
     second.reset();
     EXPECT_EQ(loop.timers, 1);
-    first = heap->counted(plain);
+    first = use->counted(plain);
     EXPECT_EQ(loop.timers, 0) << "another client has come";
-    heap.reset();
+    use.reset();
     first.reset();
     EXPECT_EQ(loop.timers, 0) << "an asset that outlives the engine asks nothing of it";
 }
