@@ -39,7 +39,8 @@ Outcome readIn(std::span<const std::uint8_t> stream, std::size_t pieceLength, Fr
     for (std::size_t at = 0; at < stream.size() && outcome.broken.empty(); at += pieceLength) {
         std::vector<ReceivedFile> files;
         if (at == 0 && withFile)
-            files.emplace_back(FileDescriptor(::open("/dev/null", O_RDONLY | O_CLOEXEC)));
+            files.push_back(
+                {{FileForm::open, FileDescriptor(::open("/dev/null", O_RDONLY | O_CLOEXEC))}, {}});
         const auto piece = stream.subspan(at, std::min(pieceLength, stream.size() - at));
         outcome.broken = reader.take(piece, std::move(files), outcome.frames).value_or("");
         if (reader.unfinishedBytes() > FrameHeader::size + FrameHeader::largestBody)

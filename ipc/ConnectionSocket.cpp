@@ -13,7 +13,7 @@ constexpr std::size_t enoughForOneWrite = 65'536;
 
 } // namespace
 
-ConnectionSocket::ConnectionSocket(FileDescriptor socket, Poller& poller, std::uint64_t key)
+ConnectionSocket::ConnectionSocket(FileDescriptor socket, SocketPoller& poller, std::uint64_t key)
     : socket_(std::move(socket)), poller_(poller), key_(key) {}
 
 void ConnectionSocket::send(FrameKind kind, std::uint64_t callId, std::span<const std::uint8_t> body) {
@@ -97,8 +97,26 @@ void ConnectionSocket::startReading() {
     showInterest();
 }
 
+bool ConnectionSocket::beginArrival(int files) {
+    std::lock_guard lock(mutex_);
+    filesArrive_ = poller_.add(files, key_ | arrivalKey, EPOLLIN);
+    if (filesArrive_)
+        poller_.remove(socket_.get());
+    return filesArrive_;
+}
+
+void ConnectionSocket::endArrival(int files) {
+    std::lock_guard lock(mutex_);
+    if (!std::exchange(filesArrive_, false))
+        return;
+    poller_.remove(files);
+    if (!poller_.add(socket_.get(), key_, EPOLLRDHUP)) // the system has no more: as if the peer were gone
+        ::shutdown(socket_.get(), SHUT_RDWR);
+    showInterest();
+}
+
 void ConnectionSocket::showInterest() {
-    if (!socket_)
+    if (!socket_ || filesArrive_)
         return;
     std::uint32_t events = EPOLLRDHUP;
     if (reading_ && !paused_)

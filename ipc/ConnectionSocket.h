@@ -8,8 +8,8 @@
 #include <string_view>
 
 #include "ipc/Frame.h"
-#include "ipc/Poller.h"
 #include "ipc/SendBuffer.h"
+#include "ipc/SocketPoller.h"
 #include "system/FileDescriptor.h"
 #include "threads/Burst.h"
 
@@ -26,8 +26,11 @@ public:
     static constexpr std::uint32_t mostUnfinishedCalls = 1'024;
     static constexpr std::size_t mostUnfinishedBytes = std::size_t{4} * 1'048'576;
 
+    /// Beside a connection's own key: word of its files. No connection has a key with this bit.
+    static constexpr std::uint64_t arrivalKey = std::uint64_t{1} << 63;
+
     /// The poller outlives close().
-    ConnectionSocket(FileDescriptor socket, Poller& poller, std::uint64_t key);
+    ConnectionSocket(FileDescriptor socket, SocketPoller& poller, std::uint64_t key);
 
     /// Any thread. What is sent inside a burst leaves at its end. Dropped once it is closed.
     void send(FrameKind kind, std::uint64_t callId, std::span<const std::uint8_t> body);
@@ -46,6 +49,11 @@ public:
     [[nodiscard]] bool watch();
     void startReading();
     void beginCall(std::size_t bytes);
+
+    /// Watches `files` in place of the socket, under the key with arrivalKey: nothing is read meanwhile, and
+    /// a hang-up is seen later. False when the system cannot.
+    [[nodiscard]] bool beginArrival(int files);
+    void endArrival(int files);
 
     /// Stops reading when too many calls are unfinished, until enough of them are finished.
     void limitReading();
@@ -68,13 +76,14 @@ private:
     FileDescriptor socket_;
     SendBuffer waiting_;
     bool reading_ = false;
+    bool filesArrive_ = false;
     bool socketIsFull_ = false;
     bool overflowed_ = false;
 
     std::atomic<std::uint32_t> unfinishedCalls_ = 0;
     std::atomic<std::size_t> unfinishedBytes_ = 0;
     std::atomic<bool> paused_ = false;
-    Poller& poller_;
+    SocketPoller& poller_;
     const std::uint64_t key_;
 };
 

@@ -6,8 +6,8 @@
 #include <optional>
 #include <span>
 
-#include "ipc/ReceivedFile.h"
 #include "roles/Data.h"
+#include "system/FileReceiver.h"
 
 namespace tarn {
 

@@ -4,34 +4,38 @@
 #include <cstdint>
 #include <memory>
 #include <span>
-#include <vector>
-
-#include "ipc/ReceivedFile.h"
 
 namespace tarn {
 
 /// What one read of a socket gave.
 struct Received {
-    enum class State { open, nothingNow, ended, truncatedFiles };
+    enum class State {
+        open,
+        nothingNow,
+        ended,
+        withFiles, ///< files belong to the bytes; both are still in the socket
+    };
 
     State state = State::open;
     std::span<const std::uint8_t> bytes; // good until the next read
-    std::vector<ReceivedFile> files;     // close-on-exec
 };
 
-/// Reads sockets, with the files that come along. Belongs to one thread.
+/// Reads sockets. Belongs to one thread. No file that comes along is ever opened here.
 class Receiver {
 public:
-    enum class Wait { never, forFirstByte };
+    /// For a socket on which no files are expected: one that comes is let go, and is taken for the end.
+    Received receive(int socket);
 
-    /// Whatever files came are in the result or closed.
-    Received receive(int socket, Wait wait = Wait::never);
+    /// For a socket on which files may come. They are left there, with the bytes that they belong to.
+    Received receiveUpToFiles(int socket);
 
-    /// For a socket that is about to be closed: ends its receiving side and drops what came and was not read,
-    /// as the files among it would else be closed with the socket, by the thread that does that.
-    void drain(int socket);
+    /// For a socket that is about to be closed: ends its receiving side and drops what came and was not read.
+    /// True when files are left in it: closing it may take as long as closing them does.
+    [[nodiscard]] bool drain(int socket);
 
 private:
+    Received read(int socket, int flags);
+
     static constexpr std::size_t size = 65'536;
 
     std::unique_ptr<std::uint8_t[]> buffer_ = std::make_unique_for_overwrite<std::uint8_t[]>(size);

@@ -55,8 +55,8 @@ private:
 };
 
 SocketConnection::SocketConnection(std::shared_ptr<ConnectionSocket> socket, std::uint64_t key,
-                                   TokenTable& tokens)
-    : socket_(std::move(socket)), key_(key), tokens_(tokens) {}
+                                   TokenTable& tokens, FileReceiver& files)
+    : socket_(std::move(socket)), key_(key), tokens_(tokens), files_(files) {}
 
 void SocketConnection::setExportedObject(std::shared_ptr<VLLongFormAudioServerProtocol> object) {
     exportedObject_ = std::move(object);
@@ -98,22 +98,49 @@ bool SocketConnection::handle(std::uint32_t events, Receiver& receiver) {
 void SocketConnection::handleHangUp(Receiver& receiver) {
     if (const auto failure = socket_->failure(); !failure.empty())
         return interrupt(failure);
-    if (!resumed_)
+    if (!resumed_ || arrival_)
         loss_ = Loss::invalidation;
-    while (loss_ == Loss::none)
+    while (loss_ == Loss::none) {
         read(receiver);
+        if (arrival_) // of one that is gone: nobody waits for its files
+            loss_ = Loss::invalidation;
+    }
 }
 
 void SocketConnection::read(Receiver& receiver) {
-    auto received = receiver.receive(socket_->socket());
-    if (received.state == Received::State::truncatedFiles)
-        return interrupt("its files could not be taken");
+    const Received received = receiver.receiveUpToFiles(socket_->socket());
+    if (received.state == Received::State::withFiles)
+        return beginArrival(received.bytes);
     if (received.state == Received::State::ended)
         loss_ = Loss::invalidation;
-    if (received.bytes.empty())
-        return;
+    if (!received.bytes.empty())
+        take(received.bytes, {});
+}
+
+void SocketConnection::beginArrival(std::span<const std::uint8_t> bytes) {
+    arrival_ = files_.receive(socket_->socket(), bytes.size());
+    if (!arrival_ || !socket_->beginArrival(arrival_->descriptor()))
+        return interrupt("its files could not be taken");
+    arrivingBytes_.assign(bytes.begin(), bytes.end());
+}
+
+bool SocketConnection::finishArrival() {
+    auto files = arrival_ ? arrival_->take() : std::nullopt;
+    if (!files)
+        return true;
+    socket_->endArrival(arrival_->descriptor());
+    arrival_.reset();
+    if (files->empty())
+        interrupt("its files could not be taken");
+    else
+        take(std::exchange(arrivingBytes_, {}), *std::move(files));
+    socket_->limitReading();
+    return loss_ == Loss::none;
+}
+
+void SocketConnection::take(std::span<const std::uint8_t> bytes, std::vector<ReceivedFile> files) {
     std::vector<Frame> frames;
-    const auto broken = reader_.take(received.bytes, std::move(received.files), frames);
+    const auto broken = reader_.take(bytes, std::move(files), frames);
     deliver(std::move(frames));
     if (broken)
         interrupt(*broken);
@@ -185,7 +212,11 @@ void SocketConnection::reportLoss(Receiver& receiver) {
 }
 
 void SocketConnection::close(Receiver& receiver) {
-    receiver.drain(socket_->socket());
+    if (receiver.drain(socket_->socket()))
+        files_.drop(socket_->socket());
+    if (arrival_)
+        socket_->endArrival(arrival_->descriptor());
+    arrival_.reset();
     socket_->close();
     tokens_.forget(key_);
     // They hold the service, which may hold this connection.

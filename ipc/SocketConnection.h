@@ -21,7 +21,8 @@ namespace tarn {
 /// The listener holds it until its peer goes, and then asks it to report the loss.
 class SocketConnection final : public ServiceConnection, private VLLongFormAudioClientProtocol {
 public:
-    SocketConnection(std::shared_ptr<ConnectionSocket> socket, std::uint64_t key, TokenTable& tokens);
+    SocketConnection(std::shared_ptr<ConnectionSocket> socket, std::uint64_t key, TokenTable& tokens,
+                     FileReceiver& files);
 
     void setExportedObject(std::shared_ptr<VLLongFormAudioServerProtocol> object) override;
     void resume() override;
@@ -30,8 +31,11 @@ public:
     VLLongFormAudioClientProtocol& remoteObjectProxy() override { return *this; }
 
     /// Reads and writes what `events` of the poller call for. Once the peer is gone everything that it has
-    /// sent is read. False when the connection is lost.
+    /// sent is read, up to the first file. False when the connection is lost.
     [[nodiscard]] bool handle(std::uint32_t events, Receiver& receiver);
+
+    /// There may be word of the files that it waits for. False when the connection is lost.
+    [[nodiscard]] bool finishArrival();
 
     /// Ends the connection with one line in the log.
     void interrupt(std::string_view reason);
@@ -56,6 +60,8 @@ private:
     void receiveData(const Data& data) override;
     void handleHangUp(Receiver& receiver);
     void read(Receiver& receiver);
+    void beginArrival(std::span<const std::uint8_t> bytes);
+    void take(std::span<const std::uint8_t> bytes, std::vector<ReceivedFile> files);
     void deliver(std::vector<Frame> frames);
     void takeExtension(Frame frame);
     void beginNews(std::uint64_t callId);
@@ -63,6 +69,7 @@ private:
     const std::shared_ptr<ConnectionSocket> socket_;
     const std::uint64_t key_;
     TokenTable& tokens_;
+    FileReceiver& files_;
     FrameReader reader_{FrameReader::Sender::client};
     std::shared_ptr<VLLongFormAudioServerProtocol> exportedObject_;
     std::function<void()> interruptionHandler_;
@@ -71,6 +78,10 @@ private:
     bool wantsNews_ = false;
     std::optional<FrameKind> displaced_;
     Loss loss_ = Loss::none;
+
+    // While files are on their way nothing else is read.
+    std::unique_ptr<FileReceiver::Arrival> arrival_;
+    Data arrivingBytes_; // that the files belong to
     LiveObject<"connection"> live_;
 };
 

@@ -21,8 +21,8 @@ FileDescriptor openSpare() { return FileDescriptor(::open("/dev/null", O_RDONLY 
 
 } // namespace
 
-SocketListener::SocketListener(FileDescriptor listeningSocket, TokenTable& tokens)
-    : listeningSocket_(std::move(listeningSocket)), spare_(openSpare()), tokens_(tokens) {}
+SocketListener::SocketListener(FileDescriptor listeningSocket, TokenTable& tokens, FileReceiver& files)
+    : listeningSocket_(std::move(listeningSocket)), spare_(openSpare()), tokens_(tokens), files_(files) {}
 
 SocketListener::~SocketListener() {
     thread_.request_stop();
@@ -58,11 +58,12 @@ void SocketListener::run(const std::stop_token& stop) {
 }
 
 void SocketListener::serve(std::uint64_t key, std::uint32_t events) {
-    const auto found = connections_.find(key);
+    const auto found = connections_.find(key & ~ConnectionSocket::arrivalKey);
     if (found == connections_.end())
         return;
     const auto connection = found->second;
-    bool lives = connection->handle(events, receiver_);
+    const bool isArrival = (key & ConnectionSocket::arrivalKey) != 0;
+    bool lives = isArrival ? connection->finishArrival() : connection->handle(events, receiver_);
     if (lives)
         lives = !isOverLimit(*connection);
     if (lives)
@@ -87,7 +88,7 @@ void SocketListener::accept() {
     if (!socket)
         return;
     if (!mayBeOffered(socket.get()))
-        return receiver_.drain(socket.get());
+        return letGo(socket.get());
     toldOfRefusal_ = false;
     offer(std::move(socket));
 }
@@ -137,12 +138,18 @@ void SocketListener::refuse(std::string_view reason) {
         SystemLog::error(__func__, __LINE__, "%{public}s:%d: refused a client: %{public}s", reason);
 }
 
+/// For a socket that is about to be closed without having been served.
+void SocketListener::letGo(int socket) {
+    if (receiver_.drain(socket))
+        files_.drop(socket);
+}
+
 void SocketListener::offer(FileDescriptor descriptor) {
     const auto key = nextKey_++;
     const auto socket = std::make_shared<ConnectionSocket>(std::move(descriptor), poller_, key);
     if (!socket->watch())
         return refuse("the system cannot watch it");
-    const auto connection = std::make_shared<SocketConnection>(socket, key, tokens_);
+    const auto connection = std::make_shared<SocketConnection>(socket, key, tokens_, files_);
     connections_.emplace(key, connection);
     if (delegate_->listenerShouldAcceptNewConnection(*this, connection))
         return displaceOthers(connection.get(), FrameKind::takenOver);

@@ -6,9 +6,9 @@
 #include <string_view>
 #include <thread>
 
-#include "ipc/Poller.h"
 #include "ipc/Receiver.h"
 #include "ipc/SocketConnection.h"
+#include "ipc/SocketPoller.h"
 #include "ipc/TokenTable.h"
 #include "roles/ServiceListener.h"
 #include "system/FileDescriptor.h"
@@ -26,8 +26,8 @@ public:
     /// Parts of frames that all clients together may leave unfinished; who goes beyond is cut off.
     static constexpr std::size_t mostUnfinishedBytes = std::size_t{16} * 1'048'576;
 
-    /// The token table outlives the listener. Throws std::system_error.
-    SocketListener(FileDescriptor listeningSocket, TokenTable& tokens);
+    /// The token table and the receiver outlive the listener. Throws std::system_error.
+    SocketListener(FileDescriptor listeningSocket, TokenTable& tokens, FileReceiver& files);
     ~SocketListener() override;
 
     void setDelegate(ServiceListenerDelegate* delegate) override { delegate_ = delegate; }
@@ -48,6 +48,7 @@ private:
     FileDescriptor takeFromBacklog();
     void serveHangUps();
     bool mayBeOffered(int socket);
+    void letGo(int socket);
     void refuse(std::string_view reason);
     void offer(FileDescriptor descriptor);
     void displaceOthers(const SocketConnection* current, FrameKind news);
@@ -55,8 +56,9 @@ private:
     FileDescriptor listeningSocket_;
     FileDescriptor spare_; // given up for a moment when there are no descriptors left, to refuse a client
     TokenTable& tokens_;
+    FileReceiver& files_;
     ServiceListenerDelegate* delegate_ = nullptr;
-    Poller poller_;
+    SocketPoller poller_;
     Receiver receiver_;
     Connections connections_;
     std::uint64_t nextKey_ = firstConnectionKey;

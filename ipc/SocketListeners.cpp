@@ -7,7 +7,7 @@ namespace tarn {
 std::unique_ptr<ServiceListener> SocketListeners::createWithServiceName(const std::string& name) {
     return sockets_.withLocked([&](auto& sockets) {
         auto& socket = sockets.emplace_back(std::make_unique<ListeningSocket>(name));
-        return std::make_unique<SocketListener>(socket->take(), tokens_);
+        return std::make_unique<SocketListener>(socket->take(), tokens_, files_);
     });
 }
 

@@ -14,7 +14,8 @@ namespace tarn {
 /// Makes listeners on Unix sockets. Outlives them; owns their socket files.
 class SocketListeners final : public ServiceListeners {
 public:
-    explicit SocketListeners(TokenTable& tokens) : tokens_(tokens) {}
+    /// Both outlive the listeners.
+    SocketListeners(TokenTable& tokens, FileReceiver& files) : tokens_(tokens), files_(files) {}
 
     /// Throws std::system_error, or std::runtime_error when another process serves the name.
     std::unique_ptr<ServiceListener> createWithServiceName(const std::string& name) override;
@@ -24,6 +25,7 @@ public:
 
 private:
     TokenTable& tokens_;
+    FileReceiver& files_;
     MutexProtected<std::vector<std::unique_ptr<ListeningSocket>>> sockets_;
 };
 

@@ -7,9 +7,9 @@
 #include <string_view>
 #include <utility>
 
-#include "ipc/ReceivedFile.h"
 #include "roles/SandboxExtension.h"
 #include "system/FileAccess.h"
+#include "system/FileReceiver.h"
 #include "threads/MutexProtected.h"
 
 namespace tarn {
@@ -35,7 +35,7 @@ public:
 private:
     struct GrantedFile {
         std::string path;
-        ReceivedFile file;
+        SharedFile file;
     };
     using Waiting = std::map<std::string, GrantedFile, std::less<>>; // by token
 

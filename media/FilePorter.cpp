@@ -45,7 +45,19 @@ FilePorter::Opened FilePorter::open(const std::string& path, Channel::Deadline d
     default:
         return failed(MediaErrorCode::notRegularFile, "That is not a regular file.");
     }
-    return {std::make_shared<HeldFile>(HeldFile{answer->form, message.takeFile()}), {}};
+    auto held = heldFile(message, *answer);
+    if (!held || held->form == FileForm::parked)
+        return failed(MediaErrorCode::cannotOpen, "The file could not be opened.");
+    return {std::make_shared<HeldFile>(*std::move(held)), {}};
+}
+
+std::optional<HeldFile> FilePorter::heldFile(ReceivedMessage& message, const Ported& answer) {
+    HeldFile held{answer.form, message.takeFile()};
+    const bool known =
+        held.form == FileForm::open || held.form == FileForm::parked || held.form == FileForm::path;
+    if (!known || !held.descriptor)
+        return std::nullopt;
+    return held;
 }
 
 FilePorter::Loan FilePorter::lend(const HeldFile& file) {

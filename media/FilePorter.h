@@ -31,12 +31,16 @@ public:
     /// Never waits: a file that is only named will be opened by the time the child needs it, or not.
     Loan lend(const HeldFile& file);
 
+    /// What came with the answer: none unless it is a file that can be held.
+    static std::optional<HeldFile> heldFile(ReceivedMessage& message, const Ported& answer);
+
+    /// For what else they can do.
+    ChildPool& porters() { return porters_; }
+
     /// Lets all processes go that are not in use.
     void clear() { porters_.clear(); }
 
 private:
-    Opened outcome(ReceivedMessage& message, const Ported& answer) const;
-
     MediaProcess& process_;
     ChildPool porters_;
 };

@@ -4,12 +4,12 @@
 
 namespace tarn {
 
-LinuxMediaEngine::LinuxMediaEngine(NotificationCenter& notifications, FileAccess& files,
+LinuxMediaEngine::LinuxMediaEngine(NotificationCenter& notifications, FileAccess& access,
                                    LinuxAudioSession& session)
     : LinuxMediaParts(session),
       PlaybackEngine(LinuxMediaParts::loop, LinuxMediaParts::renderings, LinuxMediaParts::outputs,
                      notifications),
-      opener_(files, porter, examiner),
+      opener_(access, porter, examiner),
       use_(LinuxMediaParts::loop, [this] { giveBack(); }) {}
 
 LinuxMediaEngine::~LinuxMediaEngine() { LinuxMediaParts::loop.stop(); }

@@ -2,6 +2,7 @@
 
 #include "media/AssetOpener.h"
 #include "media/ChildRenderingFactory.h"
+#include "media/ClientFiles.h"
 #include "media/MediaUse.h"
 #include "player/PlaybackEngine.h"
 #include "sound/LinuxAudioSession.h"
@@ -19,6 +20,7 @@ struct LinuxMediaParts {
     FileExaminer examiner{process, porter};
     EventLoopThread loop;
     ChildRenderingFactory renderings{loop, process, porter};
+    ClientFiles files{porter, loop};
     SystemOutputFactory outputs;
 };
 
@@ -26,10 +28,13 @@ struct LinuxMediaParts {
 class LinuxMediaEngine final : private LinuxMediaParts, public PlaybackEngine {
 public:
     /// All of these outlive the engine.
-    LinuxMediaEngine(NotificationCenter& notifications, FileAccess& files, LinuxAudioSession& session);
+    LinuxMediaEngine(NotificationCenter& notifications, FileAccess& access, LinuxAudioSession& session);
 
     /// Silences what still plays.
     ~LinuxMediaEngine() override;
+
+    /// Receives what clients hand over.
+    FileReceiver& clientFiles() { return LinuxMediaParts::files; }
 
     MediaAssetOutcome openAsset(const std::string& URL) override;
 

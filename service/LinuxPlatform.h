@@ -29,9 +29,9 @@ struct LinuxPlatform {
     const std::unique_ptr<Localization> localization;
     LocalNotificationCenter notifications;
     TokenTable tokens;
-    SocketListeners listeners{tokens};
     LinuxAudioSession audioSession{notifications};
     LinuxMediaEngine media{notifications, tokens, audioSession};
+    SocketListeners listeners{tokens, media.clientFiles()};
     const std::unique_ptr<DesktopApplicationRegistry> applications;
     LinuxMediaControls controls;
 };

@@ -48,9 +48,9 @@ struct BarePlatform {
     const std::unique_ptr<Localization> localization = systemLocalization();
     LocalNotificationCenter notifications;
     TokenTable tokens;
-    SocketListeners listeners{tokens};
     LinuxAudioSession audioSession{notifications};
     LinuxMediaEngine media{notifications, tokens, audioSession};
+    SocketListeners listeners{tokens, media.clientFiles()};
     RemoteTargets remoteCommands;
     NoScreen nowPlaying;
     NoApplications applications;

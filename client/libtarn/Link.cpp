@@ -168,16 +168,15 @@ void Link::serveSocket(std::uint32_t events) {
 
 void Link::read() {
     const auto connection = connectionCount_;
-    auto received = receiver_.receive(socket_.get());
+    const Received received = receiver_.receive(socket_.get());
     std::vector<Frame> frames;
-    const auto broken = reader_->take(received.bytes, std::move(received.files), frames);
+    const auto broken = reader_->take(received.bytes, {}, frames);
     for (const auto& frame : frames) {
         if (connection != connectionCount_ || !isConnected())
             return; // a handler has seen to that
         deliver(frame);
     }
-    const bool ended =
-        received.state == Received::State::ended || received.state == Received::State::truncatedFiles;
+    const bool ended = received.state == Received::State::ended;
     if (connection == connectionCount_ && (broken || ended))
         end(true);
 }

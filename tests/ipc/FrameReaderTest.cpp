@@ -15,12 +15,10 @@ namespace {
 using Sender = FrameReader::Sender;
 using testing::HasSubstr;
 
-ReceivedFile anyFile() { return ReceivedFile(FileDescriptor(::open("/dev/null", O_RDONLY | O_CLOEXEC))); }
-
 std::vector<ReceivedFile> files(int count) {
     std::vector<ReceivedFile> made(static_cast<std::size_t>(count));
     for (auto& file : made)
-        file = anyFile();
+        file.file = {FileForm::open, FileDescriptor(::open("/dev/null", O_RDONLY | O_CLOEXEC))};
     return made;
 }
 

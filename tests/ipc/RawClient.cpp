@@ -71,7 +71,7 @@ std::optional<Frame> RawClient::receive() {
             return std::nullopt;
         auto received = receiver.receive(socket_.get());
         ended_ = received.state == Received::State::ended;
-        EXPECT_FALSE(reader_.take(received.bytes, std::move(received.files), frames_));
+        EXPECT_FALSE(reader_.take(received.bytes, {}, frames_));
     }
     if (frames_.empty())
         return std::nullopt;

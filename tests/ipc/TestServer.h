@@ -6,6 +6,8 @@
 #include <utility>
 
 #include "ipc/SocketListeners.h"
+#include "media/ClientFiles.h"
+#include "player/EventLoopThread.h"
 #include "tests/ipc/FakeService.h"
 #include "tests/ipc/RawClient.h"
 #include "tests/support/CapturedLog.h"
@@ -32,7 +34,11 @@ public:
 
 private:
     TemporaryFolder folder_;
-    SocketListeners listeners_{tokens};
+    MediaProcess process_;
+    FilePorter porter_{process_};
+    EventLoopThread loop_;
+    ClientFiles files_{porter_, loop_};
+    SocketListeners listeners_{tokens, files_};
     std::unique_ptr<ServiceListener> listener_;
 };
 

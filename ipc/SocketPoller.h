@@ -14,13 +14,13 @@ namespace tarn {
 ///
 /// Every watched descriptor has a key by which its events are known. Events are EPOLLIN and the like,
 /// reported again for as long as they last.
-class Poller {
+class SocketPoller {
 public:
     /// The key of wake(); no watched descriptor has it.
     static constexpr std::uint64_t wakeKey = 0;
 
     /// Throws std::system_error.
-    Poller();
+    SocketPoller();
 
     /// False when the system cannot watch another one.
     [[nodiscard]] bool add(int descriptor, std::uint64_t key, std::uint32_t events);

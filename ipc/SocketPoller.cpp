@@ -1,4 +1,4 @@
-#include "ipc/Poller.h"
+#include "ipc/SocketPoller.h"
 
 #include <sys/eventfd.h>
 
@@ -25,32 +25,32 @@ FileDescriptor checked(int descriptor, const char* what) {
 
 } // namespace
 
-Poller::Poller()
+SocketPoller::SocketPoller()
     : epoll_(checked(epoll_create1(EPOLL_CLOEXEC), "epoll_create1")),
       wakeUp_(checked(eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK), "eventfd")) {
     if (!add(wakeUp_.get(), wakeKey, EPOLLIN))
         throw std::system_error(errno, std::generic_category(), "epoll_ctl");
 }
 
-bool Poller::add(int descriptor, std::uint64_t key, std::uint32_t events) {
+bool SocketPoller::add(int descriptor, std::uint64_t key, std::uint32_t events) {
     epoll_event event = eventOf(key, events);
     return epoll_ctl(epoll_.get(), EPOLL_CTL_ADD, descriptor, &event) == 0;
 }
 
-void Poller::change(int descriptor, std::uint64_t key, std::uint32_t events) {
+void SocketPoller::change(int descriptor, std::uint64_t key, std::uint32_t events) {
     epoll_event event = eventOf(key, events);
     [[maybe_unused]] const int result = epoll_ctl(epoll_.get(), EPOLL_CTL_MOD, descriptor, &event);
     assert(result == 0);
 }
 
-void Poller::remove(int descriptor) {
+void SocketPoller::remove(int descriptor) {
     [[maybe_unused]] const int result = epoll_ctl(epoll_.get(), EPOLL_CTL_DEL, descriptor, nullptr);
     assert(result == 0);
 }
 
-void Poller::wake() { eventfd_write(wakeUp_.get(), 1); }
+void SocketPoller::wake() { eventfd_write(wakeUp_.get(), 1); }
 
-std::span<const epoll_event> Poller::wait() {
+std::span<const epoll_event> SocketPoller::wait() {
     int count = 0;
     do
         count = epoll_wait(epoll_.get(), events_.data(), static_cast<int>(events_.size()), -1);
