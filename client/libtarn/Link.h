@@ -10,7 +10,7 @@
 
 #include <tarn/Connection.h>
 
-#include "client/libtarn/EventLoop.h"
+#include "client/libtarn/LinkLoop.h"
 #include "client/libtarn/Outgoing.h"
 #include "client/libtarn/UnsharedDescriptor.h"
 #include "ipc/FrameReader.h"
@@ -33,7 +33,7 @@ public:
     /// The handlers are called with the loop held, in the order in which the service spoke.
     struct Handlers {
         client::Connection::Handlers connection;
-        std::function<void()> onTime{}; ///< see EventLoop::wakeAt()
+        std::function<void()> onTime{}; ///< see LinkLoop::wakeAt()
     };
 
     /// Not connected. The library's own thread waits from start() on. Throws std::system_error.
@@ -74,7 +74,7 @@ public:
     /// Whether this service says when this client is displaced; known before the answer of any other call.
     bool tellsNews() const { return tellsNews_; }
 
-    EventLoop& loop() { return loop_; }
+    LinkLoop& loop() { return loop_; }
     const ForkMark& mark() const { return mark_; }
 
 private:
@@ -107,7 +107,7 @@ private:
 
     std::condition_variable roomMade_;
     std::atomic<bool> tellsNews_ = false;
-    EventLoop loop_; // goes first: its thread uses the rest
+    LinkLoop loop_; // goes first: its thread uses the rest
 };
 
 } // namespace tarn

@@ -19,7 +19,7 @@ namespace tarn {
 ///
 /// The thread does nothing but what a program does by itself that polls descriptor() and calls drain(). The
 /// two handlers are called with the loop held, one at a time.
-class EventLoop {
+class LinkLoop {
 public:
     using Time = std::chrono::steady_clock::time_point;
 
@@ -29,12 +29,12 @@ public:
     };
 
     /// Throws std::system_error.
-    explicit EventLoop(Handlers handlers);
-    EventLoop(const EventLoop&) = delete;
-    EventLoop& operator=(const EventLoop&) = delete;
+    explicit LinkLoop(Handlers handlers);
+    LinkLoop(const LinkLoop&) = delete;
+    LinkLoop& operator=(const LinkLoop&) = delete;
 
     /// stop().
-    ~EventLoop();
+    ~LinkLoop();
 
     /// From now on a thread waits, with all signals blocked. Throws std::system_error.
     void startThread();

@@ -1,4 +1,4 @@
-#include "client/libtarn/EventLoop.h"
+#include "client/libtarn/LinkLoop.h"
 
 #include <pthread.h>
 #include <sys/eventfd.h>
@@ -44,7 +44,7 @@ void change(int epoll, int operation, int descriptor, std::uint32_t events, std:
 
 } // namespace
 
-EventLoop::EventLoop(Handlers handlers)
+LinkLoop::LinkLoop(Handlers handlers)
     : handlers_(std::move(handlers)),
       epoll_([] { return ::epoll_create1(EPOLL_CLOEXEC); }),
       timer_([] { return ::timerfd_create(CLOCK_MONOTONIC, TFD_CLOEXEC | TFD_NONBLOCK); }),
@@ -56,15 +56,15 @@ EventLoop::EventLoop(Handlers handlers)
     change(epoll_.get(), EPOLL_CTL_ADD, wakeUp_.get(), EPOLLIN, wakeUpKey);
 }
 
-EventLoop::~EventLoop() { stop(); }
+LinkLoop::~LinkLoop() { stop(); }
 
-void EventLoop::startThread() {
+void LinkLoop::startThread() {
     const SignalsBlocked inTheThread;
     thread_ = std::thread([this] { run(); });
     ::pthread_setname_np(thread_.native_handle(), "libtarn");
 }
 
-void EventLoop::stop() {
+void LinkLoop::stop() {
     assert(!isCurrent());
     stopping_ = true;
     ::eventfd_write(wakeUp_.get(), 1);
@@ -72,7 +72,7 @@ void EventLoop::stop() {
         thread_.join();
 }
 
-void EventLoop::run() {
+void LinkLoop::run() {
     runner_ = std::this_thread::get_id();
     std::array<epoll_event, 4> events{};
     while (!stopping_) {
@@ -82,14 +82,14 @@ void EventLoop::run() {
     }
 }
 
-void EventLoop::drain() {
+void LinkLoop::drain() {
     std::array<epoll_event, 4> events{};
     const int count = ::epoll_wait(epoll_.get(), events.data(), events.size(), 0);
     if (count > 0)
         dispatch(std::span(events).first(static_cast<std::size_t>(count)));
 }
 
-void EventLoop::dispatch(std::span<const epoll_event> events) {
+void LinkLoop::dispatch(std::span<const epoll_event> events) {
     const auto held = hold();
     for (const auto& event : events) {
         std::uint64_t expirations = 0;
@@ -101,18 +101,18 @@ void EventLoop::dispatch(std::span<const epoll_event> events) {
     }
 }
 
-void EventLoop::watch(int socket) { change(epoll_.get(), EPOLL_CTL_ADD, socket, EPOLLIN, ++socketKey_); }
+void LinkLoop::watch(int socket) { change(epoll_.get(), EPOLL_CTL_ADD, socket, EPOLLIN, ++socketKey_); }
 
-void EventLoop::unwatch(int socket) {
+void LinkLoop::unwatch(int socket) {
     ::epoll_ctl(epoll_.get(), EPOLL_CTL_DEL, socket, nullptr);
     ++socketKey_;
 }
 
-void EventLoop::watchForRoom(int socket, bool wanted) {
+void LinkLoop::watchForRoom(int socket, bool wanted) {
     change(epoll_.get(), EPOLL_CTL_MOD, socket, wanted ? EPOLLIN | EPOLLOUT : EPOLLIN, socketKey_);
 }
 
-void EventLoop::wakeAt(std::optional<Time> time) {
+void LinkLoop::wakeAt(std::optional<Time> time) {
     itimerspec setting{};
     if (time) {
         const auto sinceStart = time->time_since_epoch();
