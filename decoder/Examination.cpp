@@ -56,7 +56,11 @@ std::optional<std::int64_t> saneLength(std::optional<std::int64_t> end, const Au
 void findExtent(Container& container, ByteSource& source, LengthFinder& length, AudioFileInfo& info) {
     const AVCodecID codec = container.stream().codecpar->codec_id;
     const auto tag = readGaplessTag(container, source, length.firstPacketPosition());
-    info.firstFrame = tag && codec == AV_CODEC_ID_MP3 ? tag->delay + mp3DecoderDelay : length.origin();
+    info.firstFrame = length.origin();
+    if (tag && container.isNamed("caf"))
+        info.firstFrame += tag->delay;
+    else if (tag && codec == AV_CODEC_ID_MP3)
+        info.firstFrame = tag->delay + mp3DecoderDelay;
     std::optional<std::int64_t> end = promisedWavFrames(container, source);
     if (!end)
         end = length.end();
@@ -86,9 +90,7 @@ ExaminedFile examineFile(ByteSource& source) {
     AudioFileInfo info;
     info.format = {decodedSampleFormat(samples), static_cast<std::uint32_t>(parameters.sample_rate),
                    static_cast<std::uint32_t>(parameters.ch_layout.nb_channels)};
-    info.title = readTag(container.context(), container.stream(), "title");
-    info.album = readTag(container.context(), container.stream(), "album");
-    info.artist = readTag(container.context(), container.stream(), "artist");
+    readTags(container, source, info);
     findExtent(container, source, length, info);
     if (container.failure())
         return {std::nullopt, *container.failure()};

@@ -5,6 +5,8 @@
 #include <charconv>
 #include <string>
 
+#include "decoder/Bytes.h"
+
 namespace tarn {
 
 namespace {
@@ -76,6 +78,30 @@ std::optional<GaplessTag> readLameTag(ByteSource& source, std::int64_t firstPack
     return GaplessTag{field >> 12, field & 0xFFF, std::nullopt};
 }
 
+std::optional<GaplessTag> readCafTable(ByteSource& source) {
+    constexpr std::int64_t fileHeader = 8;
+    constexpr std::int64_t chunkHeader = 12; // a name and a size
+    constexpr int mostChunks = 1'000;
+    std::int64_t at = fileHeader;
+    for (int i = 0; i < mostChunks; ++i) {
+        const std::string chunk = readPiece(source, at, chunkHeader + 24);
+        const std::string_view view = chunk;
+        if (chunk.size() < chunkHeader + 24)
+            return std::nullopt;
+        if (view.starts_with("pakt")) { // after the number of packets
+            const GaplessTag tag{static_cast<std::int64_t>(bigEndian(view.substr(28, 4))),
+                                 static_cast<std::int64_t>(bigEndian(view.substr(32, 4))),
+                                 static_cast<std::int64_t>(bigEndian(view.substr(20, 8)))};
+            return plausible(tag) ? std::optional(tag) : std::nullopt;
+        }
+        const auto size = static_cast<std::int64_t>(bigEndian(view.substr(4, 8)));
+        if (size < 0 || size > source.size() - at) // the last chunk may not know its size
+            return std::nullopt;
+        at += chunkHeader + size;
+    }
+    return std::nullopt;
+}
+
 std::int64_t endOfRecording(std::int64_t end, std::int64_t first, const GaplessTag& tag, AVCodecID codec) {
     if (tag.recording)
         return std::min(end, first + *tag.recording);
@@ -90,6 +116,8 @@ std::optional<GaplessTag> readGaplessTag(const Container& container, ByteSource&
         if (const AVDictionaryEntry* entry = av_dict_get(dictionary, "iTunSMPB", nullptr, 0))
             if (auto tag = parseITunSMPB(entry->value))
                 return tag;
+    if (container.isNamed("caf"))
+        return readCafTable(source);
     if (container.stream().codecpar->codec_id == AV_CODEC_ID_MP3 && firstPacket > 0)
         return readLameTag(source, firstPacket);
     return std::nullopt;

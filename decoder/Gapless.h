@@ -23,6 +23,9 @@ std::optional<GaplessTag> parseITunSMPB(std::string_view text);
 /// packet at `firstPacket` in `source`.
 std::optional<GaplessTag> readLameTag(ByteSource& source, std::int64_t firstPacket);
 
+/// The packet table of a CAF file.
+std::optional<GaplessTag> readCafTable(ByteSource& source);
+
 /// The gapless tag that holds for `container`; `firstPacket` is the position of its first packet.
 std::optional<GaplessTag> readGaplessTag(const Container& container, ByteSource& source,
                                          std::int64_t firstPacket);

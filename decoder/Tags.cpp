@@ -1,5 +1,9 @@
 #include "decoder/Tags.h"
 
+#include <cstring>
+#include <optional>
+
+#include "decoder/VorbisComments.h"
 #include "wire/Utf8.h"
 
 namespace tarn {
@@ -35,6 +39,20 @@ std::string latin1Character(char byte) {
     return {static_cast<char>(0xC0 | (value >> 6)), static_cast<char>(0x80 | (value & 0x3F))};
 }
 
+std::optional<std::string> textOf(const AVDictionary* dictionary, const char* key) {
+    const AVDictionaryEntry* entry = av_dict_get(dictionary, key, nullptr, 0);
+    std::string text = entry == nullptr ? "" : repairTagText(entry->value);
+    return text.empty() ? std::nullopt : std::optional(std::move(text));
+}
+
+// FFmpeg gives the name of a Matroska track ("English", "Stereo") as its title. It is taken for one only when
+// there are other tags of the track.
+bool titleIsOfTrack(const Container& container, const char* key) {
+    const AVDictionary* tags = container.stream().metadata;
+    return container.isNamed("matroska") && std::strcmp(key, "title") == 0 && !textOf(tags, "artist") &&
+           !textOf(tags, "album");
+}
+
 } // namespace
 
 std::string repairTagText(std::string_view raw) {
@@ -57,15 +75,23 @@ std::string repairTagText(std::string_view raw) {
     return std::string(trimmed(text));
 }
 
-std::optional<std::string> readTag(const AVFormatContext& context, const AVStream& stream, const char* key) {
-    for (const AVDictionary* dictionary : {context.metadata, stream.metadata}) {
-        const AVDictionaryEntry* entry = av_dict_get(dictionary, key, nullptr, 0);
-        if (entry == nullptr)
-            continue;
-        if (std::string text = repairTagText(entry->value); !text.empty())
+void readTags(const Container& container, ByteSource& source, AudioFileInfo& info) {
+    const AVFormatContext& context = container.context();
+    const AVStream& stream = container.stream();
+    const VorbisComments comments(source);
+    const auto read = [&](const char* key) -> std::optional<std::string> {
+        if (const auto comment = comments.first(key))
+            if (std::string text = repairTagText(*comment); !text.empty())
+                return text;
+        if (auto text = textOf(context.metadata, key))
             return text;
-    }
-    return std::nullopt;
+        return titleIsOfTrack(container, key) ? std::nullopt : textOf(stream.metadata, key);
+    };
+    info.title = read("title");
+    info.album = read("album");
+    info.artist = read("artist");
+    if (!info.artist)
+        info.artist = read("author"); // of an AIFF file
 }
 
 } // namespace tarn

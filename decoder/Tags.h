@@ -1,10 +1,11 @@
 #pragma once
 
-#include <optional>
 #include <string>
 #include <string_view>
 
-#include "decoder/Ffmpeg.h"
+#include "decoder/ByteSource.h"
+#include "decoder/Container.h"
+#include "mediaprotocol/AudioFileInfo.h"
 
 namespace tarn {
 
@@ -12,7 +13,7 @@ namespace tarn {
 /// text looks like it, else replaced), no control characters, no blank ends, cut to at most 1,024 bytes.
 std::string repairTagText(std::string_view raw);
 
-/// The file's own tag, or its audio stream's; none when both are absent or blank.
-std::optional<std::string> readTag(const AVFormatContext& context, const AVStream& stream, const char* key);
+/// Fills in title, album and artist: of several of one kind the first.
+void readTags(const Container& container, ByteSource& source, AudioFileInfo& info);
 
 } // namespace tarn
