@@ -19,6 +19,8 @@ std::string Error::failureReason() const { return textOf(*this, localizedFailure
 
 std::string Error::summary() const {
     std::string line = description();
+    if (line.find(' ') == std::string::npos) // a service without its texts sends the key of one instead
+        line.clear();
     if (const auto reason = failureReason(); !reason.empty())
         line += line.empty() ? reason : " (" + reason + ")";
     if (line.empty())

@@ -50,6 +50,8 @@ TEST(AConnection, EndsEachCallInItsOwnWay) {
     EXPECT_EQ(failed.outcome, Outcome::failed);
     EXPECT_EQ(failed.error.code, 26);
     EXPECT_EQ(failed.error.summary(), "Went wrong.");
+    const client::Error untold{"domain", 4, {{"LocalizedDescription", "VLErrorMessage"}}};
+    EXPECT_EQ(untold.summary(), "domain 4") << "no key of a text that is missing";
     EXPECT_TRUE(connection.send(bytes("answer")));
 }
 
