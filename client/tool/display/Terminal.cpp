@@ -1,6 +1,7 @@
 #include "client/tool/display/Terminal.h"
 
 #include <fcntl.h>
+#include <poll.h>
 #include <sys/ioctl.h>
 #include <unistd.h>
 
@@ -63,6 +64,12 @@ void Terminal::giveBack() {
 int Terminal::columns() const {
     winsize size{};
     return ::ioctl(STDOUT_FILENO, TIOCGWINSZ, &size) == 0 && size.ws_col > 0 ? size.ws_col : usualColumns;
+}
+
+std::vector<Key> Terminal::readKeysBeforeSignal() {
+    constexpr int moment = 5; // milliseconds
+    pollfd keys{keyDescriptor(), POLLIN, 0};
+    return isForeground() && ::poll(&keys, 1, moment) == 1 ? readKeys() : std::vector<Key>();
 }
 
 std::vector<Key> Terminal::readKeys() {

@@ -44,6 +44,8 @@ public:
     int keyDescriptor() const { return takesKeys_ ? keys_ : -1; }
     /// The keys that were pressed; never waits. Ends with `quit` when the terminal is gone.
     std::vector<Key> readKeys();
+    /// Those before a key that has sent a signal. The signal may be there a moment before them.
+    std::vector<Key> readKeysBeforeSignal();
 
 private:
     bool isLive_ = false;

@@ -61,8 +61,8 @@ int PlaySession::run() {
     while (!hasEnded_) {
         waitForSomething();
         client_.drainEvents();
-        takeKeys(); // those before a ^Z first: behind it the shell would read them
         takeSignals();
+        takeKeys();
         tick();
         if (std::exchange(isDirty_, false) && !hasEnded_)
             draw();
@@ -121,6 +121,8 @@ void PlaySession::takeSignals() {
 
 /// ^Z: the shell gets its terminal back as it was. What plays goes on playing.
 void PlaySession::stopHere() {
+    for (const auto key : terminal_.readKeysBeforeSignal())
+        press(key);
     display_.clear();
     terminal_.giveBack();
     isForeground_ = false;
@@ -144,7 +146,7 @@ void PlaySession::takeTerminal() {
 }
 
 void PlaySession::takeKeys() {
-    if (!std::exchange(keysWait_, false) || !terminal_.isForeground())
+    if (!std::exchange(keysWait_, false) || terminal_.keyDescriptor() < 0 || !terminal_.isForeground())
         return;
     for (const auto key : terminal_.readKeys())
         press(key);
