@@ -3,10 +3,12 @@
 #include <chrono>
 #include <cstdint>
 #include <memory>
+#include <optional>
 #include <string>
 
 #include "pcm/PcmBuffer.h"
 #include "pcm/PcmFormat.h"
+#include "roles/Error.h"
 
 namespace tarn {
 
@@ -26,8 +28,12 @@ public:
     /// Its clock was off, or has only begun to run: timeOfFrame() answers differently now.
     virtual void outputClockMoved() = 0;
 
-    /// The device that sounded is gone, and the output will not fall on to another by itself.
-    virtual void outputDeviceVanished() = 0;
+    /// The device that sounded is gone; what is played from now on would come out of another one.
+    virtual void outputDeviceVanished(const Error& error) = 0;
+
+    /// Sound is wanted and goes nowhere because of `error`, though time passes; or, without an error, is
+    /// heard again.
+    virtual void outputSoundChanged(const std::optional<Error>& error) = 0;
 };
 
 /// One stream to the listener's ears: a buffer of about two seconds, and a clock of what is heard. Stopped

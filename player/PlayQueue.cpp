@@ -90,6 +90,7 @@ void PlayQueue::seek(const PlaybackItem& item, std::chrono::nanoseconds position
 bool PlayQueue::setRate(float rate) {
     staysPaused_ = rate == 0 && (staysPaused_ || interruptedRate_);
     interruptedRate_.reset();
+    lostDevice_ = lostDevice_ && rate == 0;
     if (rate == rate_)
         return false;
     if (rate == 0)
@@ -102,7 +103,7 @@ bool PlayQueue::setRate(float rate) {
 }
 
 bool PlayQueue::play() {
-    if (std::exchange(staysPaused_, false))
+    if (std::exchange(staysPaused_, false) || lostDevice_)
         return false;
     return setRate(interruptedRate_.value_or(1.0F));
 }
@@ -114,6 +115,14 @@ bool PlayQueue::interrupt() {
     setRate(0);
     staysPaused_ = false;
     interruptedRate_ = before;
+    return true;
+}
+
+bool PlayQueue::loseDevice() {
+    if (rate_ == 0 && !interruptedRate_)
+        return false;
+    setRate(0);
+    lostDevice_ = true;
     return true;
 }
 

@@ -55,6 +55,9 @@ public:
     bool play();
     bool interrupt();
 
+    /// Pauses what plays, or was paused by an interruption, until a rate is set. False when it does neither.
+    bool loseDevice();
+
     // Rendering.
     bool playing() const { return rate_ != 0 && !entries_.empty(); }
 
@@ -117,6 +120,7 @@ private:
     float rate_ = 0;
     std::optional<float> interruptedRate_;
     bool staysPaused_ = false; ///< was told to pause after an interruption had paused it
+    bool lostDevice_ = false;  ///< was paused for that, so that play() does not go on over another one
     Timeline timeline_;
     float renderedRate_ = 0; ///< the rate of what is rendered, 0 before anything was
     const Output* clock_ = nullptr;

@@ -86,9 +86,14 @@ void Playback::shutDown() {
     renderings_.keepOnly(0, 0);
 }
 
-void Playback::outputDeviceVanished() {
+void Playback::outputDeviceVanished(const Error& error) {
     if (auto listener = listener_.lock())
-        listener->deviceVanished();
+        listener->deviceVanished(error);
+}
+
+void Playback::outputSoundChanged(const std::optional<Error>& error) {
+    if (auto listener = listener_.lock())
+        listener->soundChanged(error);
 }
 
 /// One after the other, so that whoever is told of an end finds the player as that end has left it.

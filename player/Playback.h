@@ -20,7 +20,8 @@ public:
     virtual ~PlaybackListener() = default;
     virtual void currentItemChanged() = 0;
     virtual void rateChanged() = 0;
-    virtual void deviceVanished() = 0;
+    virtual void deviceVanished(const Error& error) = 0;
+    virtual void soundChanged(const std::optional<Error>& error) = 0;
 };
 
 /// Turns a PlayQueue into sound.
@@ -53,7 +54,8 @@ private:
     void outputIsWritable() override { scheduleLocking(); }
     void outputWasReset() override { scheduleLocking(); }
     void outputClockMoved() override { scheduleLocking(); }
-    void outputDeviceVanished() override;
+    void outputDeviceVanished(const Error& error) override;
+    void outputSoundChanged(const std::optional<Error>& error) override;
 
     void schedule();
     void scheduleLocking();

@@ -76,13 +76,20 @@ MediaTime PlaybackQueuePlayer::currentTime() const {
     return mediaTimeOf(playback_->queue().positionOf(*entries.front().item));
 }
 
+// Whatever kept a paused player from sounding does not count any more when it plays again.
 template <class Change>
 void PlaybackQueuePlayer::changeRate(Change change) {
     bool changed = false;
+    bool errorGone = false;
     {
         EngineLock lock(environment_);
-        changed = change(playback_->queue());
+        PlayQueue& queue = playback_->queue();
+        const bool paused = queue.rate() == 0;
+        changed = change(queue);
+        errorGone = paused && queue.rate() != 0 && std::exchange(soundError_, std::nullopt).has_value();
     }
+    if (errorGone)
+        observers_.changed(statusKeyPath);
     if (changed)
         rateChanged();
 }
@@ -108,10 +115,35 @@ void PlaybackQueuePlayer::interruptionBegan() {
     changeRate([](PlayQueue& queue) { return queue.interrupt(); });
 }
 
-void PlaybackQueuePlayer::deviceVanished() {
+std::optional<Error> PlaybackQueuePlayer::error() const {
+    EngineLock lock(environment_);
+    return soundError_;
+}
+
+void PlaybackQueuePlayer::soundChanged(const std::optional<Error>& error) {
+    {
+        EngineLock lock(environment_);
+        if (std::exchange(soundError_, error) == error)
+            return;
+    }
+    observers_.changed(statusKeyPath);
+}
+
+// The reason is told before the pause, so that nobody takes that for the listener's.
+void PlaybackQueuePlayer::deviceVanished(const Error& error) {
+    bool wasPlaying = false;
+    {
+        EngineLock lock(environment_);
+        wasPlaying = playback_->queue().rate() != 0;
+        if (!playback_->queue().loseDevice())
+            return;
+        soundError_ = error;
+    }
     SystemLog::message("-[MediaQueuePlayer deviceVanished]", __LINE__,
                        "%{public}s:%d: Paused: the device that played is gone.");
-    pause();
+    observers_.changed(statusKeyPath);
+    if (wasPlaying)
+        rateChanged();
 }
 
 template <class Edit>

@@ -24,9 +24,10 @@ public:
 
     RegistrationHandle observe(std::string_view keyPath, Block block) override;
 
-    /// Always ready to play: without a sound server it plays in silence, and what fails are its items.
+    /// Always ready to play: what fails are its items, and error() says what becomes of the sound.
     MediaStatus status() const override { return MediaStatus::readyToPlay; }
-    std::optional<Error> error() const override { return std::nullopt; }
+    std::optional<Error> error() const override;
+    void soundFailed(const Error& error) override { soundChanged(error); }
 
     float rate() const override;
     void setRate(float rate) override;
@@ -45,7 +46,8 @@ public:
 private:
     void currentItemChanged() override { observers_.changed(currentItemKeyPath); }
     void rateChanged() override { observers_.changed(rateKeyPath); }
-    void deviceVanished() override;
+    void deviceVanished(const Error& error) override;
+    void soundChanged(const std::optional<Error>& error) override;
 
     ObservedValue read(std::string_view keyPath) const;
     void interruptionBegan();
@@ -62,6 +64,7 @@ private:
     const std::shared_ptr<Playback> playback_;
     ObserverList observers_;
     AudioSession* session_ = nullptr; // under the mutex
+    std::optional<Error> soundError_; // under the mutex
     RegistrationHandle interruptions_;
     LiveObject<"media queue player"> live_;
 };

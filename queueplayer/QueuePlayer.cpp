@@ -135,6 +135,8 @@ bool VLTorviAudioFileQueuePlayer::setRate(float rate) {
             SystemLog::error(setRateMethod, __LINE__,
                              "%{public}s:%d: Could not set audio session active due to error: %{public}@.",
                              describe(error));
+            if (error)
+                self->queuePlayer_->soundFailed(*error);
         }
         activation->finished->signal();
     });

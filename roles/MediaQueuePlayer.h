@@ -32,7 +32,15 @@ public:
     static constexpr char currentItemKeyPath[] = "currentItem";
 
     virtual MediaStatus status() const = 0;
+
+    /// Why nothing is heard though the status is ready: there was nothing to sound on when the player was to
+    /// play; sound goes nowhere while it plays; or its device is gone and it was paused. None once that is
+    /// over, or the player plays again. Every change is reported as one of "status", before the change of the
+    /// rate that comes with it.
     virtual std::optional<Error> error() const = 0;
+
+    /// Has error() say why this player could not begin to sound.
+    virtual void soundFailed(const Error& error) = 0;
 
     /// Exactly what was set: 0 is paused, below 0 plays backwards.
     virtual float rate() const = 0;
@@ -43,7 +51,8 @@ public:
 
     /// Plays on: at the rate at which an interruption paused this player, else at 1.0. A player that was told
     /// to pause after the interruption had paused it stays paused, once: whoever pauses during a call does
-    /// not want to hear it afterwards.
+    /// not want to hear it afterwards. One that was paused because its device is gone stays paused until a
+    /// rate is set.
     virtual void play() = 0;
 
     /// None when the queue is empty.

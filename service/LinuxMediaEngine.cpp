@@ -4,9 +4,9 @@
 
 namespace tarn {
 
-LinuxMediaEngine::LinuxMediaEngine(NotificationCenter& notifications, FileAccess& access,
-                                   LinuxAudioSession& session)
-    : LinuxMediaParts(session),
+LinuxMediaEngine::LinuxMediaEngine(LinuxSound& sound, NotificationCenter& notifications, FileAccess& access,
+                                   InterruptionListener& session)
+    : LinuxMediaParts(sound, session),
       PlaybackEngine(LinuxMediaParts::loop, LinuxMediaParts::renderings, LinuxMediaParts::outputs,
                      notifications),
       opener_(access, porter, examiner),

@@ -5,20 +5,26 @@
 #include "media/ClientFiles.h"
 #include "media/MediaUse.h"
 #include "player/PlaybackEngine.h"
-#include "sound/LinuxAudioSession.h"
 #include "sound/SystemOutput.h"
 #include "system/FileAccess.h"
 
 namespace tarn {
 
+/// The player thread, and the sound server that it speaks to. Outlives the engine that plays with them.
+struct LinuxSound {
+    EventLoopThread loop;
+    SoundServer server{loop};
+};
+
 /// What the engine of this machine is made of; the engine's base keeps references to it.
 struct LinuxMediaParts {
-    explicit LinuxMediaParts(InterruptionListener& interruptions) : outputs(loop, interruptions) {}
+    LinuxMediaParts(LinuxSound& sound, InterruptionListener& interruptions)
+        : loop(sound.loop), outputs(loop, sound.server, interruptions) {}
 
+    EventLoopThread& loop;
     MediaProcess process;
     FilePorter porter{process};
     FileExaminer examiner{process, porter};
-    EventLoopThread loop;
     ChildRenderingFactory renderings{loop, process, porter};
     ClientFiles files{porter, loop};
     SystemOutputFactory outputs;
@@ -28,9 +34,10 @@ struct LinuxMediaParts {
 class LinuxMediaEngine final : private LinuxMediaParts, public PlaybackEngine {
 public:
     /// All of these outlive the engine.
-    LinuxMediaEngine(NotificationCenter& notifications, FileAccess& access, LinuxAudioSession& session);
+    LinuxMediaEngine(LinuxSound& sound, NotificationCenter& notifications, FileAccess& access,
+                     InterruptionListener& session);
 
-    /// Silences what still plays.
+    /// Ends the player thread and silences what still plays.
     ~LinuxMediaEngine() override;
 
     /// Receives what clients hand over.

@@ -29,8 +29,9 @@ struct LinuxPlatform {
     const std::unique_ptr<Localization> localization;
     LocalNotificationCenter notifications;
     TokenTable tokens;
-    LinuxAudioSession audioSession{notifications};
-    LinuxMediaEngine media{notifications, tokens, audioSession};
+    LinuxSound sound;
+    LinuxAudioSession audioSession{sound.loop, sound.server, notifications};
+    LinuxMediaEngine media{sound, notifications, tokens, audioSession};
     SocketListeners listeners{tokens, media.clientFiles()};
     const std::unique_ptr<DesktopApplicationRegistry> applications;
     LinuxMediaControls controls;

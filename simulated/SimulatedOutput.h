@@ -30,7 +30,8 @@ public:
 
     // For the speaker.
     void reset();
-    void loseDevice() { listener_.outputDeviceVanished(); }
+    void loseDevice() { listener_.outputDeviceVanished({"SimulatedSound", 3, {}}); }
+    void tellSound(const std::optional<Error>& error) { listener_.outputSoundChanged(error); }
     bool sounding() const;
     void passOnHeard();
 

@@ -77,6 +77,13 @@ void SimulatedSpeaker::loseDevice() {
     });
 }
 
+void SimulatedSpeaker::tellSound(const std::optional<Error>& error) {
+    loop_.post([this, error] {
+        for (SimulatedOutput* output : outputs_.withLocked([](const auto& outputs) { return outputs; }))
+            output->tellSound(error);
+    });
+}
+
 std::size_t SimulatedSpeaker::outputs() const {
     return outputs_.withLocked([](const auto& outputs) { return outputs.size(); });
 }

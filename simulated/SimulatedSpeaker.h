@@ -51,6 +51,9 @@ public:
     void reset();
     void loseDevice();
 
+    /// Every output goes on without sound because of `error`, or sounds again.
+    void tellSound(const std::optional<Error>& error);
+
     /// Outputs that exist, and those of them that are started.
     std::size_t outputs() const;
     std::size_t soundingOutputs() const;

@@ -1,21 +1,24 @@
 #include "sound/LinuxAudioSession.h"
 
-#include <pthread.h>
+#include <utility>
+
+#include "sound/SoundError.h"
 
 namespace tarn {
 
-LinuxAudioSession::LinuxAudioSession(NotificationCenter& notifications)
-    : notifications_(notifications), thread_([this] { run(); }) {
-    pthread_setname_np(thread_.native_handle(), "session");
-}
+namespace {
+
+// A sound server that is being started is there by then; a person who waits hears why nothing sounds.
+constexpr std::chrono::milliseconds activationLimit{1500};
+
+} // namespace
+
+LinuxAudioSession::LinuxAudioSession(EventLoop& loop, SoundServer& server, NotificationCenter& notifications)
+    : loop_(loop), server_(server), notifications_(notifications) {}
 
 LinuxAudioSession::~LinuxAudioSession() {
-    {
-        std::lock_guard lock(mutex_);
-        ending_ = true;
-    }
-    changed_.notify_one();
-    thread_.join();
+    for (const auto& completion : pending_.withLocked([](Pending& all) { return std::exchange(all, {}); }))
+        completion(false, soundError(SoundErrorCode::noServer));
 }
 
 // One category, and streams are always described as music: nothing here can be refused.
@@ -24,7 +27,19 @@ std::optional<Error> LinuxAudioSession::setCategory(Category, Mode, RouteSharing
 }
 
 void LinuxAudioSession::activateWithOptions(std::uint64_t, ActivationCompletion completion) {
-    perform([completion = std::move(completion)] { completion(true, std::nullopt); });
+    const auto activation =
+        pending_.withLocked([&](Pending& all) { return all.insert(all.end(), std::move(completion)); });
+    loop_.post([this, activation] {
+        server_.request(activationLimit, [this, activation](const std::optional<Error>& error) {
+            complete(activation, error);
+        });
+    });
+}
+
+void LinuxAudioSession::complete(Pending::iterator activation, const std::optional<Error>& error) {
+    const ActivationCompletion completion = std::move(*activation);
+    pending_.withLocked([&](Pending& all) { all.erase(activation); });
+    completion(!error, error);
 }
 
 void LinuxAudioSession::streamInterrupted(const void* stream) {
@@ -43,36 +58,11 @@ void LinuxAudioSession::streamGone(const void* stream) {
 }
 
 void LinuxAudioSession::notify(std::uint64_t type, std::optional<std::uint64_t> options) {
-    perform([this, type, options] {
-        Notification notification{interruptionNotification, static_cast<AudioSession*>(this), {}};
-        notification.info[interruptionTypeKey] = type;
-        if (options)
-            notification.info[interruptionOptionsKey] = *options;
-        notifications_.post(notification);
-    });
-}
-
-void LinuxAudioSession::perform(std::function<void()> work) {
-    {
-        std::lock_guard lock(mutex_);
-        work_.push_back(std::move(work));
-    }
-    changed_.notify_one();
-}
-
-void LinuxAudioSession::run() {
-    std::unique_lock lock(mutex_);
-    for (;;) {
-        changed_.wait(lock, [this] { return ending_ || !work_.empty(); });
-        if (work_.empty())
-            return;
-        std::function<void()> work = std::move(work_.front());
-        work_.pop_front();
-        lock.unlock();
-        work();
-        work = nullptr;
-        lock.lock();
-    }
+    Notification notification{interruptionNotification, static_cast<AudioSession*>(this), {}};
+    notification.info[interruptionTypeKey] = type;
+    if (options)
+        notification.info[interruptionOptionsKey] = *options;
+    notifications_.post(notification);
 }
 
 } // namespace tarn

@@ -1,27 +1,28 @@
 #pragma once
 
-#include <condition_variable>
-#include <deque>
-#include <mutex>
+#include <list>
 #include <set>
-#include <thread>
 
+#include "player/EventLoop.h"
 #include "roles/AudioSession.h"
 #include "roles/NotificationCenter.h"
 #include "sound/InterruptionListener.h"
+#include "sound/SoundServer.h"
+#include "threads/MutexProtected.h"
 
 namespace tarn {
 
-/// The audio session of this machine. The sound server is what arbitrates: activation always succeeds, and an
-/// interruption begins when the server asks for silence and ends when it takes that back.
+/// The audio session of this machine. It is activated when there is something to sound on, and is interrupted
+/// when the sound server asks for silence or a call begins, until that is over.
 ///
-/// Completions and notifications come on the session's own thread, in their order.
+/// Completions and notifications come on the player thread, in their order: nobody who waits for one may be
+/// there.
 class LinuxAudioSession final : public AudioSession, public InterruptionListener {
 public:
-    /// `notifications` outlives the session.
-    explicit LinuxAudioSession(NotificationCenter& notifications);
+    /// All of these outlive the session.
+    LinuxAudioSession(EventLoop& loop, SoundServer& server, NotificationCenter& notifications);
 
-    /// Not on the session's thread; completions that have not run run before it returns.
+    /// The loop has been stopped. Activations that were not answered fail now.
     ~LinuxAudioSession() override;
 
     [[nodiscard]] std::optional<Error> setCategory(Category category, Mode mode, RouteSharingPolicy policy,
@@ -33,18 +34,16 @@ public:
     void streamGone(const void* stream) override;
 
 private:
-    void perform(std::function<void()> work);
-    void run();
+    using Pending = std::list<ActivationCompletion>;
+
+    void complete(Pending::iterator activation, const std::optional<Error>& error);
     void notify(std::uint64_t type, std::optional<std::uint64_t> options);
 
+    EventLoop& loop_;
+    SoundServer& server_;
     NotificationCenter& notifications_;
+    MutexProtected<Pending> pending_;
     std::set<const void*> interrupted_; // player thread
-
-    std::mutex mutex_;
-    std::condition_variable changed_;
-    std::deque<std::function<void()>> work_; // under the mutex
-    bool ending_ = false;                    // under the mutex
-    std::thread thread_;
 };
 
 } // namespace tarn

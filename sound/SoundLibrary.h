@@ -9,6 +9,12 @@
 
 namespace tarn {
 
+/// What a sound server has and does, as far as it matters here.
+struct SoundSurvey {
+    bool device = false; ///< there is something to play on
+    bool call = false;   ///< somebody's stream carries a phone call
+};
+
 /// Is told how a connection fares. Player thread, maybe inside a call of the library: what follows is to be
 /// posted.
 class SoundConnectionListener {
@@ -19,6 +25,9 @@ public:
 
     /// It did not come about, or has broken.
     virtual void connectionLost() = 0;
+
+    /// While the server is watched: once when that begins, and after every change.
+    virtual void serverSurveyed(const SoundSurvey& survey) = 0;
 };
 
 /// A connection to the sound server, or the attempt at one. Player thread.
@@ -27,11 +36,15 @@ public:
     virtual ~SoundConnection() = default;
 
     /// Asks for the format of the device that is the default now, and calls `done` with it, or with none when
-    /// there is no device. Is not called when the connection goes before.
-    virtual void lookUpFormat(std::function<void(std::optional<PcmFormat>)> done) = 0;
+    /// there is nothing to play on. Is not called when the connection goes before.
+    virtual void lookUpDevice(std::function<void(std::optional<PcmFormat>)> done) = 0;
 
-    /// A stream with a buffer of `bufferFrames`. `listener` outlives it, the connection need not.
-    virtual std::unique_ptr<SoundStream> makeStream(const PcmFormat& format, std::size_t bufferFrames,
+    /// Follows what happens to the server's devices and streams, or ceases to. A stream notices only while
+    /// the server is watched that its device is gone.
+    virtual void watch(bool on) = 0;
+
+    /// `listener` outlives the stream, the connection need not.
+    virtual std::unique_ptr<SoundStream> makeStream(const PcmFormat& format,
                                                     SoundStreamListener& listener) = 0;
 };
 

@@ -48,8 +48,9 @@ struct BarePlatform {
     const std::unique_ptr<Localization> localization = systemLocalization();
     LocalNotificationCenter notifications;
     TokenTable tokens;
-    LinuxAudioSession audioSession{notifications};
-    LinuxMediaEngine media{notifications, tokens, audioSession};
+    LinuxSound sound;
+    LinuxAudioSession audioSession{sound.loop, sound.server, notifications};
+    LinuxMediaEngine media{sound, notifications, tokens, audioSession};
     SocketListeners listeners{tokens, media.clientFiles()};
     RemoteTargets remoteCommands;
     NoScreen nowPlaying;

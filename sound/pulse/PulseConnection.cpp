@@ -2,8 +2,10 @@
 
 #include <pulse/pulseaudio.h>
 
+#include <string_view>
+#include <utility>
+
 #include "sound/pulse/PulseFormat.h"
-#include "sound/pulse/PulseStream.h"
 
 namespace tarn {
 
@@ -24,21 +26,21 @@ pa_context* makeContext(pa_mainloop_api& events) {
 
 } // namespace
 
-/// Answered for each device that is found, and once more at the end.
-struct PulseConnection::FormatQuery {
+/// Answered with the default device, if there is one, and once more at the end.
+struct PulseConnection::Query {
     PulseConnection& connection;
     std::function<void(std::optional<PcmFormat>)> done;
     std::optional<PcmFormat> format;
 
     static void answered(pa_context*, const pa_sink_info* sink, int end, void* data) {
-        auto& query = *static_cast<FormatQuery*>(data);
-        if (sink != nullptr)
+        auto& query = *static_cast<Query*>(data);
+        if (sink != nullptr && !PulseSurvey::isDummy(sink->name))
             query.format = formatOf(sink->sample_spec);
         if (end == 0)
             return;
         const auto* const place = &query;
-        const FormatQuery answer = std::move(query);
-        answer.connection.queries_.remove_if([place](const FormatQuery& other) { return &other == place; });
+        const Query answer = std::move(query);
+        answer.connection.queries_.remove_if([place](const Query& other) { return &other == place; });
         answer.done(answer.format);
     }
 };
@@ -50,7 +52,10 @@ void PulseConnection::ContextDelete::operator()(pa_context* context) const {
 }
 
 PulseConnection::PulseConnection(pa_mainloop_api& events, SoundConnectionListener& listener)
-    : listener_(listener), context_(makeContext(events)) {
+    : listener_(listener),
+      context_(makeContext(events)),
+      survey_(context_.get(), [this](const PulseFindings& findings) { found(findings); }),
+      streams_(std::make_shared<std::set<PulseStream*>>()) {
     pa_context_set_state_callback(
         context_.get(), [](pa_context*, void* self) { static_cast<PulseConnection*>(self)->stateChanged(); },
         this);
@@ -62,25 +67,53 @@ PulseConnection::~PulseConnection() = default;
 
 void PulseConnection::stateChanged() {
     const pa_context_state_t state = pa_context_get_state(context_.get());
-    if (state == PA_CONTEXT_READY)
-        listener_.connectionReady();
-    else if (!PA_CONTEXT_IS_GOOD(state))
-        listener_.connectionLost();
+    if (!PA_CONTEXT_IS_GOOD(state))
+        return listener_.connectionLost();
+    if (state != PA_CONTEXT_READY)
+        return;
+    pa_operation* operation = pa_context_get_server_info(
+        context_.get(),
+        [](pa_context*, const pa_server_info* info, void* data) {
+            auto& self = *static_cast<PulseConnection*>(data);
+            if (info == nullptr) // the connection breaks, which is told
+                return;
+            if (std::string_view(info->server_name).find("PipeWire") != std::string_view::npos)
+                self.server_ = PulseServerKind::pipeWire;
+            self.listener_.connectionReady();
+        },
+        this);
+    if (operation != nullptr)
+        pa_operation_unref(operation);
 }
 
-void PulseConnection::lookUpFormat(std::function<void(std::optional<PcmFormat>)> done) {
-    FormatQuery& query = queries_.emplace_back(FormatQuery{*this, std::move(done), std::nullopt});
+void PulseConnection::lookUpDevice(std::function<void(std::optional<PcmFormat>)> done) {
+    Query& query = queries_.emplace_back(Query{*this, std::move(done), std::nullopt});
     pa_operation* operation =
-        pa_context_get_sink_info_by_name(context_.get(), "@DEFAULT_SINK@", FormatQuery::answered, &query);
+        pa_context_get_sink_info_by_name(context_.get(), "@DEFAULT_SINK@", Query::answered, &query);
     if (operation == nullptr) // the connection is broken, which is told
         queries_.pop_back();
     else
         pa_operation_unref(operation);
 }
 
-std::unique_ptr<SoundStream> PulseConnection::makeStream(const PcmFormat& format, std::size_t bufferFrames,
+void PulseConnection::watch(bool on) {
+    watching_ = on;
+    for (PulseStream* stream : *streams_)
+        stream->forgetDevice();
+    survey_.follow(on);
+}
+
+void PulseConnection::found(const PulseFindings& findings) {
+    for (PulseStream* stream : std::set(*streams_))
+        if (streams_->contains(stream))
+            stream->surveyed(findings);
+    if (watching_)
+        listener_.serverSurveyed({.device = !findings.sinks.empty(), .call = findings.call});
+}
+
+std::unique_ptr<SoundStream> PulseConnection::makeStream(const PcmFormat& format,
                                                          SoundStreamListener& listener) {
-    return std::make_unique<PulseStream>(context_.get(), format, bufferFrames, listener);
+    return std::make_unique<PulseStream>(context_.get(), server_, streams_, format, listener);
 }
 
 } // namespace tarn

@@ -51,6 +51,11 @@ MediaQueuePlayer& Listening::play(std::vector<std::shared_ptr<MediaItem>> items,
         std::snprintf(text, sizeof text, "rate %g", static_cast<double>(std::get<float>(change.at("new"))));
         note(text);
     }));
+    registrations_.push_back(
+        player->observe(MediaQueuePlayer::statusKeyPath, [this](Observable& object, auto&) {
+            const auto error = static_cast<MediaQueuePlayer&>(object).error();
+            note(error ? "sound error " + std::to_string(error->code) : "sound");
+        }));
     reports_.clear();
     player->setRate(rate);
     settle();

@@ -144,16 +144,44 @@ TEST(Trouble, ALostSoundServerCostsNothingOfTheFile) {
               "0.000-3.000 a 0.000..6.000\n4.000-8.000 a 6.000..10.000\n8.000-9.000 b 0.000..1.000\n");
 }
 
-TEST(Trouble, ALostDevicePausesAndSaysWhy) {
-    CapturedLog log;
+/// The reason comes before the pause, and what resumes what it has paused does not start over another device.
+TEST(Trouble, ALostDevicePausesUntilARateIsSet) {
     Listening test;
-    test.play({test.item("a", 10s)}, 1.5F);
+    test.play({test.item("a", 60s)}, 1.5F);
     test.advance(2s);
     test.platform.media.speaker().loseDevice();
-    EXPECT_EQ(test.reports(), "0.000: rate 1.5\n2.000: rate 0\n");
-    EXPECT_TRUE(log.waitFor("device"));
+    EXPECT_EQ(test.reports(), "0.000: rate 1.5\n2.000: sound error 3\n2.000: rate 0\n");
     test.player->play();
-    EXPECT_EQ(test.player->rate(), 1.0F);
+    EXPECT_EQ(test.reports(), "");
+    test.platform.media.speaker().loseDevice(); // it is paused already
+    test.settle();
+    test.player->setRate(2);
+    EXPECT_EQ(test.reports(), "2.000: sound\n2.000: rate 2\n");
+
+    test.platform.audioSession.beginInterruption();
+    test.settle();
+    test.platform.media.speaker().loseDevice();
+    test.settle();
+    test.player->play();
+    EXPECT_EQ(test.reports(), "2.000: rate 0\n2.000: sound error 3\n");
+}
+
+TEST(Trouble, SilenceIsToldAndOver) {
+    Listening test;
+    test.play({test.item("a", 60s)});
+    const Error error{"sound", 1, {}};
+    test.platform.media.speaker().tellSound(error);
+    test.platform.media.speaker().tellSound(error); // no news
+    test.settle();
+    EXPECT_EQ(test.player->error(), error);
+    test.player->setRate(2); // in silence
+    test.platform.media.speaker().tellSound(std::nullopt);
+    EXPECT_EQ(test.reports(), "0.000: rate 1\n0.000: sound error 1\n0.000: rate 2\n0.000: sound\n");
+
+    test.player->pause();
+    test.player->soundFailed(error); // when it was to play again
+    test.player->setRate(1);
+    EXPECT_EQ(test.reports(), "0.000: rate 0\n0.000: sound error 1\n0.000: sound\n0.000: rate 1\n");
 }
 
 TEST(Interruption, PausesWhatSoundsAndPlayGoesOnAtItsRate) {

@@ -107,6 +107,7 @@ public:
     RegistrationHandle observe(std::string_view, Block) override { return nullptr; }
     MediaStatus status() const override { return status_; }
     std::optional<Error> error() const override { return error_; }
+    void soundFailed(const Error&) override {}
     float rate() const override { return 0; }
     void setRate(float) override {}
     void pause() override {}

@@ -58,9 +58,11 @@ TEST_F(ActivationTest, ARateThatIsNotFiniteActivatesAndIsRefusedByTheEngine) {
     EXPECT_EQ(errors().size(), 3u);
 }
 
-TEST_F(ActivationTest, AFailedActivationLeavesTheRateAndIsLogged) {
+TEST_F(ActivationTest, AFailedActivationLeavesTheRateAndSaysWhy) {
     device.audioSession.willActivate({.error = Error{"test", 7, {}}});
-    EXPECT_EQ(tell(setRate("player", 1)), "setRate: no answer\n");
+    EXPECT_EQ(tell(setRate("player", 1)),
+              "push queuePlayer.setStatus errorCode=7 errorDomain=test identifier=player status=1\n"
+              "setRate: no answer\n");
     EXPECT_EQ(rate(), 0);
     EXPECT_THAT(errors(), ElementsAre("Could not set audio session active due to error: (test, code 7)."));
 }

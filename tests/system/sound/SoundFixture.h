@@ -2,6 +2,7 @@
 
 #include "observation/LocalNotificationCenter.h"
 #include "service/LinuxMediaEngine.h"
+#include "sound/LinuxAudioSession.h"
 #include "tests/support/Events.h"
 #include "tests/support/MediaFixture.h"
 #include "tests/system/sound/SoundServerProcess.h"
@@ -60,8 +61,9 @@ struct SoundTest : testing::Test {
     Events events;
     LocalNotificationCenter notifications;
     NoFileAccess access;
-    LinuxAudioSession session{notifications};
-    LinuxMediaEngine engine{notifications, access, session};
+    LinuxSound sound;
+    LinuxAudioSession session{sound.loop, sound.server, notifications};
+    LinuxMediaEngine engine{sound, notifications, access, session};
     std::vector<RegistrationHandle> registrations;
 };
 

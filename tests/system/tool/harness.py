@@ -66,7 +66,7 @@ class ToolTest(unittest.TestCase):
     def setUp(self):
         self.folder = pathlib.Path(self.enterContext(tempfile.TemporaryDirectory()))
         self.environment = {**os.environ, "XDG_RUNTIME_DIR": str(self.folder), "LC_ALL": "C.UTF-8",
-                            "LANGUAGE": "en", "PULSE_SERVER": "unix:/nonexistent", "TERM": "xterm", "NO_COLOR": "1",
+                            "LANGUAGE": "en", "TARND_SOUND": "none", "TERM": "xterm", "NO_COLOR": "1",
                             "PATH": f"{os.path.dirname(TOOL)}:{os.environ['PATH']}"}
         make_song(self.folder / "short.wav", 0.3)
         make_song(self.folder / "long.wav", 60)

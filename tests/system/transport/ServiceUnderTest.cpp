@@ -25,7 +25,7 @@ void ServiceUnderTest::start() {
     const std::string runtime = "XDG_RUNTIME_DIR=" + folder_.path().string();
     process_ = std::make_unique<ChildProcess>(
         std::vector<std::string>{TARND},
-        std::vector<std::string>{runtime, "NOTIFY_SOCKET=" + readyPath, "PULSE_SERVER=unix:/nowhere",
+        std::vector<std::string>{runtime, "NOTIFY_SOCKET=" + readyPath, "TARND_SOUND=none",
                                  "DBUS_SESSION_BUS_ADDRESS=unix:path=/nowhere", "JOURNAL_STREAM="},
         ChildProcess::ErrorOutput::withOutput);
     pollfd wait{ready.get(), POLLIN, 0};
