@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <bit>
+#include <cmath>
 
 #include "decoder/FileDecoder.h"
 #include "mediaprocess/FileReader.h"
@@ -60,7 +61,8 @@ bool Renderer::open(const OpenItem& request, FileDescriptor file) {
 bool Renderer::seek(const Seek& request) {
     const auto format = request.format.checked();
     const auto rate = std::bit_cast<float>(request.rate);
-    if (!rendering_ || !format || !ring_.begin(*format, request.capacity))
+    const bool isPossible = std::isfinite(rate) && rate != 0 && MediaSpan::isTime(request.position);
+    if (!rendering_ || !format || !isPossible || !ring_.begin(*format, request.capacity))
         return false;
     generation_ = request.generation;
     pieceFrames_ = format->rate / piecesASecond;

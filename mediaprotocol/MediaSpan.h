@@ -13,6 +13,11 @@ struct MediaSpan {
         failed, ///< nothing can be rendered behind it; it may hold no frames
     };
 
+    /// Can it be a time? Up to 36 years.
+    static constexpr bool isTime(std::int64_t nanoseconds) {
+        return nanoseconds >= 0 && nanoseconds <= std::int64_t{1} << 60;
+    }
+
     std::uint32_t generation = 0; ///< of the seek that it follows on
     State state = State::more;
     std::uint32_t frames = 0;

@@ -49,7 +49,8 @@ InfoRecord InfoRecord::of(const AudioFileInfo& info) {
 
 std::optional<AudioFileInfo> InfoRecord::checked() const {
     const auto known = format.checked();
-    if (!known || !isFrame(firstFrame) || !isFrame(frames) || frames < 0 || length > Length::estimated)
+    if (!known || known->sample == SampleFormat::s24In32 || !isFrame(firstFrame) || !isFrame(frames) ||
+        frames < 0 || length > Length::estimated)
         return std::nullopt;
     AudioFileInfo info;
     info.format = *known;

@@ -8,10 +8,6 @@ namespace tarn {
 
 namespace {
 
-constexpr std::int64_t latest = std::int64_t{1} << 60; // nanoseconds: 36 years
-
-bool isTime(std::int64_t time) { return time >= 0 && time <= latest; }
-
 /// The first `frames` frames of a span.
 MediaSpan firstPart(const MediaSpan& span, std::uint32_t frames) {
     MediaSpan part = span;
@@ -60,8 +56,8 @@ RingReader::Next RingReader::readSpan() {
             continue;
         }
         if (span.bytes > capacity_ || span.bytes != span.frames * frameSize_ ||
-            span.state > MediaSpan::State::failed || !isTime(span.start) || !isTime(span.end) ||
-            (span.frames == 0 && span.state == MediaSpan::State::more))
+            span.state > MediaSpan::State::failed || !MediaSpan::isTime(span.start) ||
+            !MediaSpan::isTime(span.end) || (span.frames == 0 && span.state == MediaSpan::State::more))
             return Next::lie;
         current_ = span;
         return Next::span;

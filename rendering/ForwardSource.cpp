@@ -10,6 +10,11 @@ namespace {
 constexpr std::size_t chunkFrames = 4096;
 constexpr std::int64_t filterFrames = 256; // more than a resampler looks back, in frames of the file
 
+/// frames * to / from, which may be more than fits on the way, rounded as `half` says.
+std::int64_t scaled(std::int64_t frames, std::int64_t to, std::int64_t from, std::int64_t half = 0) {
+    return frames / from * to + (frames % from * to + half) / from;
+}
+
 } // namespace
 
 ForwardSource::ForwardSource(Decoder& decoder, const AudioFileInfo& info, const PcmFormat& format)
@@ -18,7 +23,7 @@ ForwardSource::ForwardSource(Decoder& decoder, const AudioFileInfo& info, const 
       to_(format),
       converter_(info.format == format ? nullptr : std::make_unique<Converter>(info.format, format)) {
     if (info.frames)
-        length_ = (*info.frames * to_.rate + from_.rate / 2) / from_.rate;
+        length_ = scaled(*info.frames, to_.rate, from_.rate, from_.rate / 2);
 }
 
 // A resampler's output falls on the same places only if it begins at a frame that both rates share.
@@ -40,7 +45,7 @@ void ForwardSource::seek(std::int64_t position) {
     const std::int64_t divisor = std::gcd(from_.rate, to_.rate);
     const std::int64_t blockIn = from_.rate / divisor;
     const std::int64_t blockOut = to_.rate / divisor;
-    const std::int64_t target = position * blockIn / blockOut - filterFrames;
+    const std::int64_t target = scaled(position, blockIn, blockOut) - filterFrames;
     const std::int64_t block = std::max<std::int64_t>(0, target / blockIn);
     excess_ = static_cast<std::size_t>(position - block * blockOut);
     decoder_.seek(block * blockIn);
