@@ -1,6 +1,13 @@
+#include <sys/mman.h>
+#include <sys/socket.h>
+#include <unistd.h>
+
+#include <csignal>
 #include <cstring>
+#include <fstream>
 #include <semaphore>
 
+#include "media/ChildRendering.h"
 #include "media/ChildRenderingFactory.h"
 #include "tests/support/MediaFixture.h"
 
@@ -19,6 +26,22 @@ struct Rendered {
     bool joined = true;
     nanoseconds end{0};
 };
+
+/// The processes of this name whose parent is `parent`.
+std::vector<pid_t> childrenOf(pid_t parent, const std::string& name) {
+    std::vector<pid_t> found;
+    for (const auto& entry : std::filesystem::directory_iterator("/proc")) {
+        std::ifstream file(entry.path() / "stat");
+        std::string pid;
+        std::string command;
+        std::string state;
+        pid_t itsParent = 0;
+        if (file >> pid >> command >> state >> itsParent && itsParent == parent &&
+            command == "(" + name + ")")
+            found.push_back(std::stoi(pid));
+    }
+    return found;
+}
 
 struct ChildRenderingTest : testing::Test, FilesOfTheService {
     ~ChildRenderingTest() override {
@@ -105,6 +128,82 @@ TEST_F(ChildRenderingTest, FailsWithTheReasonWhereItsFileDoes) {
     ASSERT_EQ(all.state, State::failed);
     EXPECT_EQ(all.error->code, static_cast<std::int64_t>(MediaErrorCode::truncated));
     EXPECT_GT(all.buffer.frames, 100'000u);
+}
+
+// Its file is in no file system that is known to answer, so it is held by its name, opened anew for each
+// reader, and handed over parked.
+TEST_F(ChildRenderingTest, PlaysAFileThatMayNotAnswer) {
+    writeWav(folder / "a.wav", makeSweep(50'000, 44100, 2));
+    std::ifstream wav(folder / "a.wav", std::ios::binary);
+    const std::string bytes(std::istreambuf_iterator<char>(wav), {});
+    const FileDescriptor memory(::memfd_create("song", MFD_CLOEXEC));
+    ASSERT_EQ(::write(memory.get(), bytes.data(), bytes.size()), static_cast<ssize_t>(bytes.size()));
+    const std::string path = "/proc/" + std::to_string(::getpid()) + "/fd/" + std::to_string(memory.get());
+    open(path);
+    EXPECT_EQ(openFile(path)->file().form, FileForm::path);
+    EXPECT_EQ(renderAll(0s, 1, sixteenBits).buffer.frames, 50'000u);
+}
+
+TEST_F(ChildRenderingTest, LosesOneItemWithAProcess) {
+    writeWav(folder / "a.wav", makeSweep(500'000, 44100, 2));
+    for (const int signal : {SIGKILL, SIGSEGV}) {
+        open(folder / "a.wav");
+        renderAll(0s, 1, sixteenBits, 10'000);
+        const auto parents = childrenOf(::getpid(), "tarn-media");
+        ASSERT_FALSE(parents.empty());
+        std::vector<pid_t> renderers;
+        for (const pid_t parent : parents)
+            std::ranges::copy(childrenOf(parent, "tarn-renderer"), std::back_inserter(renderers));
+        ASSERT_EQ(renderers.size(), 1u);
+        ::kill(renderers[0], signal);
+        const Rendered all = renderAll(0s, 1, sixteenBits);
+        ASSERT_EQ(all.state, State::failed);
+        EXPECT_EQ(all.error->code, static_cast<std::int64_t>(MediaErrorCode::damaged));
+
+        open(folder / "a.wav");
+        EXPECT_EQ(renderAll(0s, 1, sixteenBits).buffer.frames, 500'000u);
+        onLoop([this] { rendering.reset(); });
+    }
+}
+
+TEST_F(ChildRenderingTest, BelievesNoMessageThatCannotBe) {
+    const auto parent = MediaParent::start();
+    ASSERT_NE(parent, nullptr);
+    const std::function<void(const Channel&)> lies[] = {
+        [](const Channel& service) { static_cast<void>(service.send(ChildIsIdle{})); },
+        [](const Channel& service) { static_cast<void>(service.send(std::array<char, 3>{})); },
+        [](const Channel& service) { ::send(service.socket(), nullptr, 0, 0); },
+        [](const Channel& service) {
+            static_cast<void>(service.send(ItemOpened{}, std::array{STDERR_FILENO}));
+        },
+        [](const Channel& service) {
+            static_cast<void>(service.send(ItemOpened{}));
+            static_cast<void>(service.send(ItemOpened{}));
+        },
+        [](const Channel& service) {
+            static_cast<void>(service.send(ItemOpened{}));
+            static_cast<void>(service.send(More{})); // was not asked for
+        },
+        [](const Channel& service) {
+            static_cast<void>(service.send(ItemOpened{}));
+            static_cast<void>(
+                service.send(RenderingFailed{.generation = 7, .error = {}})); // of a seek that was not made
+        },
+    };
+    for (const auto& lie : lies) {
+        auto ends = Channel::makePair();
+        auto ring = RingMemory::create();
+        ASSERT_TRUE(ends && ring);
+        onLoop([&] {
+            rendering = std::make_unique<ChildRendering>(
+                loop, process, MediaChild(std::move(ends->first), parent, 1), RingReader(std::move(*ring)),
+                std::nullopt, [this] { more.release(); });
+        });
+        lie(ends->second);
+        const Rendered all = renderAll(0s, 1, sixteenBits);
+        ASSERT_EQ(all.state, State::failed) << &lie - lies;
+        EXPECT_EQ(all.error->code, static_cast<std::int64_t>(MediaErrorCode::damaged)) << &lie - lies;
+    }
 }
 
 } // namespace
