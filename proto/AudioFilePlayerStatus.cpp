@@ -1,14 +1,11 @@
 #include "proto/AudioFilePlayerStatus.h"
 
 #include "proto/ErrorUserInfo.h"
-#include "proto/MessageRules.h"
 #include "roles/Error.h"
 #include "roles/MediaItem.h"
 #include "roles/MediaQueuePlayer.h"
 
 namespace tarn {
-
-template class Message<VLProtoAudioFilePlayerStatus>;
 
 std::shared_ptr<VLProtoAudioFilePlayerStatus>
 VLProtoAudioFilePlayerStatus::statusMessageFromPlayerItem(const MediaItem& playerItem,

@@ -21,14 +21,16 @@ public:
     using playerItemIdentifiersType = std::string;
     const std::optional<TextList>& playerItemIdentifiers() const { return playerItemIdentifiers_; }
     void setPlayerItemIdentifiers(std::optional<TextList> list) { playerItemIdentifiers_ = std::move(list); }
-    void clearPlayerItemIdentifiers();
-    void addPlayerItemIdentifiers(std::string_view element);
+    void clearPlayerItemIdentifiers() { clearList(playerItemIdentifiers_); }
+    void addPlayerItemIdentifiers(std::string_view element) {
+        listCreateIfNeeded(playerItemIdentifiers_).push_back(element);
+    }
     std::size_t playerItemIdentifiersCount() const {
         return playerItemIdentifiers_ ? playerItemIdentifiers_->size() : 0;
     }
     /// Good until the list changes. Throws std::out_of_range.
     std::string_view playerItemIdentifiersAtIndex(std::size_t index) const {
-        return playerItemIdentifiers_.value().at(index);
+        return elementAt(playerItemIdentifiers_, index);
     }
 
     static constexpr auto fields() {

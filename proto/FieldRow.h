@@ -4,6 +4,7 @@
 #include <cstdint>
 #include <memory>
 #include <optional>
+#include <stdexcept>
 #include <string>
 #include <string_view>
 #include <tuple>
@@ -46,6 +47,27 @@ concept WireMessageList = WireMessage<typename Value::value_type::value_type> &&
 
 template <class Value>
 concept WireAnyList = std::same_as<Value, WireTextList> || WireMessageList<Value>;
+
+// What messages do with a list of theirs, which is there from the first element on.
+
+template <class List>
+List& listCreateIfNeeded(std::optional<List>& list) {
+    return list ? *list : list.emplace();
+}
+
+template <class List>
+void clearList(std::optional<List>& list) {
+    if (list)
+        list->clear();
+}
+
+/// Throws std::out_of_range, also without a list.
+template <class List>
+decltype(auto) elementAt(const std::optional<List>& list, std::size_t index) {
+    if (!list)
+        throw std::out_of_range("an element of a list that is not there");
+    return list->at(index);
+}
 
 /// Everything that a field can be.
 template <class Value>

@@ -58,9 +58,7 @@ bool read(ProtoReader& reader, std::shared_ptr<Embedded>& value) {
 
 template <std::derived_from<ProtoCodable> Embedded>
 bool read(ProtoReader& reader, WireList<std::shared_ptr<Embedded>>& value) {
-    if (!value)
-        value.emplace();
-    return read(reader, value->emplace_back());
+    return read(reader, listCreateIfNeeded(value).emplace_back());
 }
 
 // write: the value behind its key. A required text that holds nothing has length 0.
@@ -164,15 +162,12 @@ template <std::derived_from<ProtoCodable> Embedded>
 void merge(WireList<std::shared_ptr<Embedded>>& value, const WireList<std::shared_ptr<Embedded>>& other) {
     // The two may be one list. NOLINTNEXTLINE(performance-unnecessary-copy-initialization)
     const auto added = *other;
-    if (!value)
-        value.emplace();
-    value->insert(value->end(), added.begin(), added.end());
+    auto& list = listCreateIfNeeded(value);
+    list.insert(list.end(), added.begin(), added.end());
 }
 
 inline void merge(WireTextList& value, const WireTextList& other) {
-    if (!value)
-        value.emplace();
-    value->append(*other);
+    listCreateIfNeeded(value).append(*other);
 }
 
 // equal

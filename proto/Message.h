@@ -47,6 +47,7 @@ public:
     void mergeFrom(const Class& other);
 
     bool isEqual(const ProtoCodable& other) const final;
+    bool isEqual(const Class& other) const;
     std::uint32_t hash() const final;
     Dictionary dictionaryRepresentation() const final;
     std::string description() const final;

@@ -1,6 +1,6 @@
 #pragma once
 
-// The definitions of Message, for the one source file of each message that instantiates it.
+// The definitions of Message, for Messages.cpp, where the compiler makes the code of all messages from them.
 
 #include <sstream>
 #include <tuple>
@@ -135,10 +135,12 @@ bool Message<Class>::isEqualIn(const Row& row, const Class& other) const {
 
 template <class Class>
 bool Message<Class>::isEqual(const ProtoCodable& other) const {
-    if (typeid(other) != typeid(Class))
-        return false;
-    const auto& same = static_cast<const Class&>(other);
-    return std::apply([&](const auto&... row) { return (isEqualIn(row, same) && ...); }, rowsOf<Class>);
+    return typeid(other) == typeid(Class) && isEqual(static_cast<const Class&>(other));
+}
+
+template <class Class>
+bool Message<Class>::isEqual(const Class& other) const {
+    return std::apply([&](const auto&... row) { return (isEqualIn(row, other) && ...); }, rowsOf<Class>);
 }
 
 template <class Class>

@@ -26,14 +26,12 @@ public:
 
     using userInfoType = TransportEntry;
     const std::optional<std::vector<std::shared_ptr<TransportEntry>>>& userInfo() const { return userInfo_; }
-    void setUserInfo(std::optional<std::vector<std::shared_ptr<TransportEntry>>> list) {
-        userInfo_ = std::move(list);
+    void addUserInfo(std::shared_ptr<TransportEntry> element) {
+        listCreateIfNeeded(userInfo_).push_back(std::move(element));
     }
-    void clearUserInfo();
-    void addUserInfo(std::shared_ptr<TransportEntry> element);
     std::size_t userInfoCount() const { return userInfo_ ? userInfo_->size() : 0; }
     const std::shared_ptr<TransportEntry>& userInfoAtIndex(std::size_t index) const {
-        return userInfo_.value().at(index);
+        return elementAt(userInfo_, index);
     }
 
     static constexpr auto fields() {

@@ -17,7 +17,6 @@ public:
 
     const std::optional<Data>& data() const { return data_; }
     void setData(std::optional<Data> value) { data_ = std::move(value); }
-    bool hasData() const { return data_.has_value(); }
 
     const std::shared_ptr<TransportError>& error() const { return error_; }
     void setError(std::shared_ptr<TransportError> message) { error_ = std::move(message); }

@@ -22,11 +22,14 @@ public:
     void setObjects(std::optional<std::vector<std::shared_ptr<VLProtoVelmoObject>>> list) {
         objects_ = std::move(list);
     }
-    void clearObjects();
-    void addObject(std::shared_ptr<VLProtoVelmoObject> element);
+    void clearObjects() { clearList(objects_); }
+    void addObject(std::shared_ptr<VLProtoVelmoObject> element) {
+        listCreateIfNeeded(objects_).push_back(std::move(element));
+    }
     std::size_t objectsCount() const { return objects_ ? objects_->size() : 0; }
+    /// Throws std::out_of_range.
     const std::shared_ptr<VLProtoVelmoObject>& objectAtIndex(std::size_t index) const {
-        return objects_.value().at(index);
+        return elementAt(objects_, index);
     }
 
     static constexpr auto fields() { return std::tuple{repeated(1, "object", &Self::objects_)}; }

@@ -1,9 +1,0 @@
-#include "proto/AudioFilePlayerItemSetCurrentTime.h"
-
-#include "proto/MessageRules.h"
-
-namespace tarn {
-
-template class Message<VLProtoAudioFilePlayerItemSetCurrentTime>;
-
-} // namespace tarn

@@ -1,9 +1,0 @@
-#include "proto/AudioFileQueuePlayer.h"
-
-#include "proto/MessageRules.h"
-
-namespace tarn {
-
-template class Message<VLProtoAudioFileQueuePlayer>;
-
-} // namespace tarn

@@ -1,9 +1,0 @@
-#include "proto/TransportEntry.h"
-
-#include "proto/MessageRules.h"
-
-namespace tarn {
-
-template class Message<TransportEntry>;
-
-} // namespace tarn
