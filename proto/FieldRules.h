@@ -7,7 +7,7 @@
 #include <vector>
 
 #include "proto/FieldRow.h"
-#include "wire/BlockCache.h"
+#include "proto/MessagePool.h"
 #include "wire/ProtoReader.h"
 #include "wire/ProtoWriter.h"
 

@@ -2,6 +2,10 @@
 
 #include <gtest/gtest.h>
 
+#include <set>
+#include <thread>
+
+#include "proto/MessagePool.h"
 #include "tests/proto/AllMessages.h"
 #include "tests/proto/Generator.h"
 
@@ -119,6 +123,29 @@ TYPED_TEST(AnyMessage, DescribesItselfByClassAndFields) {
         EXPECT_TRUE(text.starts_with("<" + std::string(TypeParam::className)));
         for (const auto& [name, value] : message->dictionaryRepresentation())
             EXPECT_NE(text.find(name + " = "), std::string::npos);
+    }
+}
+
+TEST(MessagePool, LendsABlockToOneMessageAtATimeWhicheverThreadLetsItGo) {
+    using Message = VLProtoAudioFilePlayerCurrentTime;
+    std::vector<std::shared_ptr<Message>> messages;
+    double next = 0;
+    const auto make = [&] {
+        messages.push_back(newMessage<Message>());
+        messages.back()->setCurrentTime(next++);
+    };
+    for (int round = 0; round < 50; ++round) {
+        while (messages.size() < 500)
+            make();
+        std::thread([&] { // when it ends, it leaves blocks behind that others may use
+            messages.erase(messages.begin() + round, messages.begin() + 300 + round);
+            make();
+        })
+            .join();
+        std::set<double> values;
+        for (const auto& message : messages)
+            values.insert(message->currentTime());
+        ASSERT_EQ(values.size(), messages.size());
     }
 }
 

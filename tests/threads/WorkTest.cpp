@@ -5,10 +5,6 @@
 #include <array>
 #include <memory>
 #include <string>
-#include <thread>
-#include <vector>
-
-#include "wire/BlockCache.h"
 
 namespace tarn {
 namespace {
@@ -55,32 +51,6 @@ TEST(Work, MayHoldTheLastOwnerOfItself) {
     work = [owner = std::move(owner)] {};
     work = nullptr;
     EXPECT_TRUE(watched.expired());
-}
-
-TEST(BlockCache, LendsABlockToOneObjectAtATimeWhicheverThreadLetsItGo) {
-    struct Object {
-        std::size_t number;
-        std::size_t copy;
-    };
-    std::vector<std::shared_ptr<Object>> objects;
-    std::size_t next = 0;
-    for (int round = 0; round < 50; ++round) {
-        while (objects.size() < 500) {
-            const auto number = next++;
-            objects.push_back(makeCached<Object>(Object{number, number}));
-        }
-        std::thread([&] { // ends with blocks of its own, which must not be lost to others in use
-            objects.erase(objects.begin() + round, objects.begin() + 300 + round);
-            objects.push_back(makeCached<Object>(Object{next, next}));
-            ++next;
-        })
-            .join();
-        for (std::size_t i = 0; i < objects.size(); ++i) {
-            ASSERT_EQ(objects[i]->number, objects[i]->copy);
-            for (std::size_t k = i + 1; k < objects.size(); ++k)
-                ASSERT_NE(objects[i]->number, objects[k]->number);
-        }
-    }
 }
 
 } // namespace
