@@ -1,6 +1,5 @@
 #include "proto/FieldRules.h"
 
-#include <algorithm>
 #include <cmath>
 #include <functional>
 #include <limits>
@@ -24,19 +23,14 @@ bool read(ProtoReader& reader, std::optional<Data>& value) {
     return true;
 }
 
-/// The texts of a list mostly have one length: the first one tells how many the rest may hold. Room is made
-/// for so many at once, up to a few pages, and not for what a single short one among long ones promises.
+/// With the first text, room is made for the characters of all that the message still holds.
 bool read(ProtoReader& reader, WireTextList& value) {
-    constexpr std::size_t mostTexts = 1024;
-    constexpr std::size_t mostCharacters = 65536;
     const auto text = reader.readString();
     if (!text)
         return true;
     if (!value) {
         const std::size_t rest = reader.length() - reader.position();
-        value.emplace();
-        value->reserve(std::min(1 + rest / (text->size() + 2), mostTexts),
-                       std::min(text->size() + rest, mostCharacters));
+        value.emplace().reserve(text->size() + rest);
     }
     value->push_back(*text);
     return true;

@@ -24,9 +24,6 @@ void TextList::clear() {
     ends_.clear();
 }
 
-void TextList::reserve(std::size_t texts, std::size_t characters) {
-    ends_.reserve(texts);
-    characters_.reserve(characters);
-}
+void TextList::reserve(std::size_t characters) { characters_.reserve(characters); }
 
 } // namespace tarn
