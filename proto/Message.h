@@ -1,5 +1,6 @@
 #pragma once
 
+#include <bitset>
 #include <cstdint>
 #include <memory>
 #include <span>
@@ -7,7 +8,6 @@
 #include <string_view>
 
 #include "proto/FieldRow.h"
-#include "proto/PresenceSet.h"
 #include "wire/ProtoCodable.h"
 #include "wire/ProtoReader.h"
 
@@ -62,7 +62,8 @@ protected:
         presence_.set(fieldNumber);
     }
 
-    PresenceSet presence_;
+    /// Which optional scalars are present, by field number.
+    std::bitset<16> presence_;
 
 private:
     const Class& self() const { return static_cast<const Class&>(*this); }
