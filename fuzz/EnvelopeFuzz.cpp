@@ -17,7 +17,8 @@ void require(bool condition) {
 void tryEnvelope(std::span<const std::uint8_t> bytes) {
     const auto message = VLProtoVelmoMessage::fromData(bytes);
     const auto expected = expectedEncoding(bytes);
-    require((message != nullptr) == expected.has_value());
+    const auto command = VLProtoVelmoMessage::fromDataWithoutPlist(bytes);
+    require((message != nullptr) == expected.has_value() && (command != nullptr) == expected.has_value());
     if (!message)
         return;
     const Data encoding = message->serialize();
@@ -28,6 +29,8 @@ void tryEnvelope(std::span<const std::uint8_t> bytes) {
 
     const auto copy = message->copyWithZone();
     require(copy->serialize() == encoding && copy->hash() == message->hash());
+    copy->setPlist(nullptr);
+    require(copy->serialize() == command->serialize());
     VLProtoVelmoMessage merged;
     merged.mergeFrom(*message);
     require(merged.isEqual(*message) == message->isEqual(*message)); // not-a-number differs from itself

@@ -225,7 +225,7 @@ PlayQueue::Ending PlayQueue::end(Entries::iterator entry, Timeline::End how,
     state.playedToEnd = ending.driven && !state.driver && how == Timeline::End::completed;
     if (how == Timeline::End::failed && state.status != MediaStatus::failed) {
         state.status = MediaStatus::failed;
-        state.error = error;
+        state.error = error ? std::make_unique<const Error>(*error) : nullptr;
         ending.statusChanged = true;
     }
     if (entries_.empty())

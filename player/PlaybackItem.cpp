@@ -30,7 +30,7 @@ MediaStatus PlaybackItem::status() const {
 
 std::optional<Error> PlaybackItem::error() const {
     EngineLock lock(environment_);
-    return state_.error;
+    return state_.error ? std::optional(*state_.error) : std::nullopt;
 }
 
 MediaTime PlaybackItem::currentTime() const {

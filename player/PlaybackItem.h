@@ -1,12 +1,12 @@
 #pragma once
 
 #include <chrono>
+#include <memory>
 
 #include "observation/ObserverList.h"
 #include "player/PlayerEnvironment.h"
 #include "roles/MediaItem.h"
 #include "threads/LiveObjects.h"
-#include "wire/Boxed.h"
 
 namespace tarn {
 
@@ -30,7 +30,7 @@ public:
 
     struct State {
         MediaStatus status = MediaStatus::unknown;
-        Boxed<Error> error;                   // most items never fail
+        std::unique_ptr<const Error> error;   ///< null for most items, so it takes no place in them
         PlayQueue* driver = nullptr;          ///< the queue that it entered last, while it stands in it
         std::chrono::nanoseconds position{0}; ///< where playing goes on; up to date while no queue drives it
         bool playedToEnd = false;             ///< so it begins anew when it enters a queue again

@@ -13,7 +13,6 @@
 
 #include "proto/TextList.h"
 #include "roles/Data.h"
-#include "wire/Boxed.h"
 #include "wire/ProtoCodable.h"
 
 namespace tarn {
@@ -28,8 +27,7 @@ concept WireScalar =
 
 /// How a message holds text or bytes: absent and empty differ.
 template <class Value>
-concept WireText =
-    OneOf<Value, std::optional<std::string>, std::optional<Data>, Boxed<std::string>, Boxed<Data>>;
+concept WireText = OneOf<Value, std::optional<std::string>, std::optional<Data>>;
 
 /// How a message holds an embedded message: shared, so that a payload can be stored in several.
 template <class Value>

@@ -38,14 +38,6 @@ bool read(ProtoReader& reader, Number& value) {
     return true;
 }
 
-template <class Value>
-bool read(ProtoReader& reader, Boxed<Value>& value) {
-    std::optional<Value> plain;
-    const bool goesOn = read(reader, plain);
-    value = std::move(plain);
-    return goesOn;
-}
-
 template <std::derived_from<ProtoCodable> Embedded>
 bool read(ProtoReader& reader, std::shared_ptr<Embedded>& value) {
     value = newMessage<Embedded>();
@@ -59,6 +51,35 @@ bool read(ProtoReader& reader, std::shared_ptr<Embedded>& value) {
 template <std::derived_from<ProtoCodable> Embedded>
 bool read(ProtoReader& reader, WireList<std::shared_ptr<Embedded>>& value) {
     return read(reader, listCreateIfNeeded(value).emplace_back());
+}
+
+// pass: reads over a value, as strictly as read() does, and keeps nothing of it.
+
+template <WireScalar Scalar>
+bool pass(ProtoReader& reader) {
+    Scalar ignored;
+    return read(reader, ignored);
+}
+
+template <class Text>
+requires WireText<Text> || std::same_as<Text, WireTextList>
+bool pass(ProtoReader& reader) {
+    reader.readData();
+    return true;
+}
+
+template <WireMessage Embedded>
+bool pass(ProtoReader& reader) {
+    std::uint32_t mark = 0;
+    if (!reader.placeMark(mark) || !Embedded::element_type::pass(reader))
+        return false;
+    reader.recallMark(mark);
+    return true;
+}
+
+template <WireMessageList List>
+bool pass(ProtoReader& reader) {
+    return pass<typename List::value_type::value_type>(reader);
 }
 
 // write: the value behind its key. A required text that holds nothing has length 0.
@@ -97,11 +118,6 @@ void write(ProtoWriter& writer, unsigned number, const WireList<std::shared_ptr<
 
 template <class Object>
 bool holds(const std::optional<Object>& value) {
-    return value.has_value();
-}
-
-template <class Object>
-bool holds(const Boxed<Object>& value) {
     return value.has_value();
 }
 
@@ -177,11 +193,6 @@ bool equal(const Value& left, const Value& right) {
     return left == right;
 }
 
-template <class Value>
-bool equal(const Boxed<Value>& left, const Boxed<Value>& right) {
-    return left.get() == right.get();
-}
-
 template <std::derived_from<ProtoCodable> Embedded>
 bool equal(const std::shared_ptr<Embedded>& left, const std::shared_ptr<Embedded>& right) {
     return left && right ? left->isEqual(*right) : left == right;
@@ -233,11 +244,6 @@ void put(Dictionary& dictionary, std::string_view name, const Value& value) {
 template <class Object>
 void put(Dictionary& dictionary, std::string_view name, const std::optional<Object>& value) {
     dictionary.emplace(name, DictionaryValue{*value});
-}
-
-template <class Object>
-void put(Dictionary& dictionary, std::string_view name, const Boxed<Object>& value) {
-    put(dictionary, name, value.get());
 }
 
 void put(Dictionary& dictionary, std::string_view name, const WireTextList& value);

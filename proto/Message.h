@@ -33,6 +33,9 @@ public:
     /// Null when the bytes cannot be decoded. No bytes are an empty message.
     static std::shared_ptr<Class> fromData(std::span<const std::uint8_t> data);
 
+    /// Would readFrom() succeed? Moves the reader as that does, and builds nothing.
+    static bool pass(ProtoReader& reader);
+
     bool readFrom(ProtoReader& reader) final;
     void writeTo(ProtoWriter& writer) const final;
 
@@ -55,6 +58,11 @@ public:
 protected:
     using Self = Class;
 
+    /// Reads field after field; `readValue(row)` reads the value of a field that the class has, and is false
+    /// when decoding has to stop there.
+    template <class ReadValue>
+    static bool readFields(ProtoReader& reader, ReadValue readValue);
+
     /// Sets an optional scalar and marks it present.
     template <WireScalar Scalar>
     void setFlagged(unsigned fieldNumber, Scalar& field, Scalar value) {
@@ -69,7 +77,6 @@ private:
     const Class& self() const { return static_cast<const Class&>(*this); }
     Class& self() { return static_cast<Class&>(*this); }
 
-    bool readField(ProtoReader& reader, ProtoKey key);
     template <class Row>
     bool hasValue(const Row& row) const;
     template <class Row>

@@ -32,30 +32,40 @@ std::shared_ptr<Class> Message<Class>::fromData(std::span<const std::uint8_t> da
 }
 
 template <class Class>
-bool Message<Class>::readFrom(ProtoReader& reader) {
+template <class ReadValue>
+bool Message<Class>::readFields(ProtoReader& reader, ReadValue readValue) {
     while (reader.position() < reader.length() && !reader.hasError()) {
         const ProtoKey key(reader.readVarint());
         if (key.wireType == WireType::endGroup || reader.hasError())
             break;
-        if (!readField(reader, key))
+        bool goesOn = false;
+        const auto readIfIts = [&](const auto& row) {
+            if (row.number != key.fieldNumber)
+                return false;
+            goesOn = readValue(row);
+            return true;
+        };
+        const bool known =
+            std::apply([&](const auto&... row) { return (readIfIts(row) || ...); }, rowsOf<Class>);
+        if (!(known ? goesOn : reader.skipValue(key.fieldNumber, key.wireType)))
             return false;
     }
     return !reader.hasError();
 }
 
 template <class Class>
-bool Message<Class>::readField(ProtoReader& reader, ProtoKey key) {
-    bool goesOn = false;
-    const auto readIfIts = [&]<class Row>(const Row& row) {
-        if (row.number != key.fieldNumber)
-            return false;
+bool Message<Class>::readFrom(ProtoReader& reader) {
+    return readFields(reader, [&]<class Row>(const Row& row) {
         if constexpr (Row::hasPresenceFlag)
             presence_.set(row.number);
-        goesOn = fieldRules::read(reader, self().*row.member);
-        return true;
-    };
-    const bool known = std::apply([&](const auto&... row) { return (readIfIts(row) || ...); }, rowsOf<Class>);
-    return known ? goesOn : reader.skipValue(key.fieldNumber, key.wireType);
+        return fieldRules::read(reader, self().*row.member);
+    });
+}
+
+template <class Class>
+bool Message<Class>::pass(ProtoReader& reader) {
+    return readFields(reader,
+                      [&]<class Row>(const Row&) { return fieldRules::pass<typename Row::Value>(reader); });
 }
 
 /// Does the field hold something: an object, or a scalar that is not marked absent?

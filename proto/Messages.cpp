@@ -32,4 +32,17 @@ template class Message<TransportError>;
 template class Message<TransportReply>;
 template class Message<TransportExtension>;
 
+std::shared_ptr<VLProtoVelmoMessage>
+VLProtoVelmoMessage::fromDataWithoutPlist(std::span<const std::uint8_t> data) {
+    auto message = newMessage<VLProtoVelmoMessage>();
+    ProtoReader reader(data);
+    const bool decoded = readFields(reader, [&]<class Row>(const Row& row) {
+        if constexpr (std::same_as<typename Row::Value, std::shared_ptr<VLProtoVelmoPlist>>)
+            return fieldRules::pass<typename Row::Value>(reader);
+        else
+            return fieldRules::read(reader, (*message).*row.member);
+    });
+    return decoded ? message : nullptr;
+}
+
 } // namespace tarn

@@ -9,11 +9,17 @@
 
 namespace tarn {
 
-/// The envelope: everything that a client sends, and every event that it is sent, is one of these. The
-/// property list is carried for others; this system neither makes nor reads it.
+/// The envelope: everything that a client sends, and every event that it is sent, is one of these.
+///
+/// The property list belongs to other users of the same envelope. This system neither makes one nor looks at
+/// the values of one.
 class VLProtoVelmoMessage final : public Message<VLProtoVelmoMessage> {
 public:
     static constexpr std::string_view className = "VLProtoVelmoMessage";
+
+    /// As fromData(), but the message is without its property list. The list is checked as strictly and then
+    /// forgotten: a frame may hold half a million values, which would take more than a hundred megabytes.
+    static std::shared_ptr<VLProtoVelmoMessage> fromDataWithoutPlist(std::span<const std::uint8_t> data);
 
     const std::shared_ptr<VLProtoVelmoPlist>& plist() const { return plist_; }
     void setPlist(std::shared_ptr<VLProtoVelmoPlist> message) { plist_ = std::move(message); }

@@ -8,12 +8,10 @@
 
 #include "proto/Message.h"
 #include "roles/Data.h"
-#include "wire/Boxed.h"
 
 namespace tarn {
 
-/// One typed value of a property list. Its texts and data are boxed: a frame may hold half a million of
-/// these.
+/// One typed value of a property list.
 ///
 /// Field 3 is reserved for a message that this system does not define: it is skipped like an unknown field,
 /// and `cacheMessage` is a local slot that no rule of the messages looks at.
@@ -29,11 +27,11 @@ public:
     bool hasSubtype() const { return presence_[2]; }
     void setHasSubtype(bool present) { presence_.set(2, present); }
 
-    const std::optional<std::string>& key() const { return key_.get(); }
+    const std::optional<std::string>& key() const { return key_; }
     void setKey(std::optional<std::string> value) { key_ = std::move(value); }
     bool hasKey() const { return key_.has_value(); }
 
-    const std::optional<std::string>& text() const { return text_.get(); }
+    const std::optional<std::string>& text() const { return text_; }
     void setText(std::optional<std::string> value) { text_ = std::move(value); }
     bool hasText() const { return text_.has_value(); }
 
@@ -72,7 +70,7 @@ public:
     bool hasNbool() const { return presence_[12]; }
     void setHasNbool(bool present) { presence_.set(12, present); }
 
-    const std::optional<Data>& object() const { return object_.get(); }
+    const std::optional<Data>& object() const { return object_; }
     void setObject(std::optional<Data> value) { object_ = std::move(value); }
     bool hasObject() const { return object_.has_value(); }
 
@@ -91,8 +89,8 @@ public:
 private:
     std::int32_t type_ = 0;
     std::int32_t subtype_ = 0;
-    Boxed<std::string> key_;
-    Boxed<std::string> text_;
+    std::optional<std::string> key_;
+    std::optional<std::string> text_;
     double ndouble_ = 0;
     float nfloat_ = 0;
     std::int64_t nint64_ = 0;
@@ -100,7 +98,7 @@ private:
     std::uint64_t nuint64_ = 0;
     std::uint32_t nuint32_ = 0;
     bool nbool_ = false;
-    Boxed<Data> object_;
+    std::optional<Data> object_;
     std::shared_ptr<void> cacheMessage_;
 };
 

@@ -19,7 +19,7 @@ namespace {
 
 /// Null, with a log line, for data that is no envelope.
 std::shared_ptr<VLProtoVelmoMessage> envelopeFromData(const Data& data) {
-    auto envelope = VLProtoVelmoMessage::fromData(data);
+    auto envelope = VLProtoVelmoMessage::fromDataWithoutPlist(data);
     if (envelope == nullptr)
         SystemLog::error("-[VLLongFormAudioServer receiveData:callback:]", 97,
                          "%{public}s:%d: failed to initialize protoMessage, data=%p, len=%d", data.data(),

@@ -64,7 +64,7 @@ std::optional<double> decodeCurrentTime(const Data& payload) {
 }
 
 std::optional<client::Event> decodeEvent(const Data& envelope) {
-    const auto message = VLProtoVelmoMessage::fromData(envelope);
+    const auto message = VLProtoVelmoMessage::fromDataWithoutPlist(envelope);
     if (!message || !message->audioFilePlayerMessage())
         return std::nullopt;
     const auto& audio = *message->audioFilePlayerMessage();

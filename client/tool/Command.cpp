@@ -69,7 +69,7 @@ void writeValue(ProtoWriter& writer, std::string_view field, unsigned number, co
         writer.writeDouble(parseNumber<double>(field, text), number);
     else if constexpr (std::is_arithmetic_v<Value>)
         writer.writeInt64(parseNumber<std::int64_t>(field, text), number);
-    else if constexpr (std::is_same_v<Value, std::optional<Data>> || std::is_same_v<Value, Boxed<Data>>)
+    else if constexpr (std::is_same_v<Value, std::optional<Data>>)
         writer.writeData(parseHexadecimal(field, text), number);
     else
         writer.writeString(text, number);

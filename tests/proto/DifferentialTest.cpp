@@ -33,6 +33,8 @@ std::optional<Data> refereed(std::string_view className, const Data& bytes) {
 template <class Message>
 std::optional<Data> ours(const Data& bytes) {
     const auto message = Message::fromData(bytes);
+    ProtoReader reader(bytes);
+    EXPECT_EQ(Message::pass(reader), message != nullptr);
     return message ? std::optional(message->serialize()) : std::nullopt;
 }
 
