@@ -150,12 +150,8 @@ private:
     }
 
     void addInfo() {
-        auto* info = add("info", "Show what the service reads from files", [this] {
-            info_.socketPath = socketPath_;
-            return runInfo(info_);
-        });
+        auto* info = add("info", "Show what files say of themselves", [this] { return runInfo(info_); });
         info->add_flag("--json", info_.asJSON, "Print one JSON object for each file");
-        addGrant(*info, info_.access);
         info->add_option("FILE", info_.paths, "What to read")->required();
     }
 

@@ -1,67 +1,93 @@
 #include "client/tool/Info.h"
 
-#include <exception>
 #include <iostream>
-#include <stdexcept>
+#include <memory>
+#include <utility>
+
+#include <tarn/Client.h>
 
 #include "client/tool/display/Columns.h"
 #include "client/tool/display/OutputLine.h"
 #include "client/tool/display/TimeText.h"
-#include "client/tool/play/ServiceCheck.h"
+#include "log/SystemLog.h"
+#include "media/AssetOpener.h"
 
 namespace tarn::tool {
 
 namespace {
 
-void printLine(const char* name, const std::optional<std::string>& text) {
-    if (text && !text->empty())
-        std::cout << "  " << name << printable(*text) << "\n";
+/// What the service would write down concerns nobody here.
+class Silence final : public LogSink {
+    void write(const LogRecord&) override {}
+};
+
+class NoGrantedFiles final : public FileAccess {
+    SharedFile open(const std::string&) override { return nullptr; }
+};
+
+std::string textOf(const Error& error) {
+    const auto text = [&](const char* key) {
+        const auto found = error.userInfo.find(key);
+        return found == error.userInfo.end() ? std::string() : found->second;
+    };
+    const std::string reason = text(localizedFailureReasonKey);
+    return text(localizedDescriptionKey) + (reason.empty() ? "" : " (" + reason + ")");
 }
 
-void print(const Track& track) {
-    std::cout << printable(track.path) << "\n";
-    printLine("title     ", track.info.title);
-    printLine("artist    ", track.info.artist);
-    printLine("album     ", track.info.albumTitle);
-    printLine("duration  ", timeText(track.info.duration));
+/// What is shown, with the names that it has in JSON and for people.
+std::vector<std::pair<const char*, std::optional<std::string>>> textsOf(const MediaAsset& asset) {
+    std::vector<std::pair<const char*, std::optional<std::string>>> texts{
+        {"title", {}}, {"artist", {}}, {"albumTitle", {}}};
+    const std::string_view keys[] = {MediaMetadataItem::commonKeyTitle, MediaMetadataItem::commonKeyArtist,
+                                     MediaMetadataItem::commonKeyAlbumName};
+    for (const MediaMetadataItem& item : asset.commonMetadata())
+        for (std::size_t i = 0; i < texts.size(); ++i)
+            if (item.key() == keys[i])
+                texts[i].second = item.stringValue();
+    return texts;
 }
 
-void printJSON(const Track& track) {
+void printLine(const char* name, const std::string& text) {
+    std::cout << "  " << name << printable(text) << "\n";
+}
+
+void print(const std::string& path, const MediaAsset& asset) {
+    constexpr const char* labels[] = {"title     ", "artist    ", "album     "};
+    std::cout << printable(path) << "\n";
+    const auto texts = textsOf(asset);
+    for (std::size_t i = 0; i < texts.size(); ++i)
+        if (texts[i].second && !texts[i].second->empty())
+            printLine(labels[i], *texts[i].second);
+    printLine("duration  ", timeText(asset.duration().seconds()));
+}
+
+void printJSON(const std::string& path, const MediaAsset& asset) {
     Dictionary fields;
-    fields["path"].value = track.path;
-    fields["duration"].value = track.info.duration;
-    if (track.info.title)
-        fields["title"].value = *track.info.title;
-    if (track.info.artist)
-        fields["artist"].value = *track.info.artist;
-    if (track.info.albumTitle)
-        fields["albumTitle"].value = *track.info.albumTitle;
+    fields["path"].value = path;
+    fields["duration"].value = asset.duration().seconds();
+    for (const auto& [name, text] : textsOf(asset))
+        if (text)
+            fields[name].value = *text;
     std::cout << outputLine(LineFormat::JSON, "file", fields) << "\n";
-}
-
-Track open(client::Client& client, const std::string& path, Access access) {
-    client::AssetUpsert upsert{.identifier = "info", .URL = client::fileURL(path)};
-    if (access == Access::granted)
-        upsert.sandboxExtensionToken = client.grantFile(path);
-    const auto result = client.await(client.upsertAsset(upsert));
-    if (result.outcome != client::Outcome::answered)
-        throw std::runtime_error(result.succeeded() ? "the service gave no answer" : result.problem());
-    return {path, "info", 0, 0, result.value};
 }
 
 } // namespace
 
 int runInfo(const InfoOptions& options) {
-    client::Client client({.socketPath = options.socketPath, .reconnectLimit = std::chrono::seconds(30)});
-    checkThatServiceAnswers(client);
+    SystemLog::setSink(std::make_shared<Silence>());
+    MediaProcess process;
+    FilePorter porter(process);
+    FileExaminer examiner(process, porter);
+    NoGrantedFiles access;
+    const AssetOpener opener(access, porter, examiner);
     int status = 0;
-    for (const auto& path : options.paths) {
-        try {
-            const auto track = open(client, path, options.access);
-            options.asJSON ? printJSON(track) : print(track);
-        } catch (const std::exception& problem) {
+    for (const std::string& path : options.paths) {
+        const MediaAssetOutcome outcome = opener.open(client::fileURL(path));
+        if (outcome.asset) {
+            options.asJSON ? printJSON(path, *outcome.asset) : print(path, *outcome.asset);
+        } else {
             status = 1;
-            std::cerr << "tarnctl: " << printable(path + ": " + problem.what()) << "\n";
+            std::cerr << "tarnctl: " << printable(path + ": " + textOf(outcome.error)) << "\n";
         }
     }
     return status;

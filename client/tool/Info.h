@@ -3,18 +3,15 @@
 #include <string>
 #include <vector>
 
-#include "client/tool/play/Track.h"
-
 namespace tarn::tool {
 
 struct InfoOptions {
-    std::string socketPath;
     std::vector<std::string> paths;
-    Access access = Access::service;
     bool asJSON = false;
 };
 
-/// Shows what the service reads from files. Returns the exit status: 1 when it could not read one.
+/// Shows what files say of themselves, read as the service reads them, which need not run for that. Returns
+/// the exit status: 1 when one could not be read.
 int runInfo(const InfoOptions& options);
 
 } // namespace tarn::tool
