@@ -127,7 +127,10 @@ void SystemOutput::start() {
     } else if (route_.mode() == SoundRoute::Mode::silent) {
         const nanoseconds now = loop_.now();
         clock_.run(clock_.heard(now), now);
-        later([](SystemOutput& self) { self.tellSilence(); });
+        later([](SystemOutput& self) {
+            self.tellSilence();
+            self.listener_.outputIsWritable(); // which it was not before this start
+        });
     } else {
         clock_.await(loop_.now());
     }
