@@ -14,7 +14,7 @@ else()
     include(CheckCXXCompilerFlag)
     foreach(flag -fstack-clash-protection -fcf-protection -mbranch-protection=standard -ftrivial-auto-var-init=zero)
         string(MAKE_C_IDENTIFIER "hardening${flag}" known)
-        check_cxx_compiler_flag(${flag} ${known})
+        check_cxx_compiler_flag("-Werror ${flag}" ${known}) # some only warn of what they do not know
         if(${known})
             add_compile_options(${flag})
         endif()

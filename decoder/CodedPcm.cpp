@@ -8,8 +8,8 @@ namespace tarn {
 
 namespace {
 
-constexpr std::size_t pieceSize = 32 * 1024; // more than two frames of any of them
-constexpr std::size_t mpegPieceSize = 8 * 1024;
+constexpr std::size_t pieceSize = std::size_t{32} * 1024; // more than two frames of any of them
+constexpr std::size_t mpegPieceSize = std::size_t{8} * 1024;
 constexpr int suspiciousFrames = 3;
 
 // In 16 or 14 bits of each sample, of either byte order.

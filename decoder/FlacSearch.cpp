@@ -9,7 +9,7 @@ namespace tarn {
 
 namespace {
 
-constexpr std::int64_t closeEnough = 32 * 1024;
+constexpr std::int64_t closeEnough = std::int64_t{32} * 1024;
 constexpr std::size_t longestHeader = 16;
 constexpr std::int64_t largestFrame = 1 << 20; // eight channels of 32 bits could need more; no music does
 

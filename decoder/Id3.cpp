@@ -25,7 +25,7 @@ std::optional<Id3Tag> Id3Tag::at(ByteSource& source, std::int64_t offset) {
         return std::nullopt;
     const auto flags = static_cast<unsigned char>(header[5]);
     Id3Tag tag;
-    tag.version = header[3];
+    tag.version = static_cast<unsigned char>(header[3]);
     tag.extended = tag.version > 2 && (flags & 0x40) != 0;
     tag.begin = offset;
     tag.end = offset + headerSize + synchsafe(std::string_view(header).substr(6));

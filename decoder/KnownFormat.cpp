@@ -9,7 +9,7 @@ namespace tarn {
 namespace {
 
 constexpr std::size_t longestSignature = 40;
-constexpr std::size_t framesPiece = 8 * 1024;
+constexpr std::size_t framesPiece = std::size_t{8} * 1024;
 constexpr int convincingFrames = 4;
 
 struct Signature {

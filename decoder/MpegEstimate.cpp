@@ -10,7 +10,7 @@ namespace tarn {
 namespace {
 
 constexpr int places = 64;
-constexpr std::size_t sampleSize = 8 * 1024;
+constexpr std::size_t sampleSize = std::size_t{8} * 1024;
 constexpr int framesOfARun = 3;
 
 MpegFrameRun firstRun(std::string_view piece) {

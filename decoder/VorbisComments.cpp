@@ -9,7 +9,7 @@ namespace tarn {
 
 namespace {
 
-constexpr std::size_t longestBlock = 64 * 1024; // what lies behind it are pictures
+constexpr std::size_t longestBlock = std::size_t{64} * 1024; // what lies behind it are pictures
 constexpr int mostPages = 64;
 constexpr int mostBlocks = 1'000;
 

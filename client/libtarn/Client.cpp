@@ -69,17 +69,16 @@ public:
 
     bool isLeftBehind() const { return session_.link()->mark().isLeftBehind(); }
 
-    void perform(Command command, const Handler<Completion>& ended) {
-        start(std::move(command), [ended](Answer answer) {
+    void perform(Command command, Handler<Completion> ended) {
+        start(std::move(command), [ended = std::move(ended)](Answer answer) {
             if (ended)
                 ended({answer.outcome, std::move(answer.error)});
         });
     }
 
     template <class Value>
-    void ask(Command command, std::optional<Value>(*decode)(const Bytes&),
-             const Handler<Result<Value>>& ended) {
-        start(std::move(command), [decode, ended](Answer answer) {
+    void ask(Command command, std::optional<Value>(*decode)(const Bytes&), Handler<Result<Value>> ended) {
+        start(std::move(command), [decode, ended = std::move(ended)](Answer answer) {
             Result<Value> result{{answer.outcome, std::move(answer.error)}, {}};
             if (answer.data)
                 result.value = decode(*answer.data).value_or(Value());
@@ -192,7 +191,7 @@ std::future<Result<AssetInfo>> Client::upsertAsset(const AssetUpsert& asset) {
 }
 
 void Client::upsertAsset(const AssetUpsert& asset, Handler<Result<AssetInfo>> ended) {
-    implementation_->ask(commands::upsertAsset(asset), decodeAssetInfo, ended);
+    implementation_->ask(commands::upsertAsset(asset), decodeAssetInfo, std::move(ended));
 }
 
 std::future<Completion> Client::destroyAsset(const std::string& asset) {
@@ -200,7 +199,7 @@ std::future<Completion> Client::destroyAsset(const std::string& asset) {
 }
 
 void Client::destroyAsset(const std::string& asset, Handler<Completion> ended) {
-    implementation_->perform(commands::destroyAsset(asset), ended);
+    implementation_->perform(commands::destroyAsset(asset), std::move(ended));
 }
 
 std::future<Result<Status>> Client::upsertItem(const std::string& item, const std::string& asset) {
@@ -208,7 +207,7 @@ std::future<Result<Status>> Client::upsertItem(const std::string& item, const st
 }
 
 void Client::upsertItem(const std::string& item, const std::string& asset, Handler<Result<Status>> ended) {
-    implementation_->ask(commands::upsertItem(item, asset), decodeStatus, ended);
+    implementation_->ask(commands::upsertItem(item, asset), decodeStatus, std::move(ended));
 }
 
 std::future<Completion> Client::destroyItem(const std::string& item) {
@@ -216,7 +215,7 @@ std::future<Completion> Client::destroyItem(const std::string& item) {
 }
 
 void Client::destroyItem(const std::string& item, Handler<Completion> ended) {
-    implementation_->perform(commands::destroyItem(item), ended);
+    implementation_->perform(commands::destroyItem(item), std::move(ended));
 }
 
 std::future<Result<double>> Client::currentTime(const std::string& item) {
@@ -227,7 +226,7 @@ void Client::currentTime(const std::string& item, Handler<Result<double>> ended)
     if (const auto position = implementation_->positionWhileAway(item); position && ended)
         ended({{Outcome::answered, {}}, *position});
     else
-        implementation_->ask(commands::currentTime(item), decodeCurrentTime, ended);
+        implementation_->ask(commands::currentTime(item), decodeCurrentTime, std::move(ended));
 }
 
 std::future<Completion> Client::setCurrentTime(const std::string& item, double seconds) {
@@ -235,7 +234,7 @@ std::future<Completion> Client::setCurrentTime(const std::string& item, double s
 }
 
 void Client::setCurrentTime(const std::string& item, double seconds, Handler<Completion> ended) {
-    implementation_->perform(commands::setCurrentTime(item, seconds), ended);
+    implementation_->perform(commands::setCurrentTime(item, seconds), std::move(ended));
 }
 
 std::future<Result<Status>> Client::upsertQueuePlayer(const std::string& player,
@@ -245,7 +244,7 @@ std::future<Result<Status>> Client::upsertQueuePlayer(const std::string& player,
 
 void Client::upsertQueuePlayer(const std::string& player, const std::vector<std::string>& items,
                                Handler<Result<Status>> ended) {
-    implementation_->ask(commands::upsertQueuePlayer(player, items), decodeStatus, ended);
+    implementation_->ask(commands::upsertQueuePlayer(player, items), decodeStatus, std::move(ended));
 }
 
 std::future<Completion> Client::destroyQueuePlayer(const std::string& player) {
@@ -253,7 +252,7 @@ std::future<Completion> Client::destroyQueuePlayer(const std::string& player) {
 }
 
 void Client::destroyQueuePlayer(const std::string& player, Handler<Completion> ended) {
-    implementation_->perform(commands::destroyQueuePlayer(player), ended);
+    implementation_->perform(commands::destroyQueuePlayer(player), std::move(ended));
 }
 
 std::future<Completion> Client::setRate(const std::string& player, float rate) {
@@ -261,7 +260,7 @@ std::future<Completion> Client::setRate(const std::string& player, float rate) {
 }
 
 void Client::setRate(const std::string& player, float rate, Handler<Completion> ended) {
-    implementation_->perform(commands::setRate(player, rate), ended);
+    implementation_->perform(commands::setRate(player, rate), std::move(ended));
 }
 
 std::future<Completion> Client::advanceToNextItem(const std::string& player) {
@@ -269,7 +268,7 @@ std::future<Completion> Client::advanceToNextItem(const std::string& player) {
 }
 
 void Client::advanceToNextItem(const std::string& player, Handler<Completion> ended) {
-    implementation_->perform(commands::advanceToNextItem(player), ended);
+    implementation_->perform(commands::advanceToNextItem(player), std::move(ended));
 }
 
 std::future<Completion> Client::appendItem(const std::string& player, const std::string& item) {
@@ -277,7 +276,7 @@ std::future<Completion> Client::appendItem(const std::string& player, const std:
 }
 
 void Client::appendItem(const std::string& player, const std::string& item, Handler<Completion> ended) {
-    implementation_->perform(commands::appendItem(player, item), ended);
+    implementation_->perform(commands::appendItem(player, item), std::move(ended));
 }
 
 std::future<Completion> Client::removeItem(const std::string& player, const std::string& item) {
@@ -285,7 +284,7 @@ std::future<Completion> Client::removeItem(const std::string& player, const std:
 }
 
 void Client::removeItem(const std::string& player, const std::string& item, Handler<Completion> ended) {
-    implementation_->perform(commands::removeItem(player, item), ended);
+    implementation_->perform(commands::removeItem(player, item), std::move(ended));
 }
 
 std::future<Completion> Client::removeAllItems(const std::string& player) {
@@ -293,7 +292,7 @@ std::future<Completion> Client::removeAllItems(const std::string& player) {
 }
 
 void Client::removeAllItems(const std::string& player, Handler<Completion> ended) {
-    implementation_->perform(commands::removeAllItems(player), ended);
+    implementation_->perform(commands::removeAllItems(player), std::move(ended));
 }
 
 std::future<Completion> Client::replaceCurrentItem(const std::string& player, const std::string& item) {
@@ -302,7 +301,7 @@ std::future<Completion> Client::replaceCurrentItem(const std::string& player, co
 
 void Client::replaceCurrentItem(const std::string& player, const std::string& item,
                                 Handler<Completion> ended) {
-    implementation_->perform(commands::replaceCurrentItem(player, item), ended);
+    implementation_->perform(commands::replaceCurrentItem(player, item), std::move(ended));
 }
 
 std::string Client::grantFile(const std::string& path) {

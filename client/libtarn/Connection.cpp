@@ -31,8 +31,9 @@ Connection::~Connection() {
 
 void Connection::call(const Bytes& envelope, AnswerHandler handler) {
     Link::requireThatItFits(envelope);
+    // A link that does not take the call leaves the handler alone.
     if (implementation_->isLeftBehind() || !implementation_->link->call(envelope, std::move(handler)))
-        handler(Answer{});
+        handler(Answer{}); // NOLINT(bugprone-use-after-move)
     else
         implementation_->link->waitForRoom();
 }

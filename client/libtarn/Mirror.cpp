@@ -263,7 +263,7 @@ std::vector<Event> Mirror::itemChangesSince(const Mirror& before,
             status.error = failure->second;
         changes.emplace_back(client::ItemStatusChanged{name, std::move(status)});
         if (std::ranges::any_of(before.players_,
-                                [&](const auto& entry) { return contains(entry.second, item); }))
+                                [&held = item](const auto& entry) { return contains(entry.second, held); }))
             changes.emplace_back(client::ItemFailedToPlayToEnd{name});
     }
     return changes;

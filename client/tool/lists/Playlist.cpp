@@ -39,6 +39,7 @@ std::vector<std::string> numberedEntries(std::string_view text) {
         entries[number] = trimmed(line.substr(equals + 1));
     });
     std::vector<std::string> inOrder;
+    inOrder.reserve(entries.size());
     for (auto& [number, entry] : entries)
         inOrder.push_back(std::move(entry));
     return inOrder;

@@ -14,7 +14,7 @@ namespace tarn::tool {
 int runPlay(const PlayOptions& options) {
     auto listing = listFiles(options.names, std::cin);
     for (const auto& [name, reason] : listing.refused)
-        std::cerr << "tarnctl: " << printable(name + ": " + reason) << std::endl;
+        std::cerr << "tarnctl: " << printable(std::string(name).append(": ").append(reason)) << std::endl;
     if (listing.files.empty())
         return 1;
     if (options.playback.rate < 0 && listing.files.size() > 1)

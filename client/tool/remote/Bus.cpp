@@ -25,7 +25,7 @@ struct CallError {
         return (... || (sd_bus_error_has_name(&error, names) != 0));
     }
 
-    sd_bus_error error = SD_BUS_ERROR_NULL;
+    sd_bus_error error{nullptr, nullptr, 0};
 };
 
 [[noreturn]] void throwProblem(const CallError& problem, int result) {

@@ -38,7 +38,7 @@ std::string takeFirstText(sd_bus_message* message) {
     requireBus(sd_bus_message_enter_container(message, 'v', "as"));
     requireBus(sd_bus_message_enter_container(message, 'a', "s"));
     const char* text = nullptr;
-    const std::string first = sd_bus_message_read(message, "s", &text) > 0 ? text : "";
+    std::string first = sd_bus_message_read(message, "s", &text) > 0 ? text : "";
     while (sd_bus_message_skip(message, "s") > 0) {
     }
     requireBus(sd_bus_message_exit_container(message));

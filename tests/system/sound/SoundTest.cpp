@@ -55,13 +55,14 @@ double positionError(const MediaQueuePlayer& player, const Recorder& recorder, c
 }
 
 TEST_F(SoundTest, TellsThePositionThatIsHeard) {
-    const Recording recording = makeSweep(6 * second, 44100, 2);
+    const Recording recording =
+        makeSweep(10 * second, 44100, 2); // a busy machine comes late to the last looks
     const auto player = makePlayer({makeItem(recording)});
     const Recorder recorder;
     player->setRate(1);
     recorder.waitFrames(22'050);
     double before = 0;
-    for (int i = 0; i < 40; ++i) {
+    for (int i = 0; i < 25; ++i) {
         recorder.waitFrames(4'410);
         const double now = player->currentTime().seconds();
         EXPECT_GT(now, before);
