@@ -28,7 +28,7 @@ class LinuxMediaControls::Implementation {
 public:
     Implementation(ApplicationName applicationName, Addresses addresses)
         : applicationName_(std::move(applicationName)),
-          mpris_(commands_, serviceName),
+          mpris_(targets_, commands_, serviceName),
           session_(loop_.event(), std::move(addresses.sessionBus), "session bus",
                    BusConnection::Report::outages, mpris_),
           sleep_(loop_, targets_, commands_, std::move(addresses.systemBus)) {
@@ -44,13 +44,11 @@ public:
 
     /// The names are looked up here, on the caller's thread: the bus thread never waits for a disk.
     void setApplication(const std::optional<std::string>& application) {
-        if (application)
-            board_->setApplication(label(*application).value_or(ownLabel()));
-        else
-            board_->replaceApplication(ownLabel());
+        const auto installed = application ? label(*application) : std::nullopt;
+        board_->setApplication(installed.value_or(ownLabel()));
     }
 
-    void publish(const NowPlayingInfo& info) { board_->publish(info); }
+    void publish(const NowPlayingInfo& info) { board_->setInfo(info); }
 
 private:
     static ApplicationLabel ownLabel() { return {serviceName, ""}; }
@@ -62,35 +60,24 @@ private:
         return ApplicationLabel{name, busText(application)};
     }
 
-    bool playerLives() const {
-        for (const auto kind : {RemoteCommandKind::pause, RemoteCommandKind::play,
-                                RemoteCommandKind::togglePlayPause, RemoteCommandKind::nextTrack})
-            if (!targets_.offers(kind))
-                return false;
-        return true;
-    }
-
     void refresh() {
-        const PublicationBoard::Snapshot snapshot = board_->take();
-        if (std::exchange(publicationSeen_, snapshot.number) != snapshot.number)
-            state_ = state_.next({snapshot.info, snapshot.time, snapshot.application});
-        else
-            state_.application = snapshot.application;
-        const bool alive = playerLives();
-        if (alive)
+        PublicationBoard::Publication published;
+        const auto players = targets_.players([&] { published = board_->take(); });
+        if (!players.empty())
             session_.open();
-        mpris_.show(state_, alive);
-        sleep_.setPlaying(alive && state_.playbackStatus == PlaybackStatus::playing);
+        state_ = state_.next(published.info, published.application,
+                             players.empty() ? ListedPlayer{} : players.front());
+        mpris_.show(state_, !players.empty());
+        sleep_.setPlaying(state_.playbackStatus == PlaybackStatus::playing);
     }
 
     const ApplicationName applicationName_;
     BusLoop loop_;
     const std::shared_ptr<PublicationBoard> board_ =
         std::make_shared<PublicationBoard>(ownLabel(), [this] { loop_.post([this] { refresh(); }); });
-    RemoteTargets targets_{[board = board_] { board->touch(); }};
-    RemoteCommandThread commands_{loop_, targets_};
+    RemoteTargets targets_{[board = board_] { board->touch(); }, [board = board_] { board->show(); }};
+    RemoteCommandThread commands_{loop_};
     MprisState state_;
-    std::uint64_t publicationSeen_ = 0;
     MprisObject mpris_;
     BusConnection session_;
     SleepGuard sleep_;

@@ -11,11 +11,11 @@
 namespace tarn {
 
 /// The media controls of the desktop or watch: a media player on the session bus (MPRIS), which shows what is
-/// published and passes play, pause and next on to the targets of its command center. It also keeps a playing
+/// published and what is done with it, and passes commands on to the queue players. It also keeps a playing
 /// device from idle sleep and pauses before any other sleep.
 ///
-/// Any thread may call. The player is on the bus as long as play, pause, toggle and next all have a target.
-/// Everything goes on without a bus; it comes back with it. Two threads: "bus" and "remote commands".
+/// Any thread may call. The player is on the bus as long as a queue player lives. Everything goes on without
+/// a bus; it comes back with it. Two threads: "bus" and "remote commands".
 class LinuxMediaControls final : public NowPlayingService {
 public:
     /// The name of an installed application for a person, by the name of its desktop entry; none when there

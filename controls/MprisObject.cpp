@@ -13,15 +13,11 @@ namespace {
 
 constexpr char mprisMethod[] = "MprisObject";
 constexpr char busNamePrefix[] = "org.mpris.MediaPlayer2.";
-constexpr char noSuchContentError[] = "ostrel.tarnd.Error.NoSuchContent";
-constexpr char commandFailedError[] = "ostrel.tarnd.Error.CommandFailed";
-
-MessageHandle referenced(sd_bus_message* message) { return MessageHandle(sd_bus_message_ref(message)); }
 
 } // namespace
 
-MprisObject::MprisObject(RemoteCommandThread& commands, std::string name)
-    : commands_(commands), wellKnownName_(busNamePrefix + std::move(name)) {}
+MprisObject::MprisObject(RemoteTargets& targets, RemoteCommandThread& thread, std::string name)
+    : commands_(targets, thread), wellKnownName_(busNamePrefix + std::move(name)) {}
 
 MprisObject::~MprisObject() = default;
 
@@ -44,7 +40,7 @@ void MprisObject::busConnected(sd_bus& bus) {
 }
 
 void MprisObject::busLost() {
-    unanswered_.clear();
+    commands_.forgetCallers();
     nameRequest_.reset();
     playerInterface_.reset();
     rootInterface_.reset();
@@ -118,49 +114,6 @@ void MprisObject::emit(const char* interface, const std::vector<std::string>& pr
         names.push_back(const_cast<char*>(property.c_str())); // the bus library only reads them
     names.push_back(nullptr);
     sd_bus_emit_properties_changed_strv(bus_, mprisPath, interface, names.data());
-}
-
-int MprisObject::command(sd_bus_message* message, RemoteCommandKind kind, sd_bus_error* error) {
-    if (!state_.hasTrack()) {
-        if (kind == RemoteCommandKind::togglePlayPause)
-            return sd_bus_error_set(error, commandFailedError, "There is nothing to play.");
-        // Pausing does no harm and may be urgent: it is passed on even if nothing is known to play.
-        if (kind == RemoteCommandKind::pause)
-            commands_.deliverUnanswered(kind);
-        return sd_bus_reply_method_return(message, nullptr);
-    }
-    const std::uint64_t number = ++lastCommand_;
-    if (!commands_.deliver(kind, [this, number](RemoteCommandResult result) { answer(number, result); }))
-        return sd_bus_error_set(error, SD_BUS_ERROR_LIMITS_EXCEEDED, "Too many commands are waiting.");
-    unanswered_.emplace(number, referenced(message));
-    return 1;
-}
-
-void MprisObject::answer(std::uint64_t command, RemoteCommandResult result) {
-    const auto found = unanswered_.find(command);
-    if (found == unanswered_.end())
-        return; // its connection was lost
-    const MessageHandle message = std::move(found->second);
-    unanswered_.erase(found);
-    switch (result) {
-    case RemoteCommandResult::success:
-        sd_bus_reply_method_return(message.get(), nullptr);
-        break;
-    case RemoteCommandResult::noSuchContent:
-        sd_bus_reply_method_errorf(message.get(), noSuchContentError, "There is nothing more to play.");
-        break;
-    case RemoteCommandResult::commandFailed:
-        sd_bus_reply_method_errorf(message.get(), commandFailedError, "The player could not do that.");
-        break;
-    }
-}
-
-void MprisObject::rateSet(double rate) {
-    const bool playing = state_.playbackStatus == PlaybackStatus::playing;
-    if (rate == 0.0)
-        commands_.deliverUnanswered(RemoteCommandKind::pause);
-    else if (rate == 1.0 && playing && state_.rate != 1.0)
-        commands_.deliverUnanswered(RemoteCommandKind::play);
 }
 
 } // namespace tarn

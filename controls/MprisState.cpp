@@ -10,72 +10,60 @@ namespace {
 
 using std::chrono::microseconds;
 
-/// Below it, a rate counts as zero.
-constexpr float rateThreshold = 0x1p-23F;
-
-constexpr microseconds jumpTolerance = std::chrono::milliseconds(500);
-constexpr microseconds restartDistance = std::chrono::seconds(1);
+constexpr microseconds startTolerance = std::chrono::milliseconds(500);
 constexpr double longestSeconds = 1e9;
 
-std::optional<microseconds> microsecondsFrom(const std::optional<double>& seconds) {
-    if (!seconds || !(*seconds > 0))
-        return std::nullopt;
-    return microseconds(std::llround(std::fmin(*seconds, longestSeconds) * 1e6));
+microseconds microsecondsOf(double seconds) {
+    return microseconds(seconds > 0 ? std::llround(std::fmin(seconds, longestSeconds) * 1e6) : 0);
 }
 
 std::optional<std::string> shownText(const std::optional<std::string>& text) {
     return text ? std::optional(busText(*text)) : std::nullopt;
 }
 
-float usableRate(const NowPlayingInfo& info) {
-    const float rate = info.playbackRate.value_or(0);
-    return std::isfinite(rate) && std::fabs(rate) >= rateThreshold ? rate : 0;
+template <class Object>
+bool isSame(const std::weak_ptr<Object>& one, const std::weak_ptr<Object>& other) {
+    return !one.owner_before(other) && !other.owner_before(one);
 }
 
-bool isAnotherItem(const MprisState& before, const MprisState& after) {
-    if (!before.track || before.application != after.application)
-        return true;
-    MprisTrack described = *after.track;
-    described.number = before.track->number;
-    if (described != *before.track)
-        return true;
-    const PositionLine::Time time = after.position.start();
-    const microseconds elapsed = after.position.at(time);
-    return elapsed <= jumpTolerance && before.position.at(time) - elapsed > restartDistance;
+bool isSameItem(const MprisState& before, const MprisState& after) {
+    return isSame(before.player, after.player) && isSame(before.item, after.item);
 }
 
-bool isJump(const MprisState& before, const MprisState& after) {
-    if (!after.track)
-        return false;
-    const bool sameTrack = before.track && before.track->number == after.track->number;
-    const PositionLine::Time time = after.position.start();
-    const microseconds expected = sameTrack ? before.position.at(time) : microseconds::zero();
-    return std::chrono::abs(after.position.at(time) - expected) > jumpTolerance;
+MprisTrack trackOf(const NowPlayingInfo& published, std::uint64_t number) {
+    MprisTrack track{.number = number,
+                     .title = shownText(published.title),
+                     .artist = shownText(published.artist),
+                     .album = shownText(published.albumTitle),
+                     .length = {}};
+    if (const auto length = microsecondsOf(published.duration.value_or(0)); length.count() > 0)
+        track.length = length;
+    return track;
 }
 
 } // namespace
 
-MprisState MprisState::next(const Publication& publication) const {
+microseconds microsecondsOf(const MediaTime& time) { return microsecondsOf(time.seconds()); }
+
+MprisState MprisState::next(const NowPlayingInfo& published, const ApplicationLabel& label,
+                            const ListedPlayer& shown) const {
     MprisState after;
-    after.application = publication.application;
+    after.application = label;
     after.lastTrackNumber = lastTrackNumber;
-    const NowPlayingInfo& info = publication.info;
-    if (info.empty())
+    after.player = shown.player;
+    after.seeks = shown.playback.seeks;
+    if (!shown.playback.item)
         return after;
 
-    const float published = usableRate(info);
-    const bool playing = published != 0;
-    after.playbackStatus = playing ? PlaybackStatus::playing : PlaybackStatus::paused;
-    after.rate = playing ? static_cast<double>(published) : 1.0;
-    after.track = MprisTrack{.title = shownText(info.title),
-                             .artist = shownText(info.artist),
-                             .album = shownText(info.albumTitle),
-                             .length = microsecondsFrom(info.duration)};
-    after.position = PositionLine(microsecondsFrom(info.elapsedTime).value_or(microseconds::zero()),
-                                  publication.time, static_cast<double>(published), after.track->length);
-    if (isAnotherItem(*this, after))
-        ++after.lastTrackNumber;
-    after.track->number = after.lastTrackNumber;
+    const bool plays = shown.playback.plays();
+    after.playbackStatus = plays ? PlaybackStatus::playing : PlaybackStatus::paused;
+    after.rate = plays ? static_cast<double>(shown.playback.rate) : 1.0;
+    after.canGoNext = shown.playback.hasNextItem;
+    after.position = microsecondsOf(shown.playback.position);
+    after.item = shown.playback.item;
+    after.track = trackOf(published, lastTrackNumber);
+    if (track != after.track || application != label || !isSameItem(*this, after))
+        after.track->number = ++after.lastTrackNumber;
     return after;
 }
 
@@ -97,11 +85,14 @@ MprisChanges changesBetween(const MprisState& before, const MprisState& after) {
     note(changes.player, "MinimumRate", before.minimumRate() != after.minimumRate());
     note(changes.player, "MaximumRate", before.maximumRate() != after.maximumRate());
     note(changes.player, "Metadata", trackChanged);
-    note(changes.player, "CanGoNext", controlChanged);
+    note(changes.player, "CanGoNext", before.canGoNext != after.canGoNext);
     note(changes.player, "CanPlay", controlChanged);
     note(changes.player, "CanPause", controlChanged);
-    if (isJump(before, after))
-        changes.seeked = after.position.at(after.position.start());
+    note(changes.player, "CanSeek", controlChanged);
+    const bool moved =
+        isSameItem(before, after) ? before.seeks != after.seeks : after.position > startTolerance;
+    if (after.hasTrack() && moved)
+        changes.seeked = after.position;
     return changes;
 }
 

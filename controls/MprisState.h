@@ -2,11 +2,12 @@
 
 #include <chrono>
 #include <cstdint>
+#include <memory>
 #include <optional>
 #include <string>
 #include <vector>
 
-#include "controls/PositionLine.h"
+#include "controls/PlayerList.h"
 #include "roles/NowPlayingService.h"
 
 namespace tarn {
@@ -19,14 +20,7 @@ struct ApplicationLabel {
     bool operator==(const ApplicationLabel&) const = default;
 };
 
-/// What was published last, when, and on whose behalf.
-struct Publication {
-    NowPlayingInfo info;
-    PositionLine::Time time;
-    ApplicationLabel application;
-};
-
-enum class PlaybackStatus { stopped, paused, playing };
+enum class PlaybackStatus : std::uint8_t { stopped, paused, playing };
 
 /// What is shown of a track.
 struct MprisTrack {
@@ -36,32 +30,45 @@ struct MprisTrack {
     std::optional<std::string> album;
     std::optional<std::chrono::microseconds> length;
 
+    /// The track id.
+    std::string path() const { return "/ostrel/tarnd/track/" + std::to_string(number); }
+
     bool operator==(const MprisTrack&) const = default;
 };
 
 /// Everything that the player shows on the session bus, at one moment. A plain value: next() makes it,
 /// changesBetween() compares it, MprisObject hands it out.
+///
+/// It has two sources. What the track is called, and on whose behalf it plays, is what was published last.
+/// What is done with it (status, rate, position, and what a button would do) is what the queue player does
+/// that the buttons act on. Nearly always the two speak of the same track.
 struct MprisState {
+    /// No control can choose a rate beyond: nothing would be heard of it.
+    static constexpr double slowestRate = 1.0 / 32;
+    static constexpr double fastestRate = 32;
+
     ApplicationLabel application;
     PlaybackStatus playbackStatus = PlaybackStatus::stopped;
     double rate = 1.0; // never 0: while nothing plays, the rate that Play will play at
-    std::optional<MprisTrack> track;
-    PositionLine position;
+    bool canGoNext = false;
+    std::optional<MprisTrack> track; // none: there is nothing to act on
+    std::chrono::microseconds position{0};
     std::uint64_t lastTrackNumber = 0;
 
-    /// Play, Pause and Next have something to act on. Going back and seeking are never possible.
+    std::weak_ptr<ControllablePlayer> player; // that the buttons act on
+    std::weak_ptr<MediaItem> item;            // its current one
+    std::uint64_t seeks = 0;                  // of that player
+
     bool hasTrack() const { return track.has_value(); }
 
-    /// The range of `rate`. No control can choose another one, so that it is no wider than it must be.
-    double minimumRate() const { return rate < 1.0 ? rate : 1.0; }
-    double maximumRate() const { return rate > 1.0 ? rate : 1.0; }
+    /// The range of `rate`: forwards, but for a rate that a client has set.
+    double minimumRate() const { return rate < slowestRate ? rate : slowestRate; }
+    double maximumRate() const { return rate > fastestRate ? rate : fastestRate; }
 
-    /// The state that a publication leads to.
-    ///
-    /// A publication does not say whether its item is the one of the publication before. It counts as another
-    /// item, with a track id of its own, when the texts, the length or the application differ, and when the
-    /// same ones begin again: the position is back at the start after it had gone on from there.
-    MprisState next(const Publication& publication) const;
+    /// The state after this one. A track gets a number of its own when the item or what is published of it is
+    /// another one than before.
+    MprisState next(const NowPlayingInfo& published, const ApplicationLabel& label,
+                    const ListedPlayer& shown) const;
 };
 
 /// What to tell the listeners.
@@ -73,8 +80,11 @@ struct MprisChanges {
     bool operator==(const MprisChanges&) const = default;
 };
 
-/// A position counts as a jump when it is more than half a second off the line of the state before; a new
-/// track is expected at its start.
+/// A position is told of when it was set, and when another item begins more than half a second from its
+/// start.
 MprisChanges changesBetween(const MprisState& before, const MprisState& after);
+
+/// The time as MPRIS has it: never below zero.
+std::chrono::microseconds microsecondsOf(const MediaTime& time);
 
 } // namespace tarn

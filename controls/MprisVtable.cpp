@@ -10,14 +10,12 @@ namespace tarn {
 
 namespace {
 
-constexpr char trackPathPrefix[] = "/ostrel/tarnd/track/";
-
-const MprisState& stateOf(void* object) { return static_cast<MprisObject*>(object)->state(); }
+MprisObject& objectOf(void* object) { return *static_cast<MprisObject*>(object); }
 
 /// A property getter of the bus library from a function that appends one value of the state.
 template <auto append>
 int get(sd_bus*, const char*, const char*, const char*, sd_bus_message* reply, void* object, sd_bus_error*) {
-    return append(reply, stateOf(object));
+    return append(reply, objectOf(object).state());
 }
 
 int appendString(sd_bus_message* reply, const std::string& text) {
@@ -68,8 +66,13 @@ int appendMaximumRate(sd_bus_message* reply, const MprisState& state) {
 int appendVolume(sd_bus_message* reply, const MprisState&) { return sd_bus_message_append(reply, "d", 1.0); }
 
 int appendPosition(sd_bus_message* reply, const MprisState& state) {
-    const auto position = state.position.at(std::chrono::steady_clock::now());
+    const auto player = state.player.lock();
+    const auto position = player ? microsecondsOf(player->playback().position) : state.position;
     return sd_bus_message_append(reply, "x", std::int64_t{position.count()});
+}
+
+int appendCanGoNext(sd_bus_message* reply, const MprisState& state) {
+    return sd_bus_message_append(reply, "b", state.canGoNext ? 1 : 0);
 }
 
 int appendHasTrack(sd_bus_message* reply, const MprisState& state) {
@@ -77,8 +80,7 @@ int appendHasTrack(sd_bus_message* reply, const MprisState& state) {
 }
 
 int appendTrack(sd_bus_message* reply, const MprisTrack& track) {
-    const std::string path = trackPathPrefix + std::to_string(track.number);
-    int result = sd_bus_message_append(reply, "{sv}", "mpris:trackid", "o", path.c_str());
+    int result = sd_bus_message_append(reply, "{sv}", "mpris:trackid", "o", track.path().c_str());
     if (result >= 0 && track.length)
         result =
             sd_bus_message_append(reply, "{sv}", "mpris:length", "x", std::int64_t{track.length->count()});
@@ -99,17 +101,20 @@ int appendMetadata(sd_bus_message* reply, const MprisState& state) {
 }
 
 int setRate(sd_bus*, const char*, const char*, const char*, sd_bus_message* value, void* object,
-            sd_bus_error*) {
+            sd_bus_error* error) {
     double rate = 0;
     const int result = sd_bus_message_read(value, "d", &rate);
-    if (result >= 0)
-        static_cast<MprisObject*>(object)->rateSet(rate);
-    return result;
+    return result < 0 ? result : objectOf(object).commands().setRate(objectOf(object).state(), rate, error);
 }
 
 template <RemoteCommandKind kind>
-int deliver(sd_bus_message* message, void* object, sd_bus_error* error) {
-    return static_cast<MprisObject*>(object)->command(message, kind, error);
+int press(sd_bus_message* message, void* object, sd_bus_error* error) {
+    return objectOf(object).commands().press(kind, objectOf(object).state(), message, error);
+}
+
+template <auto method>
+int move(sd_bus_message* message, void* object, sd_bus_error* error) {
+    return (objectOf(object).commands().*method)(objectOf(object).state(), message, error);
 }
 
 int doNothing(sd_bus_message* message, void*, sd_bus_error*) {
@@ -142,15 +147,15 @@ const sd_bus_vtable rootTable[] = {
 
 const sd_bus_vtable playerTable[] = {
     SD_BUS_VTABLE_START(0),
-    SD_BUS_METHOD("Next", "", "", deliver<RemoteCommandKind::nextTrack>, open),
+    SD_BUS_METHOD("Next", "", "", press<RemoteCommandKind::nextTrack>, open),
     SD_BUS_METHOD("Previous", "", "", doNothing, open),
-    SD_BUS_METHOD("Pause", "", "", deliver<RemoteCommandKind::pause>, open),
-    SD_BUS_METHOD("PlayPause", "", "", deliver<RemoteCommandKind::togglePlayPause>, open),
-    SD_BUS_METHOD("Stop", "", "", deliver<RemoteCommandKind::pause>, open),
-    SD_BUS_METHOD("Play", "", "", deliver<RemoteCommandKind::play>, open),
-    SD_BUS_METHOD_WITH_NAMES("Seek", "x", SD_BUS_PARAM(Offset), "", , doNothing, open),
+    SD_BUS_METHOD("Pause", "", "", press<RemoteCommandKind::pause>, open),
+    SD_BUS_METHOD("PlayPause", "", "", press<RemoteCommandKind::togglePlayPause>, open),
+    SD_BUS_METHOD("Stop", "", "", press<RemoteCommandKind::pause>, open),
+    SD_BUS_METHOD("Play", "", "", press<RemoteCommandKind::play>, open),
+    SD_BUS_METHOD_WITH_NAMES("Seek", "x", SD_BUS_PARAM(Offset), "", , move<&MprisCommands::seek>, open),
     SD_BUS_METHOD_WITH_NAMES("SetPosition", "ox", SD_BUS_PARAM(TrackId) SD_BUS_PARAM(Position), "", ,
-                             doNothing, open),
+                             move<&MprisCommands::setPosition>, open),
     SD_BUS_METHOD_WITH_NAMES("OpenUri", "s", SD_BUS_PARAM(Uri), "", , refuseUri, open),
     SD_BUS_SIGNAL_WITH_NAMES("Seeked", "x", SD_BUS_PARAM(Position), 0),
     SD_BUS_PROPERTY("PlaybackStatus", "s", get<appendPlaybackStatus>, 0, signalled),
@@ -160,11 +165,11 @@ const sd_bus_vtable playerTable[] = {
     SD_BUS_PROPERTY("Position", "x", get<appendPosition>, 0, silent),
     SD_BUS_PROPERTY("MinimumRate", "d", get<appendMinimumRate>, 0, signalled),
     SD_BUS_PROPERTY("MaximumRate", "d", get<appendMaximumRate>, 0, signalled),
-    SD_BUS_PROPERTY("CanGoNext", "b", get<appendHasTrack>, 0, signalled),
+    SD_BUS_PROPERTY("CanGoNext", "b", get<appendCanGoNext>, 0, signalled),
     SD_BUS_PROPERTY("CanGoPrevious", "b", get<appendConstant<false>>, 0, signalled),
     SD_BUS_PROPERTY("CanPlay", "b", get<appendHasTrack>, 0, signalled),
     SD_BUS_PROPERTY("CanPause", "b", get<appendHasTrack>, 0, signalled),
-    SD_BUS_PROPERTY("CanSeek", "b", get<appendConstant<false>>, 0, signalled),
+    SD_BUS_PROPERTY("CanSeek", "b", get<appendHasTrack>, 0, signalled),
     SD_BUS_PROPERTY("CanControl", "b", get<appendConstant<true>>, 0, silent),
     SD_BUS_VTABLE_END,
 };

@@ -5,36 +5,30 @@
 namespace tarn {
 
 PublicationBoard::PublicationBoard(ApplicationLabel application, std::function<void()> wake)
-    : wake_(std::move(wake)), application_(std::move(application)) {
-    current_.application = application_;
-}
+    : wake_(std::move(wake)), set_{{}, std::move(application)}, shown_(set_) {}
 
 void PublicationBoard::setApplication(ApplicationLabel application) {
     const std::lock_guard lock(mutex_);
-    application_ = std::move(application);
+    set_.application = std::move(application);
 }
 
-void PublicationBoard::replaceApplication(ApplicationLabel application) {
+void PublicationBoard::setInfo(const NowPlayingInfo& info) {
     const std::lock_guard lock(mutex_);
-    application_ = std::move(application);
-    if (current_.application == application_)
-        return;
-    current_.application = application_;
-    wake();
+    set_.info = info;
 }
 
-void PublicationBoard::publish(const NowPlayingInfo& info) {
+void PublicationBoard::show() {
     const std::lock_guard lock(mutex_);
-    current_.info = info;
-    current_.time = std::chrono::steady_clock::now();
-    current_.application = application_;
-    ++current_.number;
-    wake();
+    shown_ = set_;
 }
 
+/// wake_ only posts to the bus thread, which takes no lock while it calls anything.
 void PublicationBoard::touch() {
     const std::lock_guard lock(mutex_);
-    wake();
+    if (woken_ || !wake_)
+        return;
+    woken_ = true;
+    wake_();
 }
 
 void PublicationBoard::close() {
@@ -42,18 +36,10 @@ void PublicationBoard::close() {
     wake_ = nullptr;
 }
 
-PublicationBoard::Snapshot PublicationBoard::take() {
+PublicationBoard::Publication PublicationBoard::take() {
     const std::lock_guard lock(mutex_);
     woken_ = false;
-    return current_;
-}
-
-/// The mutex is held: wake_ only posts to the bus thread, which takes no lock while it calls anything.
-void PublicationBoard::wake() {
-    if (woken_ || !wake_)
-        return;
-    woken_ = true;
-    wake_();
+    return shown_;
 }
 
 } // namespace tarn

@@ -6,8 +6,7 @@
 
 namespace tarn {
 
-RemoteCommandThread::RemoteCommandThread(BusLoop& loop, RemoteTargets& targets)
-    : loop_(loop), targets_(targets), thread_([this] { run(); }) {}
+RemoteCommandThread::RemoteCommandThread(BusLoop& loop) : loop_(loop), thread_([this] { run(); }) {}
 
 RemoteCommandThread::~RemoteCommandThread() {
     {
@@ -18,19 +17,15 @@ RemoteCommandThread::~RemoteCommandThread() {
     thread_.join();
 }
 
-bool RemoteCommandThread::deliver(RemoteCommandKind kind, Completion completion) {
+bool RemoteCommandThread::deliver(Command command, Completion completion) {
     {
         const std::lock_guard lock(mutex_);
         if (waiting_.size() >= limit)
             return false;
-        waiting_.push_back({kind, std::move(completion)});
+        waiting_.push_back({std::move(command), std::move(completion)});
     }
     changed_.notify_one();
     return true;
-}
-
-void RemoteCommandThread::deliverUnanswered(RemoteCommandKind kind) {
-    static_cast<void>(deliver(kind, nullptr));
 }
 
 bool RemoteCommandThread::isBusy() {
@@ -49,7 +44,7 @@ void RemoteCommandThread::run() {
         waiting_.pop_front();
         delivering_ = true;
         lock.unlock();
-        const RemoteCommandResult result = targets_.deliver(delivery.kind);
+        const RemoteCommandResult result = std::exchange(delivery.command, nullptr)();
         if (delivery.completion)
             loop_.post([completion = std::move(delivery.completion), result] { completion(result); });
         lock.lock();

@@ -1,126 +1,93 @@
 #include "controls/RemoteTargets.h"
 
 #include <algorithm>
-#include <atomic>
 #include <mutex>
-#include <optional>
+#include <ranges>
 #include <utility>
-#include <vector>
 
 namespace tarn {
 
 namespace {
 
-/// One handler. `active` ends with the registration, so that a delivery that has already chosen its targets
-/// passes over those that went.
 struct Target {
+    const ControllablePlayer* player; // never followed
     RemoteCommand::Handler handler;
-    std::atomic<bool> active = true;
 };
 
-using Targets = std::vector<std::shared_ptr<Target>>;
-
-/// What the command and its registrations share.
-class TargetList {
-public:
-    explicit TargetList(std::function<void()> changed) : changed_(std::move(changed)) {}
-
-    void add(std::shared_ptr<Target> target) {
-        change([&] { targets_.push_back(std::move(target)); });
-    }
-
-    void remove(const std::shared_ptr<Target>& target) {
-        target->active = false;
-        change([&] { std::erase(targets_, target); });
-    }
-
-    void setEnabled(bool enabled) {
-        change([&] { enabled_ = enabled; });
-    }
-
-    bool offered() const {
-        const std::lock_guard lock(mutex_);
-        return isOffered();
-    }
-
-    Targets newestFirst() const {
-        const std::lock_guard lock(mutex_);
-        return enabled_ ? Targets(targets_.rbegin(), targets_.rend()) : Targets();
-    }
-
-private:
-    bool isOffered() const { return enabled_ && !targets_.empty(); }
-
-    void change(const std::function<void()>& act) {
-        bool before = false;
-        bool after = false;
-        {
-            const std::lock_guard lock(mutex_);
-            before = isOffered();
-            act();
-            after = isOffered();
-        }
-        if (before != after && changed_)
-            changed_();
-    }
-
-    const std::function<void()> changed_;
-    mutable std::mutex mutex_;
-    Targets targets_; // oldest first
-    bool enabled_ = true;
+/// What a command and its registrations share.
+struct TargetList {
+    std::mutex mutex;
+    std::vector<std::shared_ptr<Target>> targets;
+    bool enabled = true;
 };
 
 class TargetRegistration final : public Registration {
 public:
     TargetRegistration(std::shared_ptr<TargetList> list, std::shared_ptr<Target> target)
         : list_(std::move(list)), target_(std::move(target)) {}
-    ~TargetRegistration() override { list_->remove(target_); }
+
+    ~TargetRegistration() override {
+        const std::lock_guard lock(list_->mutex);
+        std::erase(list_->targets, target_);
+    }
 
 private:
     const std::shared_ptr<TargetList> list_;
     const std::shared_ptr<Target> target_;
 };
 
-/// Asks one after the other; the first success decides, and ends the asking unless everyone is to hear of it.
-RemoteCommandResult ask(const Targets& targets, bool everyone) {
-    std::optional<RemoteCommandResult> result;
-    for (const auto& target : targets) {
-        if (!target->active)
-            continue;
-        const RemoteCommandResult answer = target->handler();
-        if (!result || answer == RemoteCommandResult::success)
-            result = answer;
-        if (answer == RemoteCommandResult::success && !everyone)
-            break;
-    }
-    return result.value_or(RemoteCommandResult::noSuchContent);
-}
-
 } // namespace
 
 class RemoteTargets::Command final : public RemoteCommand {
 public:
-    explicit Command(const std::function<void()>& changed) : list_(std::make_shared<TargetList>(changed)) {}
-
-    RegistrationHandle addTarget(Handler handler) override {
-        auto target = std::make_shared<Target>();
-        target->handler = std::move(handler);
-        auto registration = std::make_unique<TargetRegistration>(list_, target);
-        list_->add(std::move(target));
-        return registration;
+    RegistrationHandle addTarget(const ControllablePlayer& player, Handler handler) override {
+        auto target = std::make_shared<Target>(&player, std::move(handler));
+        const std::lock_guard lock(list_->mutex);
+        list_->targets.push_back(target);
+        return std::make_unique<TargetRegistration>(list_, std::move(target));
     }
 
-    void setEnabled(bool enabled) override { list_->setEnabled(enabled); }
+    void setEnabled(bool enabled) override {
+        const std::lock_guard lock(list_->mutex);
+        list_->enabled = enabled;
+    }
 
-    const TargetList& list() const { return *list_; }
+    RemoteCommandResult ask(const ControllablePlayer& player) const {
+        const auto target = targetOf(player);
+        return target ? target->handler() : RemoteCommandResult::noSuchContent;
+    }
 
 private:
-    const std::shared_ptr<TargetList> list_;
+    std::shared_ptr<Target> targetOf(const ControllablePlayer& player) const {
+        const std::lock_guard lock(list_->mutex);
+        const auto found =
+            std::ranges::find(list_->targets, &player, [](const auto& target) { return target->player; });
+        return list_->enabled && found != list_->targets.end() ? *found : nullptr;
+    }
+
+    const std::shared_ptr<TargetList> list_ = std::make_shared<TargetList>();
 };
 
-RemoteTargets::RemoteTargets(const std::function<void()>& changed) {
+/// Tells of the player's end as well.
+class RemoteTargets::PlayerRegistration final : public Registration {
+public:
+    PlayerRegistration(RegistrationHandle membership, std::function<void()> changed)
+        : membership_(std::move(membership)), changed_(std::move(changed)) {}
+
+    ~PlayerRegistration() override {
+        membership_.reset();
+        changed_();
+    }
+
+private:
+    RegistrationHandle membership_;
+    const std::function<void()> changed_;
+};
+
+RemoteTargets::RemoteTargets(std::function<void()> changed, std::function<void()> used)
+    : changed_(std::move(changed)), players_(std::move(used)) {
     for (auto& command : commands_)
-        command = std::make_unique<Command>(changed);
+        command = std::make_unique<Command>();
 }
 
 RemoteTargets::~RemoteTargets() = default;
@@ -131,10 +98,37 @@ RemoteCommand& RemoteTargets::togglePlayPauseCommand() { return command(RemoteCo
 RemoteCommand& RemoteTargets::nextTrackCommand() { return command(RemoteCommandKind::nextTrack); }
 RemoteCommand& RemoteTargets::previousTrackCommand() { return command(RemoteCommandKind::previousTrack); }
 
-bool RemoteTargets::offers(RemoteCommandKind kind) const { return command(kind).list().offered(); }
+RegistrationHandle RemoteTargets::addPlayer(std::weak_ptr<ControllablePlayer> player) {
+    auto registration = std::make_unique<PlayerRegistration>(players_.add(std::move(player)), changed_);
+    changed_();
+    return registration;
+}
+
+void RemoteTargets::playerChanged(const ControllablePlayer& player) {
+    players_.changed(player);
+    changed_();
+}
+
+void RemoteTargets::playbackChanged(const ControllablePlayer& player) {
+    players_.moved(player);
+    changed_();
+}
 
 RemoteCommandResult RemoteTargets::deliver(RemoteCommandKind kind) {
-    return ask(command(kind).list().newestFirst(), kind == RemoteCommandKind::pause);
+    const auto players = players_.inOrder();
+    if (players.empty())
+        return RemoteCommandResult::noSuchContent;
+    if (kind == RemoteCommandKind::togglePlayPause && players.front().playback.plays())
+        kind = RemoteCommandKind::pause;
+    const Command& asked = command(kind);
+    RemoteCommandResult result = RemoteCommandResult::noSuchContent;
+    if (kind != RemoteCommandKind::pause)
+        return asked.ask(*players.front().player);
+    // The one that was used last comes last, so that it still is the one to go on with.
+    for (const ListedPlayer& listed : players | std::views::reverse)
+        if (const auto answer = asked.ask(*listed.player); result != RemoteCommandResult::success)
+            result = answer;
+    return result;
 }
 
 } // namespace tarn

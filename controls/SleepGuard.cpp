@@ -96,12 +96,14 @@ int SleepGuard::handlePrepareForSleep(sd_bus_message* message, void* guard, sd_b
 
 void SleepGuard::pause() {
     SystemLog::message(sleepMethod, __LINE__, "%{public}s:%d: Pausing before the system sleeps.");
+    const auto pauseAll = [&targets = targets_] { return targets.deliver(RemoteCommandKind::pause); };
+    const bool busy = commands_.isBusy(); // before the pause, beside which it may end
     if (!pauses_)
-        pauses_.emplace(loop_, targets_);
-    if (!pauses_->deliver(RemoteCommandKind::pause, [this](RemoteCommandResult) { sleep_.release(); }))
+        pauses_.emplace(loop_);
+    if (!pauses_->deliver(pauseAll, [this](RemoteCommandResult) { sleep_.release(); }))
         sleep_.release();
-    if (commands_.isBusy())
-        commands_.deliverUnanswered(RemoteCommandKind::pause);
+    if (busy)
+        static_cast<void>(commands_.deliver(pauseAll, nullptr));
 }
 
 } // namespace tarn

@@ -8,6 +8,7 @@
 #include "controls/BusHandles.h"
 #include "controls/BusLoop.h"
 #include "controls/RemoteCommandThread.h"
+#include "controls/RemoteTargets.h"
 #include "system/FileDescriptor.h"
 
 namespace tarn {

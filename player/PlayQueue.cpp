@@ -84,6 +84,8 @@ void PlayQueue::seek(const PlaybackItem& item, std::chrono::nanoseconds position
     Entry& entry = *byItem_.at(&item);
     entry.position = position;
     entry.moved = true;
+    if (&entry == &entries_.front())
+        ++seeks_;
     changed_();
 }
 

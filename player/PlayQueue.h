@@ -41,6 +41,9 @@ public:
     float rate() const { return rate_; }
     std::chrono::nanoseconds positionOf(const PlaybackItem& item) const;
 
+    /// How often the position of a current item was set.
+    std::uint64_t seeks() const { return seeks_; }
+
     // Edits.
     /// Behind `after`, or at the end when it is null or not there. False when the item is in the queue
     /// already.
@@ -117,6 +120,7 @@ private:
     Entries entries_;
     std::unordered_map<const PlaybackItem*, Entries::iterator> byItem_;
     EntryId lastId_ = 0;
+    std::uint64_t seeks_ = 0;
     float rate_ = 0;
     std::optional<float> interruptedRate_;
     bool staysPaused_ = false; ///< was told to pause after an interruption had paused it

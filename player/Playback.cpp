@@ -25,7 +25,10 @@ std::string firstText(const MediaAsset& asset, std::string_view key) {
 
 Playback::Playback(PlayerEnvironment& environment)
     : environment_(environment),
-      queue_([this] { schedule(); }),
+      queue_([this] {
+          queueChanged_ = true;
+          schedule();
+      }),
       renderings_(environment.renderings, [this] { scheduleLocking(); }),
       timer_(environment.loop, [this] { scheduleLocking(); }) {}
 
@@ -72,6 +75,7 @@ void Playback::run() {
         startOutput();
     }
     setTimer();
+    tellOfChange();
     if (more || !openPlace(1))
         scheduleLocking();
 }
@@ -261,6 +265,16 @@ void Playback::setTimer() {
         timer_.set(*output_, *end);
     else
         timer_.cancel();
+}
+
+void Playback::tellOfChange() {
+    {
+        EngineLock lock(environment_);
+        if (!std::exchange(queueChanged_, false))
+            return;
+    }
+    if (auto listener = listener_.lock())
+        listener->playbackChanged();
 }
 
 } // namespace tarn

@@ -22,6 +22,9 @@ public:
     virtual void rateChanged() = 0;
     virtual void deviceVanished(const Error& error) = 0;
     virtual void soundChanged(const std::optional<Error>& error) = 0;
+
+    /// The sound has followed one or more changes of rate, queue or position.
+    virtual void playbackChanged() = 0;
 };
 
 /// Turns a PlayQueue into sound.
@@ -72,6 +75,7 @@ private:
     void startOutput();
     void stopOutput();
     void setTimer();
+    void tellOfChange();
 
     PlayerEnvironment& environment_;
     std::weak_ptr<PlaybackListener> listener_;
@@ -79,6 +83,7 @@ private:
     // Under the mutex.
     PlayQueue queue_;
     bool scheduled_ = false;
+    bool queueChanged_ = false; // and the listener has not been told that the sound followed
     bool closed_ = false;
 
     // On the player thread.

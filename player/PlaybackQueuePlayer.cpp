@@ -68,12 +68,19 @@ std::shared_ptr<MediaItem> PlaybackQueuePlayer::currentItem() const {
     return playback_->queue().current();
 }
 
-MediaTime PlaybackQueuePlayer::currentTime() const {
+MediaTime PlaybackQueuePlayer::currentTime() const { return playback().position; }
+
+PlaybackState PlaybackQueuePlayer::playback() const {
     EngineLock lock(environment_);
-    const PlayQueue::Entries& entries = playback_->queue().entries();
-    if (entries.empty())
-        return MediaTime::zero();
-    return mediaTimeOf(playback_->queue().positionOf(*entries.front().item));
+    const PlayQueue& queue = playback_->queue();
+    PlaybackState state;
+    state.rate = queue.rate();
+    state.item = queue.current();
+    if (state.item)
+        state.position = mediaTimeOf(queue.positionOf(*queue.entries().front().item));
+    state.hasNextItem = queue.entries().size() > 1;
+    state.seeks = queue.seeks();
+    return state;
 }
 
 // Whatever kept a paused player from sounding does not count any more when it plays again.
@@ -113,6 +120,12 @@ void PlaybackQueuePlayer::play() {
 
 void PlaybackQueuePlayer::interruptionBegan() {
     changeRate([](PlayQueue& queue) { return queue.interrupt(); });
+}
+
+void PlaybackQueuePlayer::playbackChanged() {
+    environment_.notifications.post({.name = MediaQueuePlayer::playbackDidChange,
+                                     .sender = static_cast<MediaQueuePlayer*>(this),
+                                     .info = {}});
 }
 
 std::optional<Error> PlaybackQueuePlayer::error() const {

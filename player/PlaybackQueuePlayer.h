@@ -35,6 +35,7 @@ public:
     void play() override;
     std::shared_ptr<MediaItem> currentItem() const override;
     MediaTime currentTime() const override;
+    PlaybackState playback() const override;
     void advanceToNextItem() override;
     void insertItem(std::shared_ptr<MediaItem> item, const std::shared_ptr<MediaItem>& after) override;
     void removeItem(const std::shared_ptr<MediaItem>& item) override;
@@ -48,6 +49,7 @@ private:
     void rateChanged() override { observers_.changed(rateKeyPath); }
     void deviceVanished(const Error& error) override;
     void soundChanged(const std::optional<Error>& error) override;
+    void playbackChanged() override;
 
     ObservedValue read(std::string_view keyPath) const;
     void interruptionBegan();

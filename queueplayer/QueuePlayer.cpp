@@ -11,9 +11,9 @@
 #include "proto/AudioFileQueuePlayerSetRate.h"
 #include "proto/Envelope.h"
 #include "proto/VelmoMessage.h"
-#include "queueplayer/RateThreshold.h"
 #include "roles/AudioSession.h"
 #include "roles/Clock.h"
+#include "roles/RateThreshold.h"
 
 namespace tarn {
 

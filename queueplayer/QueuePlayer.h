@@ -8,6 +8,7 @@
 
 #include "objects/KeyValueObserverHelper.h"
 #include "reply/EventSink.h"
+#include "roles/ControllablePlayer.h"
 #include "roles/MediaQueuePlayer.h"
 #include "roles/NotificationCenter.h"
 #include "roles/NowPlayingService.h"
@@ -30,7 +31,8 @@ class VLTorviAudioFilePlayerItemManager;
 /// commands arrive on the queue-player queue, media controls on the remote-command thread; reports run on
 /// whatever thread the change happens on, and one of them may drop the last reference. Media controls, now
 /// playing and their private operations are in QueuePlayerTelecue.cpp.
-class VLTorviAudioFileQueuePlayer final : public std::enable_shared_from_this<VLTorviAudioFileQueuePlayer> {
+class VLTorviAudioFileQueuePlayer final : public ControllablePlayer,
+                                          public std::enable_shared_from_this<VLTorviAudioFileQueuePlayer> {
 public:
     /// Reports status, rate and current item, in this order, before it returns. The last component of the
     /// comma-separated `identifier` names the client's app extension. `audioServer` and the managers may be
@@ -57,7 +59,9 @@ public:
     /// Pauses when `rate` counts as zero. Otherwise activates the audio session, waiting for it for up to 17
     /// seconds, and applies the rate exactly. False when the activation failed or took longer; a late success
     /// still applies the rate.
-    bool setRate(float rate);
+    bool setRate(float rate) override;
+
+    PlaybackState playback() const override { return queuePlayer_->playback(); }
 
     const std::string& identifier() const { return identifier_; }
     const std::shared_ptr<MediaQueuePlayer>& queuePlayer() const { return queuePlayer_; }
@@ -112,6 +116,7 @@ private:
     const std::shared_ptr<VLTorviAudioFilePlayerItemManager> playerItemManager_;
     const std::shared_ptr<VLTorviAudioFilePlayerAssetManager> assetManager_;
     RegistrationHandle interruptions_;
+    RegistrationHandle playbackChanges_;
     std::vector<RegistrationHandle> remoteCommandTargets_;
     std::atomic<int> nowPlayingUpdates_{0}; // asked for and not made yet
     LiveObject<"queue player"> live_;

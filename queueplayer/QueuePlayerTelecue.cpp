@@ -25,12 +25,19 @@ void VLTorviAudioFileQueuePlayer::_registerTelecueSupportedCommands() {
         addTarget(center.togglePlayPauseCommand(), &Self::_handleTogglePlayPauseCommand));
     remoteCommandTargets_.push_back(addTarget(center.nextTrackCommand(), &Self::_handleNextTrackCommand));
     center.previousTrackCommand().setEnabled(false);
+    remoteCommandTargets_.push_back(center.addPlayer(weak_from_this()));
+    playbackChanges_ =
+        platform_.notifications.addObserver(MediaQueuePlayer::playbackDidChange, queuePlayer_.get(),
+                                            [weakSelf = weak_from_this()](const Notification&) {
+                                                if (auto self = weakSelf.lock())
+                                                    self->platform_.remoteCommands.playbackChanged(*self);
+                                            });
 }
 
 RegistrationHandle
 VLTorviAudioFileQueuePlayer::addTarget(RemoteCommand& command,
                                        RemoteCommandResult (VLTorviAudioFileQueuePlayer::*handler)()) {
-    return command.addTarget([weakSelf = weak_from_this(), handler] {
+    return command.addTarget(*this, [weakSelf = weak_from_this(), handler] {
         auto self = weakSelf.lock();
         return self ? (self.get()->*handler)() : RemoteCommandResult::commandFailed;
     });
@@ -62,9 +69,10 @@ void VLTorviAudioFileQueuePlayer::_updateTelecueForCurrentItem() {
 void VLTorviAudioFileQueuePlayer::_updateTelecueNowPlayingInfoForCurrentItem() {
     if (nowPlayingUpdates_++ > 0)
         return;
-    do
+    do {
         publishNowPlayingInfo();
-    while (--nowPlayingUpdates_ > 0);
+        platform_.remoteCommands.playerChanged(*this);
+    } while (--nowPlayingUpdates_ > 0);
 }
 
 void VLTorviAudioFileQueuePlayer::publishNowPlayingInfo() {

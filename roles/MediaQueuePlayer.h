@@ -7,6 +7,7 @@
 #include "roles/MediaItem.h"
 #include "roles/MediaTime.h"
 #include "roles/Observable.h"
+#include "roles/PlaybackState.h"
 
 namespace tarn {
 
@@ -30,6 +31,10 @@ public:
     static constexpr char statusKeyPath[] = "status";
     static constexpr char rateKeyPath[] = "rate";
     static constexpr char currentItemKeyPath[] = "currentItem";
+
+    /// A notification with this player as its sender: rate, queue or position have changed, and the sound has
+    /// followed. Posted on the player thread; changes that come close together share one.
+    static constexpr char playbackDidChange[] = "MediaQueuePlayerPlaybackChanged";
 
     virtual MediaStatus status() const = 0;
 
@@ -60,6 +65,9 @@ public:
 
     /// The current item's; zero when there is none.
     virtual MediaTime currentTime() const = 0;
+
+    /// Rate, current item and all the rest of one moment.
+    virtual PlaybackState playback() const = 0;
 
     virtual void advanceToNextItem() = 0;
 

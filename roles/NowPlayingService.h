@@ -19,6 +19,8 @@ struct NowPlayingInfo {
 };
 
 /// Publishes now-playing information. One shared instance; any thread may call; no call blocks.
+///
+/// What was published is shown once its player has told the command center that it has changed.
 class NowPlayingService {
 public:
     /// Where playback happens; this device is the only one.

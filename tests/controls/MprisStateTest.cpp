@@ -5,192 +5,123 @@
 
 #include <gmock/gmock.h>
 
+#include "controls/RemoteTargets.h"
+#include "tests/controls/FakePlayer.h"
+
 namespace tarn {
 namespace {
 
-using std::chrono::milliseconds;
 using std::chrono::seconds;
-using testing::ElementsAre;
-using testing::IsEmpty;
 using testing::Optional;
-using testing::UnorderedElementsAre;
 
-const ApplicationLabel player{"Music Box", "org.example.MusicBox"};
+const ApplicationLabel musicBox{"Music Box", "org.example.MusicBox"};
 
-NowPlayingInfo track(const std::string& title, double elapsed, float rate) {
+NowPlayingInfo record(const std::string& title) {
     return {.title = title,
             .duration = 180.0,
-            .elapsedTime = elapsed,
-            .playbackRate = rate,
+            .elapsedTime = {},
+            .playbackRate = {},
             .artist = "Someone",
             .albumTitle = "Songs"};
 }
 
+/// What is shown, told as what the listeners are told: "PlaybackStatus Metadata, Seeked 90".
 class MprisStateTest : public testing::Test {
 protected:
-    void wait(milliseconds time) { now_ += time; }
-
-    MprisChanges publish(const NowPlayingInfo& info, const ApplicationLabel& application = player) {
+    std::string show(const NowPlayingInfo& published, const PlaybackState& playback,
+                     const ApplicationLabel& application = musicBox) {
         const MprisState before = state_;
-        state_ = state_.next({info, now_, application});
-        return changesBetween(before, state_);
+        state_ = state_.next(published, application, {player_, playback});
+        const MprisChanges changes = changesBetween(before, state_);
+        std::string told;
+        for (const auto* names : {&changes.application, &changes.player})
+            for (const std::string& name : *names)
+                told += (told.empty() ? "" : " ") + name;
+        if (changes.seeked)
+            told += ", Seeked " + std::to_string(changes.seeked->count() / 1'000'000);
+        return told;
     }
 
-    std::uint64_t trackNumber() const { return state_.track.value().number; }
-    double position() const { return std::chrono::duration<double>(state_.position.at(now_)).count(); }
+    PlaybackState first(float rate, std::int64_t position = 0, std::uint64_t seeks = 0) const {
+        return {.rate = rate, .item = first_, .position = {position, 1}, .hasNextItem = true, .seeks = seeks};
+    }
 
-    PositionLine::Time now_{seconds(1000)};
-    MprisState state_;
+    RemoteTargets targets_;
+    const std::shared_ptr<ControllablePlayer> player_ =
+        std::make_shared<FakePlayer>(targets_, PlaybackState{});
+    const std::shared_ptr<MediaItem> first_ = std::make_shared<FakeItem>();
+    const std::shared_ptr<MediaItem> second_ = std::make_shared<FakeItem>();
+    MprisState state_ = MprisState().next({}, musicBox, {player_, {}});
 };
 
-TEST_F(MprisStateTest, WithoutATrackNothingCanBeControlled) {
+TEST_F(MprisStateTest, WithoutAnItemNothingCanBeControlled) {
     EXPECT_EQ(state_.playbackStatus, PlaybackStatus::stopped);
-    EXPECT_FALSE(state_.hasTrack());
-
-    EXPECT_THAT(publish(track("A", 0, 0)).player,
-                UnorderedElementsAre("PlaybackStatus", "Metadata", "CanGoNext", "CanPlay", "CanPause"));
-    EXPECT_THAT(publish({}).player,
-                UnorderedElementsAre("PlaybackStatus", "Metadata", "CanGoNext", "CanPlay", "CanPause"));
-    EXPECT_EQ(state_.playbackStatus, PlaybackStatus::stopped);
-    EXPECT_EQ(position(), 0);
+    EXPECT_EQ(show(record("A"), {}), "") << "of a player that has gone";
+    EXPECT_EQ(show(record("A"), first(0)), "PlaybackStatus Metadata CanGoNext CanPlay CanPause CanSeek");
+    EXPECT_EQ(show({}, first(0)), "PlaybackStatus Metadata")
+        << "of another player: this one can still be controlled";
+    EXPECT_EQ(show({}, {}), "PlaybackStatus Metadata CanGoNext CanPlay CanPause CanSeek");
 }
 
-TEST_F(MprisStateTest, ThePositionRunsOnAtTheRateAndStopsAtTheEnds) {
-    publish(track("A", 30, 1.5F));
-    wait(seconds(10));
-    EXPECT_DOUBLE_EQ(position(), 45);
-    wait(seconds(1000));
-    EXPECT_DOUBLE_EQ(position(), 180);
-
-    publish(track("A", 20, -2.0F));
-    wait(seconds(5));
-    EXPECT_DOUBLE_EQ(position(), 10);
-    wait(seconds(6));
-    EXPECT_DOUBLE_EQ(position(), 0);
-
-    publish(track("A", 20, 0));
-    wait(seconds(5));
-    EXPECT_DOUBLE_EQ(position(), 20);
-}
-
-TEST_F(MprisStateTest, PausingAndResumingOnTheLineIsNoJump) {
-    publish(track("A", 0, 1));
-    wait(seconds(10));
-    EXPECT_EQ(publish(track("A", 9.8, 0)),
-              (MprisChanges{.application = {}, .player = {"PlaybackStatus"}, .seeked = {}}));
-    wait(seconds(60));
-    EXPECT_EQ(publish(track("A", 9.8, 1)),
-              (MprisChanges{.application = {}, .player = {"PlaybackStatus"}, .seeked = {}}));
-    EXPECT_EQ(trackNumber(), 1U);
-}
-
-TEST_F(MprisStateTest, ARepeatedPublicationChangesNothing) {
-    publish(track("A", 0, 0));
-    wait(seconds(1));
-    EXPECT_EQ(publish(track("A", 0, 0)), MprisChanges{});
-}
-
-TEST_F(MprisStateTest, APublicationOffTheLineIsAJump) {
-    publish(track("A", 0, 1));
-    wait(seconds(10));
-    const MprisChanges changes = publish(track("A", 90, 1));
-    EXPECT_THAT(changes.player, IsEmpty());
-    EXPECT_THAT(changes.seeked, Optional(seconds(90)));
-}
-
-TEST_F(MprisStateTest, ARateChangeIsNoJumpAndMovesTheRange) {
-    publish(track("A", 0, 1));
-    wait(seconds(10));
-    EXPECT_EQ(publish(track("A", 10, 2)),
-              (MprisChanges{.application = {}, .player = {"Rate", "MaximumRate"}, .seeked = {}}));
-    EXPECT_EQ(state_.minimumRate(), 1.0);
-    EXPECT_EQ(state_.maximumRate(), 2.0);
-    wait(seconds(10));
-    EXPECT_EQ(publish(track("A", 30, 2)), MprisChanges{});
-}
-
-TEST_F(MprisStateTest, TheRateIsNeverZeroAndPlayRunsAtOne) {
-    publish(track("A", 0, 2));
-    publish(track("A", 0, 0));
-    EXPECT_EQ(state_.rate, 1.0);
-    publish(track("A", 0, 1e-8F));
+TEST_F(MprisStateTest, WhatThePlayerDoesIsToldAndNothingTwice) {
+    show(record("A"), first(0));
+    EXPECT_EQ(show(record("A"), first(1)), "PlaybackStatus");
+    EXPECT_EQ(show(record("A"), first(1, 100)), "") << "that time goes by is no event";
+    EXPECT_EQ(show(record("A"), first(2, 100)), "Rate");
+    EXPECT_EQ(show(record("A"), first(2, 30, 1)), ", Seeked 30");
+    PlaybackState last = first(2, 30, 1);
+    last.hasNextItem = false;
+    EXPECT_EQ(show(record("A"), last), "CanGoNext");
+    last.isHeld = true;
+    EXPECT_EQ(show(record("A"), last), "PlaybackStatus Rate");
     EXPECT_EQ(state_.playbackStatus, PlaybackStatus::paused);
-    publish(track("A", 0, -1));
-    EXPECT_EQ(state_.rate, -1.0);
+}
+
+TEST_F(MprisStateTest, TheRateIsNeverZeroAndItsRangeHoldsWhatAClientChose) {
+    show(record("A"), first(0));
+    EXPECT_EQ(state_.rate, 1.0);
+    EXPECT_EQ(show(record("A"), first(-1)), "PlaybackStatus Rate MinimumRate");
     EXPECT_EQ(state_.minimumRate(), -1.0);
-    EXPECT_EQ(state_.maximumRate(), 1.0);
+    EXPECT_EQ(show(record("A"), first(40)), "Rate MinimumRate MaximumRate");
+    EXPECT_EQ(state_.maximumRate(), 40.0);
 }
 
 TEST_F(MprisStateTest, AnotherItemHasANewTrackIdAndTheStatusComesWithIt) {
-    publish(track("A", 0, 1));
-    wait(seconds(180));
-    const MprisChanges changes = publish(track("B", 0.1, 1));
-    EXPECT_EQ(changes,
-              (MprisChanges{.application = {}, .player = {"PlaybackStatus", "Metadata"}, .seeked = {}}));
-    EXPECT_EQ(trackNumber(), 2U);
-    publish(track("A", 0, 1));
-    EXPECT_EQ(trackNumber(), 3U);
-    publish({});
-    publish(track("A", 0, 1));
-    EXPECT_EQ(trackNumber(), 4U);
-}
-
-TEST_F(MprisStateTest, TheSameRecordingFromItsStartIsAnotherItem) {
-    publish(track("A", 0, 1));
-    wait(seconds(180));
-    EXPECT_EQ(publish(track("A", 0, 1)),
-              (MprisChanges{.application = {}, .player = {"PlaybackStatus", "Metadata"}, .seeked = {}}));
-    EXPECT_EQ(trackNumber(), 2U);
-    wait(milliseconds(900));
-    publish(track("A", 0.2, 0)); // too early to have begun again
-    EXPECT_EQ(trackNumber(), 2U);
-}
-
-TEST_F(MprisStateTest, AnItemThatBeginsInTheMiddleJumpsThere) {
-    publish(track("A", 0, 1));
-    EXPECT_THAT(publish(track("B", 60, 1)).seeked, Optional(seconds(60)));
+    show(record("A"), first(1));
+    EXPECT_EQ(show(record("B"), {.rate = 1, .item = second_, .hasNextItem = true}),
+              "PlaybackStatus Metadata");
+    EXPECT_EQ(state_.track->path(), "/ostrel/tarnd/track/2");
+    EXPECT_EQ(show(record("B"), first(1)), "PlaybackStatus Metadata") << "the same recording once more";
+    EXPECT_EQ(show(record("A"), {.rate = 1, .item = second_, .position = {60, 1}, .hasNextItem = true}),
+              "PlaybackStatus Metadata, Seeked 60");
+    show({}, {});
+    show(record("A"), first(1));
+    EXPECT_EQ(state_.track->path(), "/ostrel/tarnd/track/5");
 }
 
 TEST_F(MprisStateTest, AnotherApplicationIsShownBeforeItsTrack) {
-    publish(track("A", 10, 0));
-    const MprisChanges changes = publish(track("A", 10, 0), {"Radio", ""});
-    EXPECT_THAT(changes.application, ElementsAre("Identity", "DesktopEntry"));
-    EXPECT_THAT(changes.player, ElementsAre("PlaybackStatus", "Metadata"));
+    show(record("A"), first(0));
+    EXPECT_EQ(show(record("A"), first(0), {"Radio", ""}), "Identity DesktopEntry PlaybackStatus Metadata");
 }
 
 TEST_F(MprisStateTest, NumbersThatAreNoTimesAreLeftOut) {
     for (const double odd : {std::nan(""), -1.0, 0.0, -std::numeric_limits<double>::infinity()}) {
-        publish({.title = "A",
-                 .duration = odd,
-                 .elapsedTime = odd,
-                 .playbackRate = std::nanf(""),
-                 .artist = {},
-                 .albumTitle = {}});
-        EXPECT_EQ(state_.track.value().length, std::nullopt);
-        EXPECT_EQ(position(), 0);
-        EXPECT_EQ(state_.playbackStatus, PlaybackStatus::paused);
+        NowPlayingInfo published = record("A");
+        published.duration = odd;
+        show(published, {.rate = 1, .item = first_, .position = MediaTime::fromSeconds(odd, 1)});
+        EXPECT_EQ(state_.track->length, std::nullopt);
+        EXPECT_EQ(state_.position, seconds(0));
     }
-    const double infinite = std::numeric_limits<double>::infinity();
-    publish({.title = "A",
-             .duration = infinite,
-             .elapsedTime = infinite,
-             .playbackRate = std::numeric_limits<float>::max(),
-             .artist = {},
-             .albumTitle = {}});
-    wait(seconds(100));
-    EXPECT_GT(position(), 1e8);
 }
 
 TEST_F(MprisStateTest, TextsAreCleanAndShort) {
-    publish({.title = std::string("a\0b\nc\xff\xed\xa0\x80", 9),
-             .duration = {},
-             .elapsedTime = {},
-             .playbackRate = {},
-             .artist = std::string(1 << 20, 'x'),
-             .albumTitle = std::string("\xef\xbf\xbe")});
-    EXPECT_THAT(state_.track.value().title, Optional(std::string("a b c\ufffd\ufffd\ufffd\ufffd")));
-    EXPECT_EQ(state_.track.value().artist.value().size(), 1024U);
-    EXPECT_THAT(state_.track.value().album, Optional(std::string("\ufffd")));
+    NowPlayingInfo published = record(std::string("a\0b\nc\xff\xed\xa0\x80", 9));
+    published.artist = std::string(1 << 20, 'x');
+    published.albumTitle = "\xef\xbf\xbe";
+    show(published, first(0));
+    EXPECT_THAT(state_.track->title, Optional(std::string("a b c\ufffd\ufffd\ufffd\ufffd")));
+    EXPECT_EQ(state_.track->artist->size(), 1024U);
+    EXPECT_THAT(state_.track->album, Optional(std::string("\ufffd")));
 }
 
 } // namespace

@@ -1,10 +1,10 @@
 #include "controls/RemoteTargets.h"
 
-#include <string>
 #include <thread>
-#include <vector>
 
 #include <gmock/gmock.h>
+
+#include "tests/controls/FakePlayer.h"
 
 namespace tarn {
 namespace {
@@ -14,105 +14,100 @@ using testing::IsEmpty;
 
 class RemoteTargetsTest : public testing::Test {
 protected:
-    RemoteCommand::Handler answering(const std::string& name, RemoteCommandResult result) {
-        return [this, name, result] {
-            asked_.push_back(name);
-            return result;
-        };
-    }
+    PlaybackState playback(float rate) const { return {.rate = rate, .item = item_}; }
 
-    std::vector<std::string> asked_;
+    const std::shared_ptr<MediaItem> item_ = std::make_shared<FakeItem>();
     int changes_ = 0;
     RemoteTargets targets_{[this] { ++changes_; }};
 };
 
-TEST_F(RemoteTargetsTest, PauseReachesEveryTargetAndOneSuccessIsEnough) {
-    const auto oldest = targets_.pauseCommand().addTarget(answering("oldest", RemoteCommandResult::success));
-    const auto newest =
-        targets_.pauseCommand().addTarget(answering("newest", RemoteCommandResult::commandFailed));
-
-    EXPECT_EQ(targets_.deliver(RemoteCommandKind::pause), RemoteCommandResult::success);
-    EXPECT_THAT(asked_, ElementsAre("newest", "oldest"));
-}
-
-TEST_F(RemoteTargetsTest, OtherCommandsGoToOlderTargetsUntilOneSucceeds) {
-    const auto oldest = targets_.playCommand().addTarget(answering("oldest", RemoteCommandResult::success));
-    const auto middle = targets_.playCommand().addTarget(answering("middle", RemoteCommandResult::success));
-    const auto newest =
-        targets_.playCommand().addTarget(answering("newest", RemoteCommandResult::commandFailed));
-
-    EXPECT_EQ(targets_.deliver(RemoteCommandKind::play), RemoteCommandResult::success);
-    EXPECT_THAT(asked_, ElementsAre("newest", "middle"));
-}
-
-TEST_F(RemoteTargetsTest, WithoutSuccessTheNewestTargetsResultHolds) {
-    const auto oldest =
-        targets_.nextTrackCommand().addTarget(answering("oldest", RemoteCommandResult::commandFailed));
-    const auto newest =
-        targets_.nextTrackCommand().addTarget(answering("newest", RemoteCommandResult::noSuchContent));
-
+TEST_F(RemoteTargetsTest, CommandsGoToWhatPlaysAndToNobodyElse) {
+    const auto album = FakePlayer::make(targets_, playback(1.5F));
+    const auto book = FakePlayer::make(targets_, playback(0));
+    album->answerWith(RemoteCommandResult::noSuchContent);
     EXPECT_EQ(targets_.deliver(RemoteCommandKind::nextTrack), RemoteCommandResult::noSuchContent);
-    EXPECT_THAT(asked_, ElementsAre("newest", "oldest"));
+    targets_.deliver(RemoteCommandKind::play);
+    EXPECT_THAT(album->commands(), ElementsAre("next", "play"));
+    EXPECT_THAT(book->commands(), IsEmpty());
 }
 
-TEST_F(RemoteTargetsTest, ADisabledCommandReachesNobody) {
-    const auto target =
-        targets_.previousTrackCommand().addTarget(answering("target", RemoteCommandResult::success));
-    targets_.previousTrackCommand().setEnabled(false);
+TEST_F(RemoteTargetsTest, WhileNothingPlaysTheyGoToWhatWasUsedLast) {
+    const auto album = FakePlayer::make(targets_, playback(0));
+    const auto book = FakePlayer::make(targets_, playback(0));
+    const auto empty = FakePlayer::make(targets_);
+    targets_.deliver(RemoteCommandKind::togglePlayPause);
+    EXPECT_THAT(book->commands(), ElementsAre("toggle")) << "the newest one that has an item";
 
-    EXPECT_FALSE(targets_.offers(RemoteCommandKind::previousTrack));
-    EXPECT_EQ(targets_.deliver(RemoteCommandKind::previousTrack), RemoteCommandResult::noSuchContent);
-    EXPECT_THAT(asked_, IsEmpty());
+    album->tell({.rate = 0, .item = item_, .seeks = 1});
+    targets_.deliver(RemoteCommandKind::nextTrack);
+    EXPECT_THAT(book->commands(), ElementsAre("toggle", "next")) << "a seek is no use of it";
+
+    album->tell(playback(1));
+    album->tell(playback(0));
+    targets_.deliver(RemoteCommandKind::play);
+    EXPECT_THAT(album->commands(), ElementsAre("play"));
+
+    book->tell({.rate = 1, .isHeld = true, .item = item_}); // used last, though nothing is heard of it
+    EXPECT_FALSE(targets_.players().front().playback.plays());
+    targets_.deliver(RemoteCommandKind::play);
+    EXPECT_THAT(book->commands(), ElementsAre("toggle", "next", "play"));
 }
 
-TEST_F(RemoteTargetsTest, ATargetThatGoesDuringADeliveryIsPassedOver) {
-    RegistrationHandle oldest =
-        targets_.pauseCommand().addTarget(answering("oldest", RemoteCommandResult::success));
-    RegistrationHandle newest;
-    newest = targets_.pauseCommand().addTarget([&] {
-        oldest.reset();
-        newest.reset(); // a target may end its own registration
-        return RemoteCommandResult::commandFailed;
-    });
+TEST_F(RemoteTargetsTest, AnotherRateOrItemCountsOnceItIsPublished) {
+    const auto player = FakePlayer::make(targets_, playback(0));
+    player->become({.rate = 1, .isHeld = {}, .item = item_, .position = {}, .hasNextItem = {}, .seeks = 1});
+    targets_.playbackChanged(*player);
+    EXPECT_EQ(targets_.players().front().playback.seeks, 0U);
+    targets_.playerChanged(*player);
+    EXPECT_EQ(targets_.players().front().playback.rate, 1);
+    player->become({.rate = 1, .isHeld = {}, .item = item_, .position = {}, .hasNextItem = {}, .seeks = 2});
+    targets_.playbackChanged(*player);
+    EXPECT_EQ(targets_.players().front().playback.seeks, 2U);
+}
 
+TEST_F(RemoteTargetsTest, APauseReachesEverybodyAndTheOneUsedLastComesLast) {
+    const auto album = FakePlayer::make(targets_, playback(1));
+    const auto book = FakePlayer::make(targets_, playback(1));
+    album->answerWith(RemoteCommandResult::commandFailed);
+    EXPECT_EQ(targets_.deliver(RemoteCommandKind::pause), RemoteCommandResult::success);
+    EXPECT_EQ(targets_.deliver(RemoteCommandKind::togglePlayPause), RemoteCommandResult::success);
+    EXPECT_THAT(album->commands(), ElementsAre("pause", "pause"));
+    EXPECT_THAT(book->commands(), ElementsAre("pause", "pause"));
+    book->answerWith(RemoteCommandResult::commandFailed);
     EXPECT_EQ(targets_.deliver(RemoteCommandKind::pause), RemoteCommandResult::commandFailed);
-    EXPECT_THAT(asked_, IsEmpty());
-    EXPECT_FALSE(targets_.offers(RemoteCommandKind::pause));
 }
 
-TEST_F(RemoteTargetsTest, ChangesAreToldOnlyWhenWhatIsOfferedChanges) {
-    auto first = targets_.playCommand().addTarget(answering("first", RemoteCommandResult::success));
+TEST_F(RemoteTargetsTest, ACommandThatIsDisabledOrHasNoPlayerReachesNobody) {
+    EXPECT_EQ(targets_.deliver(RemoteCommandKind::pause), RemoteCommandResult::noSuchContent);
+    const auto player = FakePlayer::make(targets_, playback(1));
+    const auto target =
+        targets_.previousTrackCommand().addTarget(*player, [] { return RemoteCommandResult::success; });
+    EXPECT_EQ(targets_.deliver(RemoteCommandKind::previousTrack), RemoteCommandResult::noSuchContent);
+}
+
+TEST_F(RemoteTargetsTest, TheControlsHearOfPlayersThatComeChangeAndGo) {
+    auto player = FakePlayer::make(targets_);
     EXPECT_EQ(changes_, 1);
-    auto second = targets_.playCommand().addTarget(answering("second", RemoteCommandResult::success));
-    first.reset();
-    targets_.previousTrackCommand().setEnabled(false);
-    EXPECT_EQ(changes_, 1);
-    targets_.playCommand().setEnabled(false);
-    second.reset();
+    player->tell(playback(1));
     EXPECT_EQ(changes_, 2);
+    player.reset();
+    EXPECT_EQ(changes_, 3);
+    EXPECT_THAT(targets_.players(), IsEmpty());
 }
 
-TEST(RemoteTargetsLifetime, RegistrationsMayOutliveTheTargets) {
-    RegistrationHandle registration;
-    {
-        RemoteTargets targets;
-        registration = targets.playCommand().addTarget([] { return RemoteCommandResult::success; });
-    }
-    registration.reset();
-}
-
-TEST(RemoteTargetsThreads, TargetsComeAndGoWhileCommandsAreDelivered) {
+TEST(RemoteTargetsThreads, PlayersComeAndGoWhileCommandsAreDelivered) {
     constexpr int rounds = 2000;
     RemoteTargets targets;
-    const auto permanent = targets.pauseCommand().addTarget([] { return RemoteCommandResult::success; });
-    std::thread registering([&] {
+    const auto permanent = FakePlayer::make(targets);
+    PlaybackState playing;
+    playing.rate = 1;
+    std::thread coming([&] {
         for (int round = 0; round < rounds; ++round)
-            const auto passing =
-                targets.pauseCommand().addTarget([] { return RemoteCommandResult::commandFailed; });
+            FakePlayer::make(targets)->tell(playing);
     });
     for (int round = 0; round < rounds; ++round)
         ASSERT_EQ(targets.deliver(RemoteCommandKind::pause), RemoteCommandResult::success);
-    registering.join();
+    coming.join();
 }
 
 } // namespace

@@ -114,6 +114,7 @@ public:
     void play() override {}
     std::shared_ptr<MediaItem> currentItem() const override { return nullptr; }
     MediaTime currentTime() const override { return MediaTime::zero(); }
+    PlaybackState playback() const override { return {}; }
     void advanceToNextItem() override {}
     void insertItem(std::shared_ptr<MediaItem>, const std::shared_ptr<MediaItem>&) override {}
     void removeItem(const std::shared_ptr<MediaItem>&) override {}

@@ -64,24 +64,30 @@ TEST_F(RemoteCommandTest, NextTrackHasNoContentAtTheEndOfTheQueue) {
 }
 
 TEST_F(RemoteCommandTest, PreviousTrackIsDisabledForGood) {
-    auto someone =
-        device.remoteCommands.center().previousTrackCommand().addTarget([] { return Result::success; });
+    RemoteTargets& center = device.remoteCommands.center();
+    auto someone = center.previousTrackCommand().addTarget(*center.players().front().player,
+                                                           [] { return Result::success; });
     EXPECT_EQ(press(Kind::previousTrack), Result::noSuchContent);
     tell(destroyPlayer("player"));
     EXPECT_EQ(press(Kind::previousTrack), Result::noSuchContent);
 }
 
-TEST_F(RemoteCommandTest, WithSeveralPlayersPauseGoesToAllAndTheRestToTheNewest) {
+TEST_F(RemoteCommandTest, WithSeveralPlayersPauseGoesToAllAndTheRestToOne) {
     tell(upsertPlayer("newer", {"b"}));
     EXPECT_EQ(press(Kind::play), Result::success);
     EXPECT_EQ(seen, "push queuePlayer.setRate identifier=newer rate=1\n");
     tell(setRate("player", 1));
+    tell(setRate("player", 0));
+    EXPECT_EQ(press(Kind::nextTrack), Result::noSuchContent);
+    EXPECT_EQ(seen, "push queuePlayer.setCurrentItem identifier=newer\n") << "what plays, and no other queue";
+    tell(appendItem("newer", "b"));
+    tell(setRate("player", 1));
     EXPECT_EQ(press(Kind::pause), Result::success);
     EXPECT_EQ(seen, "push queuePlayer.setRate identifier=newer rate=0\n"
                     "push queuePlayer.setRate identifier=player rate=0\n");
-    tell(destroyPlayer("newer"));
     EXPECT_EQ(press(Kind::play), Result::success);
-    EXPECT_EQ(seen, "push queuePlayer.setRate identifier=player rate=1\n");
+    EXPECT_EQ(seen, "push queuePlayer.setRate identifier=player rate=1\n") << "the one that was used last";
+    tell(destroyPlayer("newer"));
     tell(destroyPlayer("player"));
     EXPECT_EQ(press(Kind::play), Result::noSuchContent);
 }

@@ -4,109 +4,88 @@
 namespace tarn {
 namespace {
 
-using std::chrono::seconds;
-using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::SizeIs;
 
 class LifetimeTest : public ControlsTest {};
 
 TEST_F(LifetimeTest, ThePlayerIsOnTheBusOnlyWhileAQueuePlayerLives) {
-    BusListener listener(bus_.address());
-    publish(track("First", 0, 0)); // shows nothing yet
     for (int round = 0; round < 3; ++round) {
-        bringPlayer(track("First", 0, 0));
-        ASSERT_EQ(listener.next(), "appeared");
-        // The object is there as soon as the name is.
-        EXPECT_EQ(listener.readAllProperties(), 20);
+        bringPlayer();
+        EXPECT_EQ(bus_.property("PlaybackStatus"),
+                  "s \"Paused\""); // the object is there as soon as the name is
         player_.reset();
-        ASSERT_EQ(listener.next(), "vanished");
-        EXPECT_EQ(listener.readAllProperties(), 0);
+        ASSERT_EQ(listener_.next(), "vanished");
+        EXPECT_THAT(bus_.property("PlaybackStatus"), HasSubstr("not provided by any"));
     }
 }
 
 TEST_F(LifetimeTest, TheEndOfThePlayerDoesNotCostItsLastAnswer) {
-    BusListener listener(bus_.address());
-    bringPlayer(track("First", 0, 0));
-    ASSERT_TRUE(listener.waitForPlayer());
-    RegistrationHandle held = controls_->remoteCommands().playCommand().addTarget([&] {
-        player_.reset();
-        EXPECT_EQ(listener.next(), "vanished");
-        return RemoteCommandResult::success;
-    });
-    const auto played = playerctl({"play"});
-    EXPECT_EQ(played.status, 0) << played.output;
+    bringPlayer();
+    player_->hold();
+    ChildProcess pausing(bus_.calling({"Pause"}));
+    ASSERT_TRUE(player_->waitForCommands(1));
+    player_->letGo();
+    player_.reset();
+    EXPECT_EQ(pausing.wait(), 0);
 }
 
 TEST_F(LifetimeTest, ASecondServiceHasANameOfItsOwn) {
-    const std::string instance =
-        std::string(BusListener::playerName) + ".instance" + std::to_string(getpid());
-    BusListener first(bus_.address());
-    BusListener second(bus_.address(), instance);
-    bringPlayer(track("First", 0, 0));
-    ASSERT_TRUE(first.waitForPlayer());
-
+    SignalListener second(bus_, "org.mpris.MediaPlayer2.tarnd.instance" + std::to_string(getpid()));
+    bringPlayer();
     LinuxMediaControls another(applicationName, {bus_.address(), ""});
-    another.setNowPlayingInfo(NowPlayingService::Origin::local, track("Other", 0, 0),
-                              NowPlayingService::mergePolicyReplace);
-    FakePlayer anotherPlayer(another.remoteCommands());
-    ASSERT_TRUE(second.waitForPlayer());
-    EXPECT_EQ(second.call("Play"), "");
-    EXPECT_THAT(anotherPlayer.commands(), ElementsAre("play"));
-    EXPECT_THAT(player_->commands(), ElementsAre());
+    const auto other = FakePlayer::make(another.remoteCommands());
+    EXPECT_THAT(second.until("appeared"), testing::Not(testing::Contains(HasSubstr("no "))));
 }
 
 TEST_F(LifetimeTest, ThePlayerComesBackWithTheBus) {
     const CapturedLog log;
-    bringPlayer(track("First", 0, 1));
-    constexpr int rounds = 20;
+    bringPlayer(1);
+    constexpr int rounds = 5;
     for (int round = 0; round < rounds; ++round) {
-        BusListener listener(bus_.address());
-        ASSERT_TRUE(listener.waitForPlayer(seconds(2))) << round;
-        ASSERT_EQ(listener.call("Pause"), "") << round;
+        player_->hold();
+        ChildProcess waiting(bus_.calling({"Pause"})); // nobody is there to hear the answer
+        ASSERT_TRUE(player_->waitForCommands(2 * static_cast<std::size_t>(round) + 1));
         bus_.kill();
         ASSERT_TRUE(log.waitFor("out of reach"));
-        publish(track("Round " + std::to_string(round), 0, 1)); // nobody hears it, and nobody minds
+        publish(track("Round " + std::to_string(round)));
         bus_.start();
+        SignalListener listener(bus_);
+        player_->letGo();
+        while (bus_.property("PlaybackStatus") != "s \"Playing\"")
+            ASSERT_EQ(listener.next(), "appeared");
+        ASSERT_EQ(bus_.call({"Pause"}), "");
     }
-    BusListener listener(bus_.address());
-    ASSERT_TRUE(listener.waitForPlayer(seconds(2)));
-    EXPECT_THAT(playerctl({"metadata", "title"}).output, HasSubstr("Round 19"));
-    ASSERT_EQ(listener.call("Play"), "");
+    EXPECT_THAT(bus_.property("Metadata"), HasSubstr("Round 4"));
     EXPECT_THAT(log.errors(), SizeIs(rounds));
     EXPECT_THAT(log.messages(), SizeIs(2 * rounds)); // one line for each end and each return
+}
+
+TEST_F(LifetimeTest, ABusThatHangsHoldsUpNobody) {
+    bringPlayer(1);
+    bus_.signal(SIGSTOP);
+    for (int number = 0; number < 10000; ++number)
+        publish(track("Track " + std::to_string(number)));
+    bus_.signal(SIGCONT);
+    player_->tell({});
+    EXPECT_THAT(listener_.until(everything), testing::Not(testing::Contains("vanished")));
 }
 
 TEST(LateBusTest, TheServiceGoesOnWithoutABusAndFindsItWhenItComes) {
     const CapturedLog log;
     PrivateBus bus(PrivateBus::State::notYetStarted);
-    LinuxMediaControls controls([](const std::string&) { return std::nullopt; }, {bus.address(), ""});
-    const FakePlayer player(controls.remoteCommands());
+    const auto nameless = [](const std::string&) { return std::nullopt; };
+    LinuxMediaControls controls(nameless, {bus.address(), ""});
+    const auto player = FakePlayer::make(controls.remoteCommands());
     ASSERT_TRUE(log.waitFor("The session bus is out of reach"));
     bus.start();
-    BusListener listener(bus.address());
-    EXPECT_TRUE(listener.waitForPlayer(seconds(2)));
-    EXPECT_THAT(log.errors(), SizeIs(1));
-}
+    ASSERT_TRUE(log.waitFor("The session bus is back"));
+    EXPECT_THAT(log.messages(), SizeIs(2));
 
-TEST(LateBusTest, WithoutAnAddressThereIsOneLine) {
-    const CapturedLog log;
-    LinuxMediaControls controls([](const std::string&) { return std::nullopt; }, {"", ""});
-    const FakePlayer player(controls.remoteCommands());
-    ASSERT_TRUE(log.waitFor("The session bus is out of reach"));
-    EXPECT_THAT(log.messages(), SizeIs(1));
-}
-
-TEST_F(LifetimeTest, ABusThatHangsHoldsUpNobody) {
-    bringPlayer(track("First", 0, 1));
-    BusListener listener(bus_.address());
-    ASSERT_TRUE(listener.waitForPlayer());
-    bus_.signal(SIGSTOP);
-    for (int number = 0; number < 10000; ++number)
-        publish(track("Track " + std::to_string(number), 0, 1));
-    bus_.signal(SIGCONT);
-    publish({});
-    EXPECT_THAT(listener.until(cleared), testing::Not(testing::Contains("vanished")));
+    const CapturedLog second;
+    LinuxMediaControls withoutAddress(nameless, {"", ""});
+    const auto lonely = FakePlayer::make(withoutAddress.remoteCommands());
+    EXPECT_TRUE(second.waitFor("The session bus is out of reach"));
 }
 
 } // namespace

@@ -7,101 +7,75 @@ namespace {
 
 using testing::ElementsAre;
 
-/// The private bus serves as the system bus; there is no session bus.
+const std::vector<std::string> awake = {"idle:block", "sleep:delay"};
+
+/// The private bus serves as the system bus, too.
 class SleepTest : public ControlsTest {
 protected:
-    void SetUp() override {
-        controls_ = std::make_unique<LinuxMediaControls>(applicationName,
-                                                         LinuxMediaControls::Addresses{"", bus_.address()});
+    SleepTest() {
+        controls_ = std::make_unique<LinuxMediaControls>(
+            applicationName, LinuxMediaControls::Addresses{bus_.address(), bus_.address()});
     }
 
     const CapturedLog log_;
+    FakeLoginManager manager_{bus_.address()};
 };
 
 TEST_F(SleepTest, TheDeviceStaysAwakeOnlyWhileSomethingPlays) {
-    FakeLoginManager manager(bus_.address());
-    bringPlayer(track("First", 0, 1));
-    EXPECT_TRUE(manager.waitForLocks({"idle:block", "sleep:delay"}));
-    publish(track("First", 10, 0));
-    EXPECT_TRUE(manager.waitForLocks({}));
-    publish(track("First", 10, 1));
-    EXPECT_TRUE(manager.waitForLocks({"idle:block", "sleep:delay"}));
+    bringPlayer(1);
+    EXPECT_TRUE(manager_.waitForLocks(awake));
+    auto held = playing(1);
+    held.isHeld = true;
+    for (const PlaybackState& silent : {playing(0), held}) {
+        player_->tell(silent);
+        EXPECT_TRUE(manager_.waitForLocks({}));
+        player_->tell(playing(1));
+        EXPECT_TRUE(manager_.waitForLocks(awake));
+    }
+    publish({}); // on behalf of another player
+    const auto other = FakePlayer::make(controls_->remoteCommands());
+    manager_.prepareForSleep(false);
+    EXPECT_TRUE(manager_.waitForLocks(awake));
     player_.reset();
-    EXPECT_TRUE(manager.waitForLocks({}));
+    EXPECT_TRUE(manager_.waitForLocks({}));
 }
 
 TEST_F(SleepTest, SleepWaitsForThePause) {
-    FakeLoginManager manager(bus_.address());
-    bringPlayer(track("First", 0, 1));
-    ASSERT_TRUE(manager.waitForLocks({"idle:block", "sleep:delay"}));
+    bringPlayer(1);
+    ASSERT_TRUE(manager_.waitForLocks(awake));
     player_->hold();
-    manager.prepareForSleep(true);
+    manager_.prepareForSleep(true);
     ASSERT_TRUE(player_->waitForCommands(1));
-    EXPECT_THAT(player_->commands(), ElementsAre("pause"));
-    EXPECT_TRUE(manager.waitForLocks({"idle:block", "sleep:delay"}));
+    EXPECT_TRUE(manager_.waitForLocks(awake));
     player_->letGo();
-    EXPECT_TRUE(manager.waitForLocks({"idle:block"})); // until the players tell that they have paused
-    publish(track("First", 10, 0));
-    EXPECT_TRUE(manager.waitForLocks({}));
-
-    manager.prepareForSleep(false);
-    publish(track("First", 10, 1));
-    EXPECT_TRUE(manager.waitForLocks({"idle:block", "sleep:delay"}));
+    EXPECT_TRUE(manager_.waitForLocks({"idle:block"})); // until the players tell that they have paused
+    player_->tell(playing(0));
+    EXPECT_TRUE(manager_.waitForLocks({}));
+    manager_.prepareForSleep(false);
+    player_->tell(playing(1));
+    EXPECT_TRUE(manager_.waitForLocks(awake));
     EXPECT_THAT(player_->commands(), ElementsAre("pause")); // nothing resumed by itself
 }
 
-TEST_F(SleepTest, APlayThatTakesItsTimeDoesNotHoldUpThePause) {
-    controls_ = std::make_unique<LinuxMediaControls>(
-        applicationName, LinuxMediaControls::Addresses{bus_.address(), bus_.address()});
-    FakeLoginManager manager(bus_.address());
-    BusListener listener(bus_.address());
-    bringPlayer(track("First", 0, 1));
-    ASSERT_TRUE(listener.waitForPlayer());
-    ASSERT_TRUE(manager.waitForLocks({"idle:block", "sleep:delay"}));
-    player_->hold("play");
-    listener.begin("Play");
-    ASSERT_TRUE(player_->waitForCommands(1));
-
-    manager.prepareForSleep(true);
-    EXPECT_TRUE(manager.waitForLocks({"idle:block"}));
-    EXPECT_THAT(player_->commands(), ElementsAre("play", "pause"));
-    EXPECT_EQ(listener.answer(std::chrono::milliseconds(0)), std::nullopt);
-
-    player_->letGo();
-    EXPECT_EQ(listener.answer(std::chrono::seconds(10)), "");
-    ASSERT_TRUE(player_->waitForCommands(3));
-    EXPECT_THAT(player_->commands(), ElementsAre("play", "pause", "pause")); // it does not play on either
-}
-
-TEST_F(SleepTest, APlayUnderWayDoesNotBeginInTheMiddleOfTheSleep) {
-    controls_ = std::make_unique<LinuxMediaControls>(
-        applicationName, LinuxMediaControls::Addresses{bus_.address(), bus_.address()});
-    FakeLoginManager manager(bus_.address());
-    BusListener listener(bus_.address());
-    bringPlayer(track("First", 0, 1));
-    ASSERT_TRUE(manager.waitForLocks({"idle:block", "sleep:delay"}));
-    publish(track("First", 5, 0));
-    ASSERT_TRUE(manager.waitForLocks({}));
-    ASSERT_TRUE(listener.waitForPlayer());
-    player_->hold("play");
-    listener.begin("Play");
-    ASSERT_TRUE(player_->waitForCommands(1));
-    manager.prepareForSleep(true);
-    ASSERT_TRUE(player_->waitForCommands(2));
-    player_->letGo();
-    ASSERT_TRUE(player_->waitForCommands(3));
-    EXPECT_THAT(player_->commands(), ElementsAre("play", "pause", "pause"));
-}
-
-TEST_F(SleepTest, WithoutALoginManagerNothingHappens) {
-    bringPlayer(track("First", 0, 1));
-    ASSERT_TRUE(log_.waitFor("session bus"));
-    publish(track("First", 0, 0));
-    publish(track("First", 0, 1));
-    player_.reset();
-    controls_.reset();
-    EXPECT_THAT(log_.messages(),
-                ElementsAre(testing::HasSubstr("session bus"))); // about the session bus alone
+TEST_F(SleepTest, APlayThatTakesItsTimeDoesNotHoldUpThePauseNorBeginInTheSleep) {
+    for (const float rate : {1.0F, 0.0F}) {
+        bringPlayer(1);
+        ASSERT_TRUE(manager_.waitForLocks(awake));
+        player_->tell(playing(rate));
+        player_->hold("play");
+        ChildProcess waiting(bus_.calling({"Play"}));
+        ASSERT_TRUE(player_->waitForCommands(1));
+        manager_.prepareForSleep(true);
+        EXPECT_TRUE(player_->waitForCommands(2));
+        EXPECT_TRUE(manager_.waitForLocks(rate == 0 ? std::vector<std::string>()
+                                                    : std::vector<std::string>{"idle:block"}));
+        player_->letGo();
+        EXPECT_EQ(waiting.wait(), 0);
+        ASSERT_TRUE(player_->waitForCommands(3));
+        EXPECT_THAT(player_->commands(), ElementsAre("play", "pause", "pause"));
+        player_.reset();
+        EXPECT_THAT(listener_.until("vanished"), testing::SizeIs(rate == 0 ? 1 : 0));
+    }
 }
 
 } // namespace

@@ -26,8 +26,12 @@ SoundServerProcess::SoundServerProcess(std::vector<std::string> modules) : modul
 
 std::vector<std::string> SoundServerProcess::environment() const {
     const std::string path = folder_.path().string();
-    return {"PULSE_SERVER=unix:" + path + "/native", "XDG_RUNTIME_DIR=" + path, "PULSE_RUNTIME_PATH=" + path,
-            "PULSE_STATE_PATH=" + path, "HOME=" + path};
+    return {"PULSE_SERVER=unix:" + path + "/native",
+            "XDG_RUNTIME_DIR=" + path,
+            "PULSE_RUNTIME_PATH=" + path,
+            "PULSE_STATE_PATH=" + path,
+            "HOME=" + path,
+            "TARND_SOUND="};
 }
 
 void SoundServerProcess::start() {

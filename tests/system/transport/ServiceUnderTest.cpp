@@ -22,12 +22,17 @@ void ServiceUnderTest::start() {
     const auto readyPath = (folder_ / "ready").string();
     const FileDescriptor ready(::socket(AF_UNIX, SOCK_DGRAM | SOCK_CLOEXEC, 0));
     ASSERT_TRUE(SocketAddress(readyPath).bind(ready.get()));
-    const std::string runtime = "XDG_RUNTIME_DIR=" + folder_.path().string();
-    process_ = std::make_unique<ChildProcess>(
-        std::vector<std::string>{TARND},
-        std::vector<std::string>{runtime, "NOTIFY_SOCKET=" + readyPath, "TARND_SOUND=none",
-                                 "DBUS_SESSION_BUS_ADDRESS=unix:path=/nowhere", "JOURNAL_STREAM="},
-        ChildProcess::ErrorOutput::withOutput);
+    const std::string folder = folder_.path();
+    // Of two settings of one name the first one counts.
+    std::vector<std::string> environment = {"XDG_RUNTIME_DIR=" + folder, "NOTIFY_SOCKET=" + readyPath,
+                                            "JOURNAL_STREAM="};
+    environment.insert(environment.end(), environment_.begin(), environment_.end());
+    environment.insert(environment.end(),
+                       {"HOME=" + folder, "XDG_DATA_HOME=" + folder, "XDG_DATA_DIRS=" + folder, "LANG=C",
+                        "TARND_SOUND=none", "DBUS_SESSION_BUS_ADDRESS=unix:path=/nowhere",
+                        "DBUS_SYSTEM_BUS_ADDRESS=unix:path=/nowhere"});
+    process_ = std::make_unique<ChildProcess>(std::vector<std::string>{TARND}, environment,
+                                              ChildProcess::ErrorOutput::withOutput);
     pollfd wait{ready.get(), POLLIN, 0};
     ASSERT_EQ(::poll(&wait, 1, deadlineMilliseconds), 1) << "the service does not get ready";
     std::filesystem::remove(readyPath);

@@ -2,6 +2,8 @@
 
 #include <memory>
 #include <string>
+#include <utility>
+#include <vector>
 
 #include <tarn/Client.h>
 
@@ -11,10 +13,14 @@
 
 namespace tarn {
 
-/// A real tarnd on a socket of its own, without sound server and bus, and what tests do with it.
+/// A real tarnd on a socket of its own, and what tests do with it. It has a sound server, a bus and data
+/// folders only where `environment` says so.
 class ServiceUnderTest {
 public:
-    ServiceUnderTest() { start(); }
+    explicit ServiceUnderTest(std::vector<std::string> environment = {})
+        : environment_(std::move(environment)) {
+        start();
+    }
 
     /// Starts it, after stop() or kill() again, and waits until it is ready.
     void start();
@@ -42,6 +48,7 @@ public:
 private:
     std::size_t entriesOf(const char* folder) const;
 
+    const std::vector<std::string> environment_;
     TemporaryFolder folder_;
     std::unique_ptr<ChildProcess> process_;
 };
