@@ -13,10 +13,13 @@ constexpr auto longestBusy = 10s;
 
 } // namespace
 
-bool ChildPool::becameIdle(Held& held) {
+/// Is it alive, with nothing to do?
+bool ChildPool::isFree(Held& held) {
     ReceivedMessage message;
-    held.idle = held.child.channel().receiveNow(message) == Channel::Result::done &&
-                message.as<ChildIsIdle>().has_value();
+    const Channel::Result result = held.child.channel().receiveNow(message);
+    if (held.idle)
+        return result == Channel::Result::notNow; // it says nothing, and has not ended
+    held.idle = result == Channel::Result::done && message.as<ChildIsIdle>().has_value();
     return held.idle;
 }
 
@@ -27,7 +30,7 @@ std::optional<MediaChild> ChildPool::take() {
         std::optional<MediaChild> found;
         for (auto held = all.begin(); held != all.end();) {
             const auto age = now - held->since;
-            const bool usable = held->idle ? age < longestIdle : becameIdle(*held);
+            const bool usable = age < longestIdle && isFree(*held);
             const bool waits = !usable && !held->idle && age < longestBusy;
             if (waits || (usable && found)) {
                 ++held;

@@ -34,7 +34,7 @@ private:
         Time since;
     };
 
-    static bool becameIdle(Held& held);
+    static bool isFree(Held& held);
 
     MediaProcess& process_;
     const ChildKind kind_;

@@ -6,14 +6,7 @@
 
 namespace tarn {
 
-namespace {
-
-constexpr std::chrono::seconds examinerPatience{10};
-
-}
-
 void Examiner::run() {
-    service_.limitWaits(examinerPatience);
     ReceivedMessage message;
     while (service_.receive(message, 1) == Channel::Result::done) {
         const auto request = message.as<Examine>();

@@ -11,7 +11,7 @@ public:
     /// `locks` are told with every answer.
     Examiner(Channel service, std::uint32_t locks) : service_(std::move(service)), locks_(locks) {}
 
-    /// Returns when the service wants no more, or has wanted nothing for a while.
+    /// Returns when the service wants no more, or has wanted nothing for as long as the channel waits.
     void run();
 
 private:

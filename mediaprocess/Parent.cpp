@@ -17,6 +17,8 @@ namespace tarn {
 
 namespace {
 
+constexpr std::chrono::seconds longestWait{10}; // of a child that does one thing after the other
+
 /// Ends of children interrupt nothing but the wait below.
 void holdChildSignal() {
     struct sigaction action {};
@@ -74,6 +76,8 @@ void Parent::fork(const ForkRequest& request, FileDescriptor socket, FileDescrip
 }
 
 void Parent::runChild(ChildKind kind, Channel service, const FileDescriptor& ring) const {
+    if (kind != ChildKind::renderer)
+        service.limitWaits(longestWait); // while it may still say so
     switch (kind) {
     case ChildKind::porter:
         ::prctl(PR_SET_NAME, "tarn-porter");

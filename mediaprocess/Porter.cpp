@@ -13,7 +13,6 @@ namespace tarn {
 
 namespace {
 
-constexpr std::chrono::seconds porterPatience{10};
 constexpr std::size_t mostReceivedFiles = 253; // what the system lets through at once
 
 // Asks no file system: what is known of an open file will do.
@@ -65,7 +64,6 @@ std::vector<FileDescriptor> receiveFiles(int connection, std::size_t bytes) {
 } // namespace
 
 void Porter::run() {
-    service_.limitWaits(porterPatience);
     ReceivedMessage message;
     while (service_.receive(message, ReceivedMessage::mostFiles) == Channel::Result::done)
         if (!serve(message) && service_.send(ChildIsIdle{}) != Channel::Result::done)

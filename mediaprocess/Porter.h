@@ -18,7 +18,7 @@ class Porter {
 public:
     explicit Porter(Channel service) : service_(std::move(service)) {}
 
-    /// Returns when the service wants no more.
+    /// Returns when the service wants no more, or has wanted nothing for as long as the channel waits.
     void run();
 
 private:
