@@ -87,6 +87,7 @@ std::unique_ptr<FileReceiver::Arrival> ClientFiles::receive(int socket, std::siz
 }
 
 void ClientFiles::drop(int socket) {
+    ::shutdown(socket, SHUT_RDWR); // whoever has it open then, the client sees its end now
     auto porter = porter_.porters().take();
     if (!porter || porter->channel().send(DropFile{}, std::span(&socket, 1)) != Channel::Result::done)
         return;

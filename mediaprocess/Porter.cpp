@@ -35,8 +35,9 @@ ParkedFile openNamed(int named) {
     return opened;
 }
 
-/// Reads `bytes` bytes and the files among them.
-std::vector<FileDescriptor> receiveFiles(int connection, std::size_t bytes) {
+/// Reads up to `bytes` bytes and the files among them, which it appends to `files`. False when nothing is
+/// there.
+bool receiveFiles(int connection, std::size_t bytes, std::vector<FileDescriptor>& files) {
     std::vector<char> ignored(bytes);
     iovec part{ignored.data(), ignored.size()};
     alignas(cmsghdr) std::byte control[CMSG_SPACE(mostReceivedFiles * sizeof(int))];
@@ -45,9 +46,8 @@ std::vector<FileDescriptor> receiveFiles(int connection, std::size_t bytes) {
     message.msg_iovlen = 1;
     message.msg_control = control;
     message.msg_controllen = sizeof control;
-    std::vector<FileDescriptor> files;
-    if (::recvmsg(connection, &message, MSG_DONTWAIT | MSG_CMSG_CLOEXEC) < 0)
-        return files;
+    if (::recvmsg(connection, &message, MSG_DONTWAIT | MSG_CMSG_CLOEXEC) <= 0)
+        return false;
     for (cmsghdr* header = CMSG_FIRSTHDR(&message); header != nullptr;
          header = CMSG_NXTHDR(&message, header)) {
         if (header->cmsg_level != SOL_SOCKET || header->cmsg_type != SCM_RIGHTS)
@@ -58,7 +58,17 @@ std::vector<FileDescriptor> receiveFiles(int connection, std::size_t bytes) {
             files.emplace_back(number);
         }
     }
-    return files;
+    return true;
+}
+
+/// Takes all files out of a socket that the service lets go, at about the same time: who closes it last would
+/// else close them too.
+void dropFiles(FileDescriptor connection) {
+    constexpr std::size_t piece = 65'536;
+    std::vector<FileDescriptor> files;
+    while (receiveFiles(connection.get(), piece, files)) {
+    }
+    connection.reset(); // closing the files may take for ever
 }
 
 } // namespace
@@ -82,11 +92,13 @@ bool Porter::serve(ReceivedMessage& message) {
     } else if (const auto received = message.as<ReceiveFile>()) {
         answer = receiveFile(std::move(first), received->bytes, files);
     } else {
+        if (message.as<DropFile>())
+            dropFiles(std::move(first));
         if (message.as<ReopenFile>()) {
             const ParkedFile opened = openNamed(first.get());
             static_cast<void>(sendParked(second.get(), opened.file.get(), opened.error));
         }
-        return false; // or it is to be dropped
+        return false;
     }
     std::vector<int> handed;
     if (answer.form != FileForm::none)
@@ -111,7 +123,8 @@ Ported Porter::openPath(const std::string& path, FileDescriptor& file) {
 }
 
 Ported Porter::receiveFile(FileDescriptor connection, std::size_t bytes, std::vector<FileDescriptor>& files) {
-    files = receiveFiles(connection.get(), bytes);
+    files.clear();
+    receiveFiles(connection.get(), bytes, files);
     connection.reset(); // at once: while it is open here the client does not see the service's end
     if (files.size() != 1)
         return {.refusal = Ported::Refusal::notOneFile};

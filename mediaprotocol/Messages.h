@@ -97,7 +97,7 @@ struct ReceiveFile {
     std::uint32_t bytes = 0;
 };
 
-/// Close the descriptor that comes along.
+/// Take all files out of the socket that comes along, and close them.
 struct DropFile {
     MessageKind kind = MessageKind::dropFile;
     std::uint32_t zero = 0;

@@ -40,7 +40,7 @@ public:
     /// until they are there, or given up. Null when that is not possible.
     virtual std::unique_ptr<Arrival> receive(int socket, std::size_t bytes) = 0;
 
-    /// Closes a socket in which files are left, once the caller has closed it too.
+    /// Takes away what files are left in a socket that the caller is about to close.
     virtual void drop(int socket) = 0;
 };
 
