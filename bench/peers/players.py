@@ -27,10 +27,10 @@ def can_connect(path: pathlib.Path) -> bool:
 class Player:
     """A process with a socket. `position()` asks once; `positions(n)` asks n times before it reads an answer."""
 
-    def __init__(self, command: list, path: pathlib.Path, server: SoundServer):
+    def __init__(self, command: list, path: pathlib.Path, server: SoundServer, log=subprocess.DEVNULL):
         begin = time.monotonic()
         self.process = subprocess.Popen(command, env=server.environment, stdout=subprocess.DEVNULL,
-                                        stderr=subprocess.DEVNULL, stdin=subprocess.DEVNULL)
+                                        stderr=log, stdin=subprocess.DEVNULL)
         wait_until(lambda: can_connect(path), command[0])
         self.socket = connected(path)
         self.unread = b""
@@ -143,9 +143,9 @@ class Tarn(Player):
     name = "tarnd"
     ASSET, ITEM, PLAYER = 1, 2, 3
 
-    def __init__(self, program: pathlib.Path, server: SoundServer):
-        self.calls = 0
-        super().__init__([str(program)], server.folder / "ostrel.tarnd", server)
+    def __init__(self, program: pathlib.Path, server: SoundServer, log=subprocess.DEVNULL):
+        self.call = 0
+        super().__init__([str(program)], server.folder / "ostrel.tarnd", server, log)
         self.query = self.frame(self.ITEM, field(4, field(1, "item")))
 
     def frame(self, kind: int, command: bytes, call: int = 1) -> bytes:
@@ -153,10 +153,12 @@ class Tarn(Player):
         return struct.pack("<IBxxxQ", len(envelope), 1, call) + envelope
 
     def next_frame(self) -> tuple:
-        """Its kind and body."""
+        """Its kind and body. `call` is then what it answers."""
         while len(self.unread) < 16 or len(self.unread) < 16 + struct.unpack_from("<I", self.unread)[0]:
-            self.unread += self.socket.recv(65536)
-        length, kind = struct.unpack_from("<IB", self.unread)
+            if not (piece := self.socket.recv(65536)):
+                raise ConnectionError("the service is gone")
+            self.unread += piece
+        length, kind, self.call = struct.unpack_from("<IBxxxQ", self.unread)
         body, self.unread = self.unread[16:16 + length], self.unread[16 + length:]
         return kind, body
 

@@ -27,6 +27,18 @@ class SoundServer:
         self.process.wait()
 
 
+class NoSoundServer:
+    """Stands in for one where a service is to play in silence, away from the session's bus."""
+
+    def __init__(self, folder: pathlib.Path):
+        self.folder = folder
+        self.environment = dict(os.environ, XDG_RUNTIME_DIR=str(folder), PULSE_SERVER=f"unix:{folder}/nobody",
+                                HOME=str(folder), TARND_SOUND="none", DBUS_SESSION_BUS_ADDRESS="unix:path=/nowhere")
+
+    def stop(self):
+        pass
+
+
 class Recorder:
     """Listens to the sink. Silence is exact zeros."""
 
