@@ -2,7 +2,6 @@
 
 #include <algorithm>
 #include <mutex>
-#include <ranges>
 #include <utility>
 
 namespace tarn {
@@ -41,7 +40,7 @@ private:
 class RemoteTargets::Command final : public RemoteCommand {
 public:
     RegistrationHandle addTarget(const ControllablePlayer& player, Handler handler) override {
-        auto target = std::make_shared<Target>(&player, std::move(handler));
+        auto target = std::make_shared<Target>(Target{&player, std::move(handler)});
         const std::lock_guard lock(list_->mutex);
         list_->targets.push_back(target);
         return std::make_unique<TargetRegistration>(list_, std::move(target));
@@ -125,8 +124,8 @@ RemoteCommandResult RemoteTargets::deliver(RemoteCommandKind kind) {
     if (kind != RemoteCommandKind::pause)
         return asked.ask(*players.front().player);
     // The one that was used last comes last, so that it still is the one to go on with.
-    for (const ListedPlayer& listed : players | std::views::reverse)
-        if (const auto answer = asked.ask(*listed.player); result != RemoteCommandResult::success)
+    for (auto listed = players.rbegin(); listed != players.rend(); ++listed)
+        if (const auto answer = asked.ask(*listed->player); result != RemoteCommandResult::success)
             result = answer;
     return result;
 }
