@@ -4,6 +4,7 @@
 #include <limits>
 
 #include "decoder/Samples.h"
+#include "decoder/TtaLength.h"
 
 namespace tarn {
 
@@ -43,6 +44,8 @@ FileDecoder::FileDecoder(ByteSource& source, const AudioFileInfo& info) : source
 std::optional<Error> FileDecoder::open() {
     if (auto error = container_.open(source_))
         return error;
+    if (info_.frames)
+        tellTtaLength(container_, *info_.frames);
     codec_ = container_.openCodec();
     const AVPacket* first = codec_ ? container_.next() : nullptr;
     if (first == nullptr)

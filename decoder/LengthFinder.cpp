@@ -4,6 +4,7 @@
 
 #include "decoder/FlacSearch.h"
 #include "decoder/MpegEstimate.h"
+#include "decoder/TtaLength.h"
 
 namespace tarn {
 
@@ -36,6 +37,8 @@ std::int64_t LengthFinder::origin() const {
 void LengthFinder::note(const AVPacket& packet) {
     end_ = timeline_.begin(packet).value_or(end_) + timeline_.length(packet);
     discarded_ = trimOf(packet).end;
+    if (container_.stream().codecpar->codec_id == AV_CODEC_ID_TTA)
+        last_.reset(av_packet_clone(&packet));
 }
 
 bool LengthFinder::readOn(const WorkLimit& limit) {
@@ -90,7 +93,8 @@ std::optional<std::int64_t> LengthFinder::endOfTail() {
             av_rescale_q(duration - tail, AVRational{1, AV_TIME_BASE}, container_.stream().time_base));
     if (!readOn(WorkLimit(longestReading)) || container_.failure())
         return std::nullopt;
-    return endOfRead();
+    const auto length = last_ ? findTtaLength(container_, *last_) : std::nullopt;
+    return length ? length : endOfRead();
 }
 
 std::optional<std::int64_t> LengthFinder::end() {

@@ -50,6 +50,7 @@ private:
     std::int64_t position_ = -1;
     std::int64_t end_ = 0;
     std::int64_t discarded_ = 0;
+    FfmpegPointer<AVPacket> last_; ///< of TTA, that was read
 };
 
 } // namespace tarn

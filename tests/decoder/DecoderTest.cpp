@@ -32,6 +32,7 @@ const FileFormat formats[] = {
     {"opus.webm", "-c:a libopus -b:a 160k", 48000, false, true},
     {"vorbis.mka", "-c:a libvorbis -q:a 6", 44100, false, false},
     {"flac.mka", "-c:a flac", 44100, true, true},
+    {"tta.mka", "-c:a tta", 44100, true, true},
 };
 
 struct DecoderTest : testing::TestWithParam<FileFormat> {
