@@ -27,15 +27,16 @@ bool wasReached = false;
 
 } // namespace
 
-void* operator new(std::size_t size) {
+// Not inlined: seeing only one half of a pair, the compiler would warn that memory is freed in the wrong way.
+[[gnu::noinline]] void* operator new(std::size_t size) {
     if (allocationsLeft >= 0 && allocationsLeft-- == 0)
         throw std::bad_alloc();
     if (void* memory = std::malloc(size > 0 ? size : 1))
         return memory;
     throw std::bad_alloc();
 }
-void operator delete(void* memory) noexcept { std::free(memory); }
-void operator delete(void* memory, std::size_t) noexcept { std::free(memory); }
+[[gnu::noinline]] void operator delete(void* memory) noexcept { std::free(memory); }
+[[gnu::noinline]] void operator delete(void* memory, std::size_t) noexcept { std::free(memory); }
 
 namespace tarn {
 namespace {
