@@ -1,3 +1,4 @@
+#include <cstring>
 #include <fstream>
 
 #include "decoder/Gapless.h"
@@ -88,6 +89,24 @@ TEST_F(ExaminationTest, AWavFileWhoseWriterDidNotKnowItsLengthIsWhole) {
         EXPECT_EQ(error.code, 0);
         EXPECT_EQ(buffer.frames, 100'003u);
     }
+}
+
+TEST_F(ExaminationTest, AFileOf3GiBIsReadToItsEnd) {
+    constexpr std::int64_t size = std::int64_t{3} << 30;
+    std::string header = contentOf(folder / "source.wav");
+    header.resize(header.find("data") + 8);
+    const auto length = static_cast<std::uint32_t>(static_cast<std::size_t>(size) - header.size());
+    std::memcpy(header.data() + header.size() - sizeof length, &length, sizeof length);
+    const auto path = folder.write("long.wav", header);
+    std::filesystem::resize_file(path, size - 4); // sparse
+    std::ofstream(path, std::ios::app | std::ios::binary) << std::string("\1\0\2\0", 4);
+
+    DecodedFile file(path);
+    ASSERT_EQ(file.info.frames, length / 4);
+    file.decoder->seek(length / 4 - 2);
+    const PcmBuffer buffer = file.read(10);
+    ASSERT_EQ(buffer.frames, 2u);
+    EXPECT_EQ(std::memcmp(buffer.bytes.data(), "\0\0\0\0\1\0\2\0", 8), 0);
 }
 
 TEST_F(ExaminationTest, AFileThatCannotBeReadFailsWithItsReason) {
