@@ -22,7 +22,8 @@ std::string flacComments(ByteSource& source, std::int64_t at) {
             break;
         const auto size = bigEndian(std::string_view(header).substr(1));
         if ((header[0] & 0x7F) == comments)
-            return readPiece(source, at + 4, std::min<std::size_t>(size, longestBlock));
+            return readPiece(source, at + 4,
+                             static_cast<std::size_t>(std::min<std::uint64_t>(size, longestBlock)));
         if ((header[0] & 0x80) != 0) // the last one
             break;
         at += 4 + static_cast<std::int64_t>(size);
@@ -106,7 +107,7 @@ bool equalsIgnoringCase(std::string_view one, std::string_view other) {
 std::optional<std::string_view> takeText(std::string_view& rest) {
     if (rest.size() < 4)
         return std::nullopt;
-    const auto size = littleEndian(rest.substr(0, 4));
+    const auto size = static_cast<std::size_t>(littleEndian(rest.substr(0, 4)));
     rest.remove_prefix(4);
     if (size > rest.size())
         return std::nullopt;

@@ -117,8 +117,8 @@ void LinkLoop::wakeAt(std::optional<Time> time) {
     if (time) {
         const auto sinceStart = time->time_since_epoch();
         const auto seconds = std::chrono::duration_cast<std::chrono::seconds>(sinceStart);
-        setting.it_value.tv_sec = seconds.count();
-        setting.it_value.tv_nsec = std::chrono::nanoseconds(sinceStart - seconds).count();
+        setting.it_value.tv_sec = static_cast<time_t>(seconds.count());
+        setting.it_value.tv_nsec = static_cast<long>(std::chrono::nanoseconds(sinceStart - seconds).count());
     }
     ::timerfd_settime(timer_.get(), TFD_TIMER_ABSTIME, &setting, nullptr);
 }

@@ -15,7 +15,7 @@
 
 namespace tarn {
 
-/// An item of three minutes that remembers where it was moved to.
+/// An item of three minutes that remembers where it was moved to. Any thread may call.
 class FakeItem final : public MediaItem, public MediaAsset {
 public:
     RegistrationHandle observe(std::string_view, Block) override { return nullptr; }
@@ -23,18 +23,25 @@ public:
     std::optional<Error> error() const override { return std::nullopt; }
     const std::shared_ptr<MediaAsset>& asset() const override { return asset_; }
     MediaTime currentTime() const override { return MediaTime::zero(); }
-    void seekToTime(MediaTime time) override { movedTo_.push_back(time.seconds()); }
+    void seekToTime(MediaTime time) override {
+        const std::lock_guard lock(mutex_);
+        movedTo_.push_back(time.seconds());
+    }
 
     const std::string& URL() const override { return URL_; }
     const std::vector<MediaMetadataItem>& commonMetadata() const override { return tags_; }
     MediaTime duration() const override { return {180, 1}; }
 
-    const std::vector<double>& movedTo() const { return movedTo_; }
+    std::vector<double> movedTo() const {
+        const std::lock_guard lock(mutex_);
+        return movedTo_;
+    }
 
 private:
     const std::shared_ptr<MediaAsset> asset_{std::shared_ptr<MediaAsset>(), this};
     const std::string URL_;
     const std::vector<MediaMetadataItem> tags_;
+    mutable std::mutex mutex_;
     std::vector<double> movedTo_;
 };
 
