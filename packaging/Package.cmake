@@ -43,10 +43,10 @@ It plays audio files on behalf of other programs: without gaps, on behind a
 closed screen, pausing for calls, and shown in the media controls. It starts
 when the first program connects.")
 set(CPACK_DEBIAN_SERVICE_PACKAGE_SECTION sound)
-set(CPACK_DEBIAN_SERVICE_PACKAGE_RECOMMENDS "pulseaudio | pipewire-pulse, default-dbus-session-bus | dbus-session-bus")
+set(CPACK_DEBIAN_SERVICE_PACKAGE_RECOMMENDS "pipewire-pulse | pulseaudio, default-dbus-session-bus | dbus-session-bus")
 set(CPACK_DEBIAN_SERVICE_PACKAGE_SUGGESTS tarnctl)
 set(CPACK_DEBIAN_SERVICE_PACKAGE_CONTROL_EXTRA
-    "${CMAKE_CURRENT_SOURCE_DIR}/debian/postinst;${CMAKE_CURRENT_SOURCE_DIR}/debian/postrm")
+    "${CMAKE_CURRENT_SOURCE_DIR}/debian/postinst;${CMAKE_CURRENT_SOURCE_DIR}/debian/prerm;${CMAKE_CURRENT_SOURCE_DIR}/debian/postrm")
 
 set(CPACK_COMPONENT_TOOL_DESCRIPTION "plays audio files through tarnd from a terminal
 It plays files with keys for pause, next, seek and rate, tells what the service
