@@ -1,5 +1,6 @@
 #include "client/libtarn/Link.h"
 
+#include <poll.h>
 #include <sys/socket.h>
 #include <unistd.h>
 
@@ -21,6 +22,7 @@ using client::Outcome;
 using Displacement = client::Connection::Displacement;
 
 constexpr std::size_t mostSentAhead = 1'048'576;
+constexpr int millisecondsForTheServiceToSee = 1'000;
 
 Answer answerOf(const Frame& frame) {
     if (frame.kind == FrameKind::released)
@@ -77,6 +79,8 @@ void Link::stop() {
 
 void Link::connect(Patience patience) {
     const auto held = loop_.hold();
+    if (std::exchange(wasTakenOver_, false) && isConnected())
+        takeOver(patience);
     end(false);
     auto socket = connected(address_, path_, patience);
     loop_.watch(socket.get());
@@ -92,6 +96,16 @@ void Link::connect(Patience patience) {
     if (handlers_.onDisplaced)
         call(Data(askForNews.begin(), askForNews.end()),
              [this](const Answer& answer) { tellsNews_ = answer.outcome == Outcome::answered; });
+}
+
+/// A connection that lasts until the service has seen it.
+void Link::takeOver(Patience patience) {
+    const auto socket = connected(address_, path_, patience);
+    Outgoing question;
+    question.append(FrameKind::call, 1, askForNews);
+    question.flush(socket.get());
+    pollfd answer{socket.get(), POLLIN, 0};
+    ::poll(&answer, 1, millisecondsForTheServiceToSee);
 }
 
 void Link::disconnect() {
@@ -205,6 +219,7 @@ void Link::deliver(const Frame& frame) {
 }
 
 void Link::tellDisplaced(Displacement reason) {
+    wasTakenOver_ = reason == Displacement::takenOver;
     if (handlers_.onDisplaced)
         shielded([&] { handlers_.onDisplaced(reason); });
 }

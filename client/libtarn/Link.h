@@ -48,6 +48,9 @@ public:
     void stop();
 
     /// disconnect(), and connects anew. Throws std::system_error; then there is no connection.
+    ///
+    /// The end of a connection that was taken over makes the service forget its current client, which might
+    /// then come back at once. So that one is taken over first.
     void connect(Patience patience);
 
     /// Pending calls end as `connectionLost`. When this returns no handler runs any more, unless it is one
@@ -83,6 +86,7 @@ private:
     void read();
     void deliver(const Frame& frame);
     void tellDisplaced(client::Connection::Displacement reason);
+    void takeOver(Patience patience);
     void end(bool tell);
     void flush();
 
@@ -96,6 +100,7 @@ private:
     Receiver receiver_;
     std::optional<FrameReader> reader_;
     std::uint64_t connectionCount_ = 0;
+    bool wasTakenOver_ = false;
 
     mutable std::mutex mutex_; // guards what follows up to the next blank line; taken after the loop
     UnsharedDescriptor socket_;

@@ -303,15 +303,15 @@ void Session::reconnect() {
         state_ = State::lost;
         setTimer();
     }
-    link_->disconnect();
-    if (!survives())
-        endCalls(Outcome::connectionLost, [](const Call&) { return true; });
+    const auto endAllCalls = [this] { endCalls(Outcome::connectionLost, [](const Call&) { return true; }); };
     try {
         link_->connect(Link::Patience::waits);
     } catch (...) {
-        endCalls(Outcome::connectionLost, [](const Call&) { return true; });
+        endAllCalls();
         throw;
     }
+    if (!survives())
+        endAllCalls();
     {
         const std::lock_guard lock(mutex_);
         state_ = State::connected;

@@ -50,6 +50,15 @@ protected:
     }
     std::vector<std::string> linesUpTo(const std::string& last) { return linesUpTo(last, client); }
 
+    /// The same without what is told of items that can be played: that comes when it comes.
+    std::vector<std::string> changesUpTo(const std::string& last, Client& of) {
+        auto lines = linesUpTo(last, of);
+        std::erase_if(lines, [](const auto& line) {
+            return line.ends_with("not opened yet") || line.ends_with("ready to play");
+        });
+        return lines;
+    }
+
     double position(const std::string& item) { return client.currentTime(item).get().value; }
 
     void waitFor(const std::string& item, double seconds) {
@@ -133,6 +142,75 @@ TEST_F(Reconnecting, KeepsTheQueueAsItWasEditedAndObjectsThatLostTheirNames) {
     EXPECT_EQ(client.currentTime("d").get().error.code, 26);
     EXPECT_EQ(client.appendItem(player, "c").get().outcome, Outcome::released);
     EXPECT_THAT(nextItems(3, player + ": now c"), ElementsAre("now nothing", "now nothing", "now c"));
+}
+
+TEST_F(Reconnecting, WaitsForAServiceWhoseSocketIsHeldForIt) {
+    mirror({"a"});
+    service.kill();
+    service.holdSocket();
+    linesUpTo("reconnecting");
+    const auto next = client.upsertItem("b", "a");
+    service.start();
+    EXPECT_THAT(linesUpTo("reconnected"), ElementsAre("reconnected"));
+    EXPECT_EQ(position("a"), 0);
+}
+
+TEST_F(Reconnecting, FailsTheItemsWhoseFilesAreGoneButNotThoseThatWereGranted) {
+    const auto granted = file("a");
+    const auto path = (service.folder() / "a.wav").string();
+    const auto token = client.grantFile(path);
+    client.upsertAsset({.identifier = "a", .URL = granted.URL, .sandboxExtensionToken = token}).get();
+    client.upsertItem("a", "a").get();
+    mirror({"b", "c"});
+    client.upsertQueuePlayer(player, {"a", "b", "c"}).get();
+    std::filesystem::remove(path);
+    std::filesystem::remove(service.folder() / "b.wav");
+    service.kill();
+    service.start();
+    linesUpTo("reconnected");
+    EXPECT_THAT(changesUpTo("b: failed to play to its end", client),
+                ElementsAre(testing::StartsWith("b: failed: "), "b: failed to play to its end"));
+    EXPECT_EQ(client.currentTime("b").get().error.code, 26);
+    EXPECT_EQ(client.currentTime("a").get().outcome, Outcome::answered);
+    EXPECT_THAT(nextItems(2), ElementsAre("now c", "now nothing"));
+}
+
+TEST_F(Reconnecting, DoesNotFightForItsPlaceAndTakesItWhenAskedTo) {
+    mirror({"a"});
+    client.setRate(player, 1).get();
+    auto other = std::make_unique<Client>(service.options());
+    linesUpTo("taken over");
+    EXPECT_EQ(client.nextEvent(), std::nullopt);
+    EXPECT_EQ(client.setRate(player, 0).get().outcome, Outcome::takenOver);
+    EXPECT_TRUE(isServed(*other, service.song()));
+    client.reconnect();
+    EXPECT_THAT(linesUpTo("reconnected"), ElementsAre("reconnected"));
+    EXPECT_THAT(changesUpTo("taken over", *other), ElementsAre("taken over"));
+    // The service forgets everybody when one that was replaced leaves. Nobody else wants the place.
+    other.reset();
+    EXPECT_THAT(changesUpTo("reconnected", client), ElementsAre("reconnecting", "reconnected"));
+    waitFor("a", position("a") + 0.1);
+
+    auto third = std::make_unique<Client>(service.options());
+    Client fourth(service.options());
+    EXPECT_TRUE(isServed(fourth, service.song()));
+    third.reset();
+    EXPECT_THAT(changesUpTo("connection lost", fourth), ElementsAre("connection lost"));
+}
+
+TEST_F(Reconnecting, GivesUpAtItsLimitAndKeepsItAllForALaterTry) {
+    Client impatient({.socketPath = service.socketPath(), .reconnectLimit = 100ms});
+    impatient.upsertAsset(file("a")).get();
+    impatient.upsertItem("a", "a").get();
+    service.kill();
+    EXPECT_THAT(changesUpTo("connection lost", impatient), ElementsAre("reconnecting", "connection lost"));
+    EXPECT_EQ(impatient.currentTime("a").get().outcome, Outcome::connectionLost);
+    EXPECT_EQ(impatient.nextEvent(), std::nullopt);
+    EXPECT_THROW(impatient.reconnect(), std::system_error);
+    service.start();
+    impatient.reconnect();
+    EXPECT_EQ(impatient.currentTime("a").get().outcome, Outcome::answered);
+    EXPECT_THAT(changesUpTo("reconnected", impatient), ElementsAre("reconnected"));
 }
 
 } // namespace

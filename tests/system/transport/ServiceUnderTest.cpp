@@ -25,17 +25,26 @@ void ServiceUnderTest::start() {
     const std::string folder = folder_.path();
     // Of two settings of one name the first one counts.
     std::vector<std::string> environment = {"XDG_RUNTIME_DIR=" + folder, "NOTIFY_SOCKET=" + readyPath,
-                                            "JOURNAL_STREAM="};
+                                            "JOURNAL_STREAM=", "LISTEN_FDS=1", "LISTEN_FDNAMES=ostrel.tarnd"};
     environment.insert(environment.end(), environment_.begin(), environment_.end());
     environment.insert(environment.end(),
                        {"HOME=" + folder, "XDG_DATA_HOME=" + folder, "XDG_DATA_DIRS=" + folder, "LANG=C",
                         "TARND_SOUND=none", "DBUS_SESSION_BUS_ADDRESS=unix:path=/nowhere",
                         "DBUS_SYSTEM_BUS_ADDRESS=unix:path=/nowhere"});
-    process_ = std::make_unique<ChildProcess>(std::vector<std::string>{TARND}, environment,
-                                              ChildProcess::ErrorOutput::withOutput);
+    const auto handOver = "exec 3<&" + std::to_string(heldSocket_.get()) + "; LISTEN_PID=$$ exec " TARND;
+    const auto command =
+        heldSocket_ ? std::vector<std::string>{"sh", "-c", handOver} : std::vector<std::string>{TARND};
+    process_ = std::make_unique<ChildProcess>(command, environment, ChildProcess::ErrorOutput::withOutput);
     pollfd wait{ready.get(), POLLIN, 0};
     ASSERT_EQ(::poll(&wait, 1, deadlineMilliseconds), 1) << "the service does not get ready";
     std::filesystem::remove(readyPath);
+}
+
+void ServiceUnderTest::holdSocket() {
+    std::filesystem::remove(socketPath());
+    heldSocket_.reset(::socket(AF_UNIX, SOCK_STREAM, 0)); // kept across exec
+    ASSERT_TRUE(SocketAddress(socketPath()).bind(heldSocket_.get()));
+    ASSERT_EQ(::listen(heldSocket_.get(), 1), 0);
 }
 
 int ServiceUnderTest::stop(int signal) {

@@ -25,6 +25,9 @@ public:
     /// Starts it, after stop() or kill() again, and waits until it is ready.
     void start();
 
+    /// While it does not run: from now on the socket is held here, and handed to it when it starts.
+    void holdSocket();
+
     /// Asks for its end; its exit status.
     int stop(int signal = SIGTERM);
     void kill();
@@ -50,6 +53,7 @@ private:
 
     const std::vector<std::string> environment_;
     TemporaryFolder folder_;
+    FileDescriptor heldSocket_;
     std::unique_ptr<ChildProcess> process_;
 };
 
