@@ -31,9 +31,10 @@ void ServiceUnderTest::start() {
                        {"HOME=" + folder, "XDG_DATA_HOME=" + folder, "XDG_DATA_DIRS=" + folder, "LANG=C",
                         "TARND_SOUND=none", "DBUS_SESSION_BUS_ADDRESS=unix:path=/nowhere",
                         "DBUS_SYSTEM_BUS_ADDRESS=unix:path=/nowhere"});
+    // bash, since the descriptor may have two digits.
     const auto handOver = "exec 3<&" + std::to_string(heldSocket_.get()) + "; LISTEN_PID=$$ exec " TARND;
     const auto command =
-        heldSocket_ ? std::vector<std::string>{"sh", "-c", handOver} : std::vector<std::string>{TARND};
+        heldSocket_ ? std::vector<std::string>{"bash", "-c", handOver} : std::vector<std::string>{TARND};
     process_ = std::make_unique<ChildProcess>(command, environment, ChildProcess::ErrorOutput::withOutput);
     pollfd wait{ready.get(), POLLIN, 0};
     ASSERT_EQ(::poll(&wait, 1, deadlineMilliseconds), 1) << "the service does not get ready";
