@@ -15,8 +15,9 @@ std::optional<Error> SimulatedAudioSession::setCategory(Category category, Mode 
     return categoryError_;
 }
 
-void SimulatedAudioSession::activateWithOptions(std::uint64_t, ActivationCompletion completion) {
+void SimulatedAudioSession::activateWithOptions(std::uint64_t options, ActivationCompletion completion) {
     ++activationRequests_;
+    activationOptions_ = options;
     Activation activation;
     if (!activations_.empty()) {
         activation = std::move(activations_.front());

@@ -45,6 +45,7 @@ public:
 
     // What happened.
     std::size_t activationRequests() const { return activationRequests_; }
+    std::uint64_t activationOptions() const { return activationOptions_; } ///< of the last request
 
     struct CategorySetting {
         Category category;
@@ -69,6 +70,7 @@ private:
     std::deque<Activation> activations_;
     std::optional<Error> categoryError_;
     std::size_t activationRequests_ = 0;
+    std::uint64_t activationOptions_ = 0;
     std::vector<CategorySetting> categorySettings_;
     std::vector<ActivationCompletion> neverCompleted_;
     std::map<std::size_t, RegistrationHandle> timers_; // by request

@@ -40,6 +40,7 @@ TEST_F(ActivationTest, AnyOtherRateIsAppliedExactlyOnceTheSessionIsActive) {
     for (float rate : {1.0F, 2.0F, -1.0F, 1.1920929e-07F, 0.333F}) {
         tell(setRate("player", rate));
         EXPECT_EQ(this->rate(), rate);
+        EXPECT_EQ(device.audioSession.activationOptions(), 0u);
     }
     tell(removeAllItems("player"));
     tell(setRate("player", 3));

@@ -43,9 +43,11 @@ TEST_F(InterruptionTest, StaysPausedAfterOneThatDoesNotSayExactlyThat) {
     EXPECT_EQ(ended(3), "");
     EXPECT_EQ(ended(std::nullopt), "");
 
-    // Nor after a notification without a type, or of a type that is not known.
+    // Nor after a notification without a type, of a type that is not known, or of a begin.
     for (const Notification& odd :
          {notification({{AudioSession::interruptionOptionsKey, 1}}),
+          notification({{AudioSession::interruptionTypeKey, AudioSession::interruptionBegan},
+                        {AudioSession::interruptionOptionsKey, 1}}),
           notification({{AudioSession::interruptionTypeKey, 7}, {AudioSession::interruptionOptionsKey, 1}})})
         device.notifications.post(odd);
     EXPECT_EQ(now(), "");

@@ -39,6 +39,7 @@ protected:
 TEST_F(NowPlayingTest, IsPublishedTwiceWhenAPlayerIsMadeAndAtEveryChangeOfRateOrItem) {
     tell(upsertPlayer("x,y,ostrel.watch.music", {"i"}));
     EXPECT_EQ(publications(), 2u);
+    EXPECT_EQ(device.nowPlaying.publications().front().parentApplication, "ostrel.music");
     NowPlayingInfo expected = info("Song", 200, 0, 0);
     expected.artist = "Band";
     expected.albumTitle = "Album";

@@ -66,6 +66,44 @@ TEST_F(QueueStoriesTest, TheWholeOfATypicalClient) {
     EXPECT_THAT(errors(), IsEmpty());
 }
 
+/// Looks, at the answer, whether the object can be found: its client may ask for it at once.
+class FoundAtAnswer final : public Reply::Call {
+public:
+    FoundAtAnswer(MirroredClient& client, std::vector<bool>& found) : client_(client), found_(found) {}
+    void answer(std::optional<Data>, const std::optional<Error>&) override {
+        const auto& [assets, items, players] = std::tie(client_.assets, client_.items, client_.players);
+        found_ = {assets->assetWithIdentifier("x") != nullptr,
+                  items->playerItemWithIdentifier("x") != nullptr,
+                  players->queuePlayerWithIdentifier("x") != nullptr};
+    }
+
+private:
+    MirroredClient& client_;
+    std::vector<bool>& found_;
+};
+
+TEST_F(QueueStoriesTest, WhatIsMadeIsThereWhenTheClientHearsOfIt) {
+    std::vector<bool> found;
+    std::vector<bool> expected(3);
+    auto made = expected.begin();
+    device.media.addFile("file:///x", {.duration = 1s});
+    for (const auto& command : {upsertAsset({.identifier = "x", .URL = "file:///x"}), upsertItem("x", "x"),
+                                upsertPlayer("x", {"x"})}) {
+        *made++ = true;
+        client->send(command, Reply(std::make_shared<FoundAtAnswer>(*client, found)));
+        now();
+        EXPECT_EQ(found, expected);
+    }
+}
+
+TEST_F(QueueStoriesTest, AnAppendedItemIsPlayedLast) {
+    mirror({"a", "b", "c"});
+    tell(upsertPlayer("player", {"a", "b"}));
+    tell(appendItem("player", "c"));
+    for (const char* next : {"b", "c"})
+        EXPECT_THAT(tell(advanceToNextItem("player")), HasSubstr(std::string("containedIdentifier=") + next));
+}
+
 TEST_F(QueueStoriesTest, APlayerKeepsTheManagersThatItWasMadeWith) {
     mirror({"a", "b"});
     auto items = client->players->playerItemManager();

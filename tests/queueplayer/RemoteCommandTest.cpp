@@ -54,6 +54,10 @@ TEST_F(RemoteCommandTest, FailWhereThereIsNothingToPauseOrTheSessionFails) {
         device.audioSession.willActivate({.error = Error{"test", 1, {}}});
     EXPECT_EQ(press(Kind::play), Result::commandFailed);
     EXPECT_EQ(press(Kind::togglePlayPause), Result::commandFailed);
+    device.audioSession.willActivate({.after = 20s});
+    EXPECT_EQ(press(Kind::play), std::nullopt);
+    pass(17s);
+    EXPECT_EQ(device.remoteCommands.results().back(), Result::commandFailed);
 }
 
 TEST_F(RemoteCommandTest, NextTrackHasNoContentAtTheEndOfTheQueue) {

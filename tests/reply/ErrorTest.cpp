@@ -30,7 +30,12 @@ TEST(AnError, KeepsItsCodeAndIsDescribedByItsKey) {
               (Error{"ostrel.pellion.errors",
                      25,
                      {{"LocalizedDescription", "VLErrorAudioPLaybackConnectionLostMessage"}}}));
-    EXPECT_EQ(description(localization, 17), "Profile install  error.");
+    for (const auto& [code, text] :
+         {std::pair(0, "VLErrorNoErrorMessage"), std::pair(16, "No first unlock yet."),
+          std::pair(17, "Profile install  error."), std::pair(18, "Profile removal  error."),
+          std::pair(24, "VLErrorAudioPlaybackErrorMessage"),
+          std::pair(27, "VLErrorBuildAndRunNotificationFailedNoPermissionMessage")})
+        EXPECT_EQ(description(localization, code), text);
     using Limits = std::numeric_limits<std::int64_t>;
     for (const std::int64_t unknown :
          std::initializer_list<std::int64_t>{1, 11, 26, 28, -1, Limits::min(), Limits::max()}) {

@@ -67,10 +67,13 @@ using Notes = std::vector<std::string>;
 /// Writes down what is done with it, and whether it was the current connection by then.
 class NotedConnection final : public ServiceConnection, public VLLongFormAudioClientProtocol {
 public:
-    NotedConnection(Notes& notes, VLLongFormAudioServer& service, const WatchedQueues& queues)
-        : notes_(notes), service_(service), queues_(queues) {}
+    NotedConnection(Notes& notes, VLLongFormAudioServer& service, const WatchedQueues& queues,
+                    const SimulatedNowPlayingService& nowPlaying)
+        : notes_(notes), service_(service), queues_(queues), nowPlaying_(nowPlaying) {}
     ~NotedConnection() override {
         notes_.push_back(queues_.isAnyCurrent() ? "destroyed on a queue" : "destroyed");
+        if (nowPlaying_.parentApplication())
+            notes_.back() += " while now playing has an application";
     }
 
     void setExportedObject(std::shared_ptr<VLLongFormAudioServerProtocol>) override { note("object"); }
@@ -88,6 +91,7 @@ private:
     Notes& notes_;
     VLLongFormAudioServer& service_;
     const WatchedQueues& queues_;
+    const SimulatedNowPlayingService& nowPlaying_;
 };
 
 class NoListener final : public ServiceListener {
@@ -107,7 +111,7 @@ protected:
     }
 
     std::shared_ptr<ServiceConnection> makeConnection(Notes& notes) {
-        return std::make_shared<NotedConnection>(notes, *service_, queues_);
+        return std::make_shared<NotedConnection>(notes, *service_, queues_, device_.nowPlaying);
     }
 
     Notes first_; // the service may hold a connection to the end
@@ -130,8 +134,10 @@ TEST_F(ConnectionTest, GoesOnNoQueueWhenItIsReplacedOrLost) {
     service_->_replaceCurrentConnectionWithConnection(makeConnection(first_));
     service_->_replaceCurrentConnectionWithConnection(makeConnection(second_));
     EXPECT_THAT(first_, ElementsAre("destroyed"));
+    device_.nowPlaying.setParentApplication(device_.nowPlaying.localOrigin(), "ostrel.music");
     service_->_connectionWasInvalidated();
-    EXPECT_THAT(second_, ElementsAre("destroyed"));
+    EXPECT_THAT(second_, ElementsAre("destroyed while now playing has an application"));
+    EXPECT_EQ(device_.nowPlaying.parentApplication(), std::nullopt);
 }
 
 // Validity and connection are one question: asked one after the other, the connection may be gone by the

@@ -64,14 +64,17 @@ TEST_F(RouterTest, AManagerMadeAfterTheServiceIsGoneHasNone) {
 }
 
 TEST_F(RouterTest, OnlyTheFirstPartOfAMessageIsServed) {
-    CapturedLog log;
-    auto message = std::make_shared<VLProtoAudioFilePlayerMessage>(); // all three parts
-    for (const auto& part : {commands::upsertAsset({.identifier = "a", .URL = "file:///none"}),
-                             commands::getCurrentTime("a"), commands::appendItem("a", "a")})
-        message->mergeFrom(*part);
-    router_->handleMessage(message, Reply());
-    platform_.scheduler.runReady();
-    EXPECT_THAT(log.errors(), testing::ElementsAre(testing::HasSubstr("QueuePlayerManager")));
+    const auto asset = commands::upsertAsset({.identifier = "a", .URL = "file:///none"});
+    for (const auto& [part, server] : {std::pair(commands::appendItem("a", "a"), "QueuePlayerManager"),
+                                       std::pair(commands::getCurrentTime("a"), "PlayerItemManager")}) {
+        CapturedLog log;
+        const auto message = std::make_shared<VLProtoAudioFilePlayerMessage>();
+        for (const auto& each : {asset, commands::getCurrentTime("a"), part})
+            message->mergeFrom(*each);
+        router_->handleMessage(message, Reply());
+        platform_.scheduler.runReady();
+        EXPECT_THAT(log.errors(), testing::ElementsAre(testing::HasSubstr(server)));
+    }
 }
 
 TEST_F(RouterTest, AMessageWithoutAWayToAnswerIsServed) {

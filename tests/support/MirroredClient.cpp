@@ -31,15 +31,16 @@ MirroredClient::MirroredClient(const Platform& platform)
       items(router_->playerItemManagerCreateIfNeeded()),
       players(router_->queuePlayerManagerCreateIfNeeded()) {}
 
-void MirroredClient::send(const commands::Command& command) {
-    std::string name = nameOf(*command);
-    Reply reply;
-    if (command->hasAsset())
-        reply = transcript_->reply<VLProtoAudioFilePlayerAssetUpdateMetaData>(name);
-    else if (command->hasPlayerItem() && command->playerItem()->hasGetCurrentTime())
-        reply = transcript_->reply<VLProtoAudioFilePlayerCurrentTime>(name);
-    else
-        reply = transcript_->reply<VLProtoAudioFilePlayerStatus>(name);
+Reply MirroredClient::replyTo(const VLProtoAudioFilePlayerMessage& command) {
+    std::string name = nameOf(command);
+    if (command.hasAsset())
+        return transcript_->reply<VLProtoAudioFilePlayerAssetUpdateMetaData>(name);
+    if (command.hasPlayerItem() && command.playerItem()->hasGetCurrentTime())
+        return transcript_->reply<VLProtoAudioFilePlayerCurrentTime>(name);
+    return transcript_->reply<VLProtoAudioFilePlayerStatus>(name);
+}
+
+void MirroredClient::send(const commands::Command& command, Reply reply) {
     router_->handleMessage(command, std::move(reply));
 }
 

@@ -20,7 +20,8 @@ public:
     explicit MirroredClient(const Platform& platform);
 
     /// Hands the command to its manager's queue; its answer begins with the name of the command.
-    void send(const commands::Command& command);
+    void send(const commands::Command& command) { send(command, replyTo(*command)); }
+    void send(const commands::Command& command, Reply reply);
 
     Transcript& transcript() { return *transcript_; }
 
@@ -29,6 +30,8 @@ public:
     SerialQueue& itemQueue() { return *router_->playerItemManagerQueue(); }
 
 private:
+    Reply replyTo(const VLProtoAudioFilePlayerMessage& command);
+
     const std::shared_ptr<Transcript> transcript_ = std::make_shared<Transcript>();
     const std::shared_ptr<VLTorviAudioFilePlayerServer> router_;
 
