@@ -94,7 +94,7 @@ bool Porter::serve(ReceivedMessage& message) {
     } else {
         if (message.as<DropFile>())
             dropFiles(std::move(first));
-        if (message.as<ReopenFile>()) {
+        else if (message.as<ReopenFile>()) {
             const ParkedFile opened = openNamed(first.get());
             static_cast<void>(sendParked(second.get(), opened.file.get(), opened.error));
         }
