@@ -12,13 +12,13 @@
 #include "bench/controls/BusClient.h"
 #include "bench/controls/BusListener.h"
 #include "bench/controls/DeafBus.h"
-#include "bench/controls/FakePlayer.h"
-#include "bench/controls/PrivateBus.h"
 #include "controls/BusAddress.h"
 #include "controls/LinuxMediaControls.h"
 #include "controls/applications/DesktopApplicationRegistry.h"
+#include "tests/controls/FakePlayer.h"
 #include "tests/support/CapturedLog.h"
 #include "tests/support/TemporaryFolder.h"
+#include "tests/system/controls/PrivateBus.h"
 
 namespace tarn {
 namespace {
@@ -73,8 +73,8 @@ class Bench {
 public:
     int run() {
         publish(1, 1);
-        player_ = std::make_shared<FakePlayer>(controls_.remoteCommands());
-        listed_ = controls_.remoteCommands().addPlayer(player_);
+        player_ =
+            FakePlayer::make(controls_.remoteCommands(), {.rate = 1, .item = std::make_shared<FakeItem>()});
         if (!listener_.waitForPlayer())
             return fail("the player does not appear");
         compareReads("while it plays");
@@ -222,7 +222,6 @@ private:
     PrivateBus bus_;
     LinuxMediaControls controls_{[](const std::string&) { return std::nullopt; }, {bus_.address(), ""}};
     std::shared_ptr<FakePlayer> player_;
-    RegistrationHandle listed_;
     BusListener listener_{bus_.address()};
     BusClient client_{bus_.address()};
 };

@@ -10,12 +10,12 @@
 #include <tarn/Client.h>
 
 #include "bench/controls/BusListener.h"
-#include "bench/controls/PrivateBus.h"
 #include "bench/controls/RunningService.h"
 #include "bench/sound/Hearing.h"
 #include "bench/sound/PulseThread.h"
 #include "bench/support/ProcessUsage.h"
 #include "tests/support/AudioFixture.h"
+#include "tests/system/controls/PrivateBus.h"
 #include "tests/system/sound/SoundServerProcess.h"
 
 namespace tarn {
