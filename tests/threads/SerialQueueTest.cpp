@@ -216,8 +216,13 @@ TEST_P(OneThreadTest, AWorkerDoesNotLeaveAQueueThatSomebodyWaitsFor) {
     auto queue = queues_.create("test.queue");
     auto other = queues_.create("test.other");
     std::vector<std::string> order;
+    std::latch workerIsInside(1); // else whoever waits would go in instead
     std::latch somebodyWaits(1);
-    queue->async([&] { somebodyWaits.wait(); });
+    queue->async([&] {
+        workerIsInside.count_down();
+        somebodyWaits.wait();
+    });
+    workerIsInside.wait();
     for (int i = 0; i < 1'000; ++i)
         queue->async([] {});
     other->async([&] { order.push_back("other"); });
