@@ -199,7 +199,8 @@ TEST_F(Reconnecting, DoesNotFightForItsPlaceAndTakesItWhenAskedTo) {
 }
 
 TEST_F(Reconnecting, GivesUpAtItsLimitAndKeepsItAllForALaterTry) {
-    Client impatient({.socketPath = service.socketPath(), .reconnectLimit = 100ms});
+    // Long enough for a busy machine to put everything back.
+    Client impatient({.socketPath = service.socketPath(), .reconnectLimit = 2s});
     impatient.upsertAsset(file("a")).get();
     impatient.upsertItem("a", "a").get();
     service.kill();
