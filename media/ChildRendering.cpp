@@ -21,41 +21,46 @@ Error broken() { return mediaError(MediaErrorCode::damaged, "The file broke its 
 
 } // namespace
 
-ChildRendering::ChildRendering(EventLoopThread& loop, MediaProcess& process, MediaChild child,
-                               RingReader ring, std::optional<nanoseconds> length,
-                               std::function<void()> goesOn)
+ChildRendering::ChildRendering(EventLoopThread& loop, MediaProcess& process, Renderer renderer,
+                               std::optional<nanoseconds> length, std::function<void()> goesOn,
+                               std::function<std::optional<Renderer>()> another)
     : loop_(loop),
       process_(process),
-      child_(std::move(child)),
-      ring_(std::move(ring)),
+      child_(std::move(renderer.child)),
+      ring_(std::move(renderer.ring)),
       length_(length),
-      goesOn_(std::move(goesOn)) {
+      goesOn_(std::move(goesOn)),
+      another_(std::move(another)) {
     beginWait();
 }
 
 Opening ChildRendering::opening() const {
-    if (opened_) // what goes wrong later is told by a span
+    if (wasOpened_) // what goes wrong later is told by a span
         return {};
     return {.done = error_.has_value(), .error = error_};
 }
 
 void ChildRendering::seek(nanoseconds position, float rate, const PcmFormat& format) {
-    ++generation_;
     format_ = format;
-    backwards_ = rate < 0;
+    rate_ = rate;
     position_ = std::clamp(position, 0ns, length_.value_or(nanoseconds::max()));
     ended_ = false;
     waited_ = false;
     reason_.reset();
-    ring_.begin(generation_, format);
     if (opened_)
         endWait();
+    askToSeek();
+}
+
+/// What comes from here on begins at the position that was reached.
+void ChildRendering::askToSeek() {
+    ring_.begin(++generation_, format_);
     Seek request;
     request.generation = generation_;
     request.position = position_.count();
-    request.rate = std::bit_cast<std::uint32_t>(rate);
-    request.format = FormatRecord::of(format);
-    request.capacity = RingMemory::capacityFor(format);
+    request.rate = std::bit_cast<std::uint32_t>(rate_);
+    request.format = FormatRecord::of(format_);
+    request.capacity = RingMemory::capacityFor(format_);
     if (child_ && child_->channel().send(request) != Channel::Result::done)
         gone_ = true;
 }
@@ -67,7 +72,7 @@ RenderedSpan ChildRendering::render(PcmBuffer& buffer, std::size_t maxFrames) {
         const RingReader::Taken taken = takeFromRing(buffer, maxFrames);
         if (taken.what == What::span)
             return spanOf(taken.span);
-        if (taken.what == What::lie || gone_)
+        if (taken.what == What::lie || (gone_ && !beginAnew()))
             fail(broken());
         else
             beginWait();
@@ -86,8 +91,10 @@ RingReader::Taken ChildRendering::takeFromRing(PcmBuffer& buffer, std::size_t ma
         ++wordsWanted_;
         taken = ring_.take(buffer, maxFrames); // it may have come meanwhile
     }
-    if (taken.what == What::span)
+    if (taken.what == What::span) {
+        anew_ = false;
         endWait();
+    }
     const bool hasRoom = taken.what == What::nothing || ring_.hasTakenHalf();
     if (hasRoom && child_ && child_->channel().send(Taken{}) == Channel::Result::gone)
         gone_ = true;
@@ -99,8 +106,8 @@ RenderedSpan ChildRendering::spanOf(const MediaSpan& span) {
     RenderedSpan rendered = emptySpan(RenderedSpan::State::more);
     rendered.frames = span.frames;
     const nanoseconds end(span.end);
-    position_ = backwards_ ? std::min(position_, end)
-                           : std::clamp(end, position_, std::max(position_, length_.value_or(end)));
+    position_ = rate_ < 0 ? std::min(position_, end)
+                          : std::clamp(end, position_, std::max(position_, length_.value_or(end)));
     rendered.end = position_;
     if (span.state == MediaSpan::State::ended) {
         ended_ = true;
@@ -120,6 +127,26 @@ RenderedSpan ChildRendering::emptySpan(RenderedSpan::State state) const {
     span.end = position_;
     span.state = state;
     return span;
+}
+
+/// False when the child has ended by itself, or there is no other.
+bool ChildRendering::beginAnew() {
+    if (!child_ || !child_->endedWithItsParent() || std::exchange(anew_, true))
+        return false;
+    auto next = another_();
+    if (!next)
+        return false;
+    endWait();
+    child_ = std::move(next->child);
+    ring_ = std::move(next->ring);
+    gone_ = false;
+    opened_ = false;
+    wordsWanted_ = 0;
+    wordsGiven_ = 0;
+    if (generation_ > 0)
+        askToSeek();
+    beginWait();
+    return true;
 }
 
 void ChildRendering::beginWait() {
@@ -162,8 +189,11 @@ bool ChildRendering::readMessages() {
         else if (result == Channel::Result::broken || !isTrue(message))
             fail(broken());
     }
-    if (gone_ && !opened_ && !error_)
-        fail(broken());
+    if (!gone_ || opened_ || error_)
+        return true;
+    if (beginAnew())
+        return false;
+    fail(broken());
     return true;
 }
 
@@ -182,6 +212,7 @@ bool ChildRendering::isTrue(const ReceivedMessage& message) {
         return false;
     process_.noteLocks(answer->locks);
     opened_ = answer->error.code == 0;
+    wasOpened_ = wasOpened_ || opened_;
     if (!opened_)
         fail(answer->error.toError());
     return true;

@@ -1,8 +1,10 @@
 #pragma once
 
+#include <variant>
+
+#include "media/ChildRendering.h"
 #include "media/FilePorter.h"
-#include "player/EventLoopThread.h"
-#include "player/Rendering.h"
+#include "media/LinuxMediaAsset.h"
 
 namespace tarn {
 
@@ -16,6 +18,9 @@ public:
     Outcome open(const std::shared_ptr<MediaAsset>& asset, std::function<void()> goesOn) override;
 
 private:
+    /// A renderer that was asked to open the file of `asset`.
+    std::variant<ChildRendering::Renderer, Error> begin(const std::shared_ptr<LinuxMediaAsset>& asset);
+
     EventLoopThread& loop_;
     MediaProcess& process_;
     FilePorter& porter_;

@@ -5,16 +5,24 @@
 namespace tarn {
 
 FileExaminer::Outcome FileExaminer::examine(const HeldFile& file, Channel::Deadline deadline) {
-    auto examiner = examiners_.take();
-    const FilePorter::Loan loan = porter_.lend(file);
-    ReceivedMessage message;
-    Channel::Result result = Channel::Result::gone;
-    if (examiner && loan.form != FileForm::none &&
-        examiner->channel().send(Examine{.form = loan.form}, std::span(&loan.descriptor, 1)) ==
-            Channel::Result::done)
-        result = examiner->channel().receiveUntil(deadline, message);
-    if (!examiner || loan.form == FileForm::none)
-        return {std::nullopt, mediaError(MediaErrorCode::noDecoder, "The audio decoder is not there.")};
+    for (int triesLeft = 2;;) {
+        auto examiner = examiners_.take();
+        const FilePorter::Loan loan = porter_.lend(file);
+        if (!examiner || loan.form == FileForm::none)
+            return {std::nullopt, mediaError(MediaErrorCode::noDecoder, "The audio decoder is not there.")};
+        ReceivedMessage message;
+        Channel::Result result =
+            examiner->channel().send(Examine{.form = loan.form}, std::span(&loan.descriptor, 1));
+        if (result == Channel::Result::done)
+            result = examiner->channel().receiveUntil(deadline, message);
+        const bool isLost = result == Channel::Result::gone && examiner->endedWithItsParent();
+        if (!isLost || --triesLeft == 0)
+            return outcomeOf(*std::move(examiner), result, message);
+    }
+}
+
+FileExaminer::Outcome FileExaminer::outcomeOf(MediaChild examiner, Channel::Result result,
+                                              const ReceivedMessage& message) {
     if (result == Channel::Result::notNow) {
         process_.renew();
         return {std::nullopt, mediaError(MediaErrorCode::timedOut, "The file did not answer in time.")};
@@ -25,7 +33,7 @@ FileExaminer::Outcome FileExaminer::examine(const HeldFile& file, Channel::Deadl
     if (result != Channel::Result::done || !answer || (!failed && (!info || !answer->tags.copyTo(*info))))
         return {std::nullopt, mediaError(MediaErrorCode::damaged, "The file broke its decoder.")};
     process_.noteLocks(answer->locks);
-    examiners_.put(*std::move(examiner), answer->idle == 1);
+    examiners_.put(std::move(examiner), answer->idle == 1);
     if (failed)
         return {std::nullopt, answer->error.toError()};
     return {std::move(info), {}};

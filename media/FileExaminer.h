@@ -27,6 +27,8 @@ public:
     void clear() { examiners_.clear(); }
 
 private:
+    Outcome outcomeOf(MediaChild examiner, Channel::Result result, const ReceivedMessage& message);
+
     MediaProcess& process_;
     FilePorter& porter_;
     ChildPool examiners_;

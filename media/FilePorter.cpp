@@ -23,11 +23,14 @@ FilePorter::Opened FilePorter::open(const std::string& path, Channel::Deadline d
     request.length = static_cast<std::uint32_t>(path.size());
     std::memcpy(request.path.data(), path.data(), path.size());
 
-    auto porter = porters_.take();
+    std::optional<MediaChild> porter;
     ReceivedMessage message;
     Channel::Result result = Channel::Result::gone;
-    if (porter && porter->channel().send(request) == Channel::Result::done)
-        result = porter->channel().receiveUntil(deadline, message, 1);
+    for (int tries = 0; tries < 2 && result == Channel::Result::gone; ++tries) { // its parent may have ended
+        porter = porters_.take();
+        if (porter && porter->channel().send(request) == Channel::Result::done)
+            result = porter->channel().receiveUntil(deadline, message, 1);
+    }
     if (result == Channel::Result::notNow) {
         process_.renew();
         return failed(MediaErrorCode::timedOut, "The file did not answer in time.");

@@ -30,6 +30,9 @@ public:
 
     const Channel& channel() const { return channel_; }
 
+    /// The parent has ended, and this child with it: that says nothing about what it was asked.
+    bool endedWithItsParent() const { return parent_->isGone(); }
+
 private:
     Channel channel_;
     std::shared_ptr<MediaParent> parent_; // null when moved away

@@ -1,5 +1,6 @@
 #include "media/MediaParent.h"
 
+#include <poll.h>
 #include <spawn.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -83,6 +84,12 @@ bool MediaParent::isGood() const {
         SystemLog::error(__func__, __LINE__, "%{public}s:%d: A process that decodes media ended by signal %d",
                          crash->signal);
     return result == Channel::Result::notNow;
+}
+
+// The kernel closes its socket before it ends the children, and before it drops those that were asked for.
+bool MediaParent::isGone() const {
+    pollfd end{.fd = control_.socket(), .events = 0, .revents = 0};
+    return ::poll(&end, 1, 0) == 1;
 }
 
 } // namespace tarn

@@ -18,7 +18,7 @@ std::optional<std::string> mediaProgram();
 /// The running program that touches media, from its start to its end. Its children end with it.
 ///
 /// It has the libraries loaded and forks a child when one is wanted; it holds no media file, so that nothing
-/// can keep it from ending. Any thread may call; isGood() one at a time.
+/// can keep it from ending. Any thread may call; isGood() is called by one at a time.
 class MediaParent {
 public:
     /// Null when it cannot be started; one error line says why.
@@ -38,6 +38,9 @@ public:
     /// False when it is gone, or a child of it has crashed: all share one layout of memory, which whoever
     /// made that one crash may have begun to learn.
     bool isGood() const;
+
+    /// True as soon as a child could have ended because of it.
+    bool isGone() const;
 
 private:
     const pid_t process_;

@@ -67,8 +67,13 @@ struct ChildRenderingTest : testing::Test, FilesOfTheService {
     /// Renders until the end, a failure, or `limit` frames, in uneven pieces.
     Rendered renderAll(nanoseconds position, float rate, const PcmFormat& format,
                        std::size_t limit = 1 << 30) {
-        Rendered all;
         onLoop([&] { rendering->seek(position, rate, format); });
+        Rendered all;
+        renderOn(all, limit);
+        return all;
+    }
+
+    void renderOn(Rendered& all, std::size_t limit = 1 << 30) {
         std::optional<nanoseconds> last;
         for (std::size_t piece = 1; all.buffer.frames < limit; piece = piece * 3 % 6'007 + 1) {
             RenderedSpan span;
@@ -83,7 +88,6 @@ struct ChildRenderingTest : testing::Test, FilesOfTheService {
             if (span.state == State::ended || span.state == State::failed)
                 break;
         }
-        return all;
     }
 
     TemporaryFolder folder;
@@ -166,6 +170,25 @@ TEST_F(ChildRenderingTest, LosesOneItemWithAProcess) {
     }
 }
 
+// Nothing that plays or is opened pays for the process that they were forked from.
+TEST_F(ChildRenderingTest, GoesOnWhereItWasWhenTheParentEnds) {
+    const Recording recording = makeSweep(500'000, 44100, 2);
+    writeWav(folder / "a.wav", recording);
+    for (const std::size_t before : {0, 10'000}) {
+        open(folder / "a.wav");
+        Rendered all = renderAll(0s, 1, sixteenBits, before);
+        for (const pid_t parent : childrenOf(::getpid(), "tarn-media"))
+            ::kill(parent, SIGSEGV);
+        renderOn(all);
+        EXPECT_EQ(all.state, State::ended);
+        EXPECT_TRUE(all.joined);
+        ASSERT_EQ(all.buffer.frames, 500'000u);
+        EXPECT_EQ(std::memcmp(all.buffer.bytes.data(), recording.samples.data(), all.buffer.bytes.size()), 0);
+        EXPECT_NE(openFile(folder / "a.wav"), nullptr);
+        onLoop([this] { rendering.reset(); });
+    }
+}
+
 TEST_F(ChildRenderingTest, BelievesNoMessageThatCannotBe) {
     const auto parent = MediaParent::start();
     ASSERT_NE(parent, nullptr);
@@ -194,12 +217,14 @@ TEST_F(ChildRenderingTest, BelievesNoMessageThatCannotBe) {
         auto ends = Channel::makePair();
         auto ring = RingMemory::create();
         ASSERT_TRUE(ends && ring);
+        lie(ends->second); // is all there before the first of it is read
         onLoop([&] {
             rendering = std::make_unique<ChildRendering>(
-                loop, process, MediaChild(std::move(ends->first), parent, 1), RingReader(std::move(*ring)),
-                std::nullopt, [this] { more.release(); });
+                loop, process,
+                ChildRendering::Renderer{MediaChild(std::move(ends->first), parent, 1),
+                                         RingReader(std::move(*ring))},
+                std::nullopt, [this] { more.release(); }, [] { return std::nullopt; });
         });
-        lie(ends->second);
         const Rendered all = renderAll(0s, 1, sixteenBits);
         ASSERT_EQ(all.state, State::failed) << &lie - lies;
         EXPECT_EQ(all.error->code, static_cast<std::int64_t>(MediaErrorCode::damaged)) << &lie - lies;
