@@ -4,6 +4,7 @@ set(package_service tarnd)
 set(package_tool tarnctl)
 set(package_library libtarn${soversion})
 set(package_development libtarn-dev)
+set(package_python python3-tarn)
 set(package_documentation tarn-doc)
 
 # The changes of the program, and those of its packages, which are made anew from every version.
@@ -19,7 +20,7 @@ add_custom_command(OUTPUT changelog.gz changelog.Debian.gz VERBATIM
     COMMAND gzip -9nc changelog.Debian > changelog.Debian.gz)
 add_custom_target(tarn_changelog ALL DEPENDS changelog.gz)
 
-set(CPACK_COMPONENTS_ALL service tool library development documentation)
+set(CPACK_COMPONENTS_ALL service tool library development python documentation)
 foreach(part IN LISTS CPACK_COMPONENTS_ALL)
     install(FILES copyright ${CMAKE_CURRENT_BINARY_DIR}/changelog.gz ${CMAKE_CURRENT_BINARY_DIR}/changelog.Debian.gz
         DESTINATION ${CMAKE_INSTALL_DATADIR}/doc/${package_${part}} COMPONENT ${part})
@@ -71,6 +72,14 @@ messages of the service as .proto files for other languages.")
 set(CPACK_DEBIAN_DEVELOPMENT_PACKAGE_SECTION libdevel)
 set(CPACK_DEBIAN_DEVELOPMENT_PACKAGE_DEPENDS "${package_library} (= ${package_version})")
 set(CPACK_DEBIAN_DEVELOPMENT_PACKAGE_SUGGESTS tarn-doc)
+
+set(CPACK_COMPONENT_PYTHON_DESCRIPTION "client library of the background audio service tarnd for Python
+Programs in Python play through the service with it, blocking or on asyncio.
+Their objects outlast a crash or an update of the service.")
+set(CPACK_DEBIAN_PYTHON_PACKAGE_SECTION python)
+set(CPACK_DEBIAN_PYTHON_PACKAGE_ARCHITECTURE all)
+set(CPACK_DEBIAN_PYTHON_PACKAGE_DEPENDS "python3 (>= 3.11)")
+set(CPACK_DEBIAN_PYTHON_PACKAGE_RECOMMENDS tarnd)
 
 set(CPACK_COMPONENT_DOCUMENTATION_DESCRIPTION "documentation of the background audio service tarnd
 The protocol, how to integrate the service, what the media controls see, what
