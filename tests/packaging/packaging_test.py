@@ -152,10 +152,11 @@ class TheInstalledPackages(unittest.TestCase):
 
     def test_are_split_as_debian_splits_them(self):
         library = next(name for name in self.packages if re.fullmatch(r"libtarn[0-9.]+", name))
-        self.assertEqual(set(self.packages), {"tarnd", "tarnctl", library, "libtarn-dev", "tarn-doc"})
+        self.assertEqual(set(self.packages), {"tarnd", "tarnctl", library, "libtarn-dev", "python3-tarn", "tarn-doc"})
         homes = {"bin/tarnd": "tarnd", "lib/systemd/user/tarnd.socket": "tarnd", "bin/tarnctl": "tarnctl",
                  f"{LIBRARIES}/libtarn.so." + library.removeprefix("libtarn"): library, f"{LIBRARIES}/libtarn.so": "libtarn-dev",
                  "include/tarn/Client.h": "libtarn-dev", "share/tarn/proto/velmo.proto": "libtarn-dev",
+                 "lib/python3/dist-packages/tarn/proto/velmo.proto": "python3-tarn",
                  "share/doc/tarn/protocol.md": "tarn-doc"}
         listed = {name: run("dpkg-deb", "--contents", package) for name, package in self.packages.items()}
         for file, home in homes.items():
@@ -244,6 +245,11 @@ class TheInstalledPackages(unittest.TestCase):
             self.assertIn(f"-I{self.prefix.resolve()}/include",
                           " ".join(self.resolved(flag) for flag in flags.split()))
             run("c++", "-std=c++20", SOURCE / "docs/examples/cpp/play.cpp", "-o", self.folder / "play", *flags.split())
+            run("cc", "-std=c99", "-Wall", "-Werror", "-pedantic", SOURCE / "docs/examples/c/play.c", "-o", self.folder / "play",
+                *flags.split(), f"-Wl,-rpath,{self.prefix / LIBRARIES}")
+            with self.service():
+                self.assertIn("0.25 s", run(self.folder / "play", self.song, env=self.environment()))
+                self.assertIn("FAILED", run("sh", "-c", f"{self.folder / 'play'} /none || echo FAILED", env=self.environment()))
 
     @staticmethod
     def resolved(flag):
