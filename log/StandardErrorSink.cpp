@@ -1,9 +1,11 @@
 #include "log/StandardErrorSink.h"
 
 #include <cerrno>
+#include <fcntl.h>
 #include <poll.h>
 #include <string>
 #include <sys/socket.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include "log/LogFormat.h"
@@ -20,23 +22,40 @@ bool hasRoomForALine(int descriptor) {
     return poll(&entry, 1, 0) == 1 && (entry.revents & POLLOUT) != 0;
 }
 
-/// The descriptor is shared with other programs, so it cannot be switched to non-blocking: a socket is asked
-/// per call, anything else is asked for room first.
-ssize_t writeWithoutWaiting(int descriptor, const std::string& line) {
-    const ssize_t sent = send(descriptor, line.data(), line.size(), MSG_DONTWAIT | MSG_NOSIGNAL);
-    if (sent >= 0 || errno != ENOTSOCK)
-        return sent;
-    return hasRoomForALine(descriptor) ? write(descriptor, line.data(), line.size()) : -1;
+FileDescriptor openedAnew(int descriptor) {
+    struct stat status {};
+    if (fstat(descriptor, &status) != 0 || (!S_ISFIFO(status.st_mode) && isatty(descriptor) != 1))
+        return {};
+    const std::string path = "/proc/self/fd/" + std::to_string(descriptor);
+    return FileDescriptor(open(path.c_str(), O_WRONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC));
 }
 
 } // namespace
 
 StandardErrorSink::StandardErrorSink(int descriptor)
-    : descriptor_(descriptor), isTerminal_(isatty(descriptor) == 1) {}
+    : descriptor_(descriptor), isTerminal_(isatty(descriptor) == 1), own_(openedAnew(descriptor)) {}
 
 bool StandardErrorSink::take(const LogRecord& record) {
+    if (!unfinished_.empty()) {
+        const ssize_t written = writeNow(unfinished_);
+        unfinished_.erase(0, written > 0 ? static_cast<std::size_t>(written) : 0);
+        if (!unfinished_.empty())
+            return false;
+    }
     const std::string line = isTerminal_ ? std::string(record.message) + '\n' : standardErrorLine(record);
-    return writeWithoutWaiting(descriptor_, line) == static_cast<ssize_t>(line.size());
+    const ssize_t written = writeNow(line);
+    if (written > 0)
+        unfinished_ = line.substr(static_cast<std::size_t>(written));
+    return written > 0;
+}
+
+ssize_t StandardErrorSink::writeNow(const std::string& text) const {
+    if (own_)
+        return ::write(own_.get(), text.data(), text.size());
+    const ssize_t sent = ::send(descriptor_, text.data(), text.size(), MSG_DONTWAIT | MSG_NOSIGNAL);
+    if (sent >= 0 || errno != ENOTSOCK)
+        return sent;
+    return hasRoomForALine(descriptor_) ? ::write(descriptor_, text.data(), text.size()) : -1;
 }
 
 } // namespace tarn

@@ -1,6 +1,9 @@
 #pragma once
 
+#include <string>
+
 #include "log/LossyLogSink.h"
+#include "system/FileDescriptor.h"
 
 namespace tarn {
 
@@ -13,9 +16,14 @@ public:
 
 private:
     bool take(const LogRecord& record) override;
+    ssize_t writeNow(const std::string& text) const;
 
     const int descriptor_;
     const bool isTerminal_;
+    /// The same pipe or terminal, opened anew: it never waits, and the programs that share `descriptor_` do
+    /// not notice. None of anything else.
+    const FileDescriptor own_;
+    std::string unfinished_; // a terminal may take a part of a line: the rest comes first when it takes more
 };
 
 } // namespace tarn

@@ -16,10 +16,6 @@ std::string format(std::string_view text, std::initializer_list<LogArgument> arg
     return formatLogMessage(method, 12, "%{public}s:%d: " + std::string(text), arguments).substr(19);
 }
 
-TEST(LogFormat, BeginsWithTheMethodAndTheLine) {
-    EXPECT_EQ(formatLogMessage(method, 12, "%{public}s:%d: ready", {}), "-[Player play]:12: ready");
-}
-
 TEST(LogFormat, HidesTextThatIsNotMarkedPublic) {
     EXPECT_EQ(format("a=%@ b=%s c=%{public}@ d=%{private}d e=%d", {"one", "two", "three", 4, 5}),
               "a=<private> b=<private> c=three d=<private> e=5");
@@ -78,20 +74,6 @@ TEST(Utf8, KnowsWellFormedCharacters) {
          {"\x80", "\xC0\xAF", "\xC1\xBF", "\xE0\x9F\xBF", "\xED\xA0\x80", "\xF0\x8F\xBF\xBF",
           "\xF4\x90\x80\x80", "\xF5\x80\x80\x80", "\xFF", "a\xC3", "\xE2\x82", "\xE2\x82\x28"})
         EXPECT_FALSE(isValidUtf8(bad)) << testing::PrintToString(bad);
-}
-
-TEST(CapturedLogTest, CatchesLinesInItsScopeOnly) {
-    CapturedLog outer;
-    {
-        const CapturedLog inner;
-        SystemLog::error(method, 1, "%{public}s:%d: inner %@", "hidden");
-        EXPECT_THAT(inner.errors(), ElementsAre("-[Player play]:1: inner <private>"));
-        EXPECT_EQ(inner.lines().front().method, method);
-    }
-    SystemLog::message(method, 2, "%{public}s:%d: outer");
-    EXPECT_THAT(outer.messages(), ElementsAre("-[Player play]:2: outer"));
-    EXPECT_THAT(outer.errors(), ElementsAre());
-    EXPECT_TRUE(outer.waitFor("outer"));
 }
 
 } // namespace
