@@ -19,6 +19,8 @@ namespace {
 constexpr char upsertMethod[] = "-[VLTorviAudioFilePlayerAssetManager upsertAssetWithIdentifer:URL:title:"
                                 "albumTitle:artist:sandboxExtensionToken:reply:]";
 
+std::size_t sizeOf(const std::optional<std::string>& text) { return text ? text->size() : 0; }
+
 bool isFilled(const std::optional<std::string>& text) { return text && !text->empty(); }
 
 /// The value of the file's first tag of that key; `otherwise` when it has no such tag.
@@ -74,8 +76,13 @@ void VLTorviAudioFilePlayerAssetManager::upsertAssetWithIdentifer(
     const std::optional<std::string>& artist, const std::optional<std::string>& sandboxExtensionToken,
     Reply reply) {
     Texts texts{title, albumTitle, artist};
+    auto charged = charge(ObjectAccount::ofAsset + 2 * identifier.size() + sizeOf(URL) + sizeOf(title) +
+                              sizeOf(albumTitle) + sizeOf(artist),
+                          "upsertWithMetaData", reply);
+    if (!charged)
+        return;
     if (!URL) {
-        _updateRecord(identifier, texts);
+        _updateRecord(identifier, texts, *std::move(charged));
         reply.nothing();
         return;
     }
@@ -87,7 +94,7 @@ void VLTorviAudioFilePlayerAssetManager::upsertAssetWithIdentifer(
     auto record = std::make_shared<VLTorviAudioFilePlayerAsset>();
     record->asset = asset;
     applyTexts(texts, *record);
-    identifierToObjectMap_.setObject(identifier, record);
+    identifierToObjectMap_.setObject(identifier, record, *std::move(charged));
 
     VLProtoAudioFilePlayerAssetUpdateMetaData answer;
     answer.setIdentifier(identifier);
@@ -148,13 +155,14 @@ VLTorviAudioFilePlayerAssetManager::_consumeToken(const std::optional<std::strin
     return std::nullopt;
 }
 
-void VLTorviAudioFilePlayerAssetManager::_updateRecord(const std::string& identifier, const Texts& texts) {
+void VLTorviAudioFilePlayerAssetManager::_updateRecord(const std::string& identifier, const Texts& texts,
+                                                       ObjectAccount::Charge charge) {
     auto current = identifierToObjectMap_.objectWithIdentifier(identifier);
     if (!current)
         return;
     auto updated = std::make_shared<VLTorviAudioFilePlayerAsset>(*current);
     applyTexts(texts, *updated);
-    identifierToObjectMap_.setObject(identifier, std::move(updated));
+    identifierToObjectMap_.setObject(identifier, std::move(updated), std::move(charge));
 }
 
 void VLTorviAudioFilePlayerAssetManager::completeFromFile(Texts& texts, const MediaAsset& asset,

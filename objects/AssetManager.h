@@ -55,7 +55,7 @@ private:
                                            Reply& reply);
     std::optional<std::int64_t> _consumeToken(const std::optional<std::string>& token,
                                               const std::string& URL);
-    void _updateRecord(const std::string& identifier, const Texts& texts);
+    void _updateRecord(const std::string& identifier, const Texts& texts, ObjectAccount::Charge charge);
 
     static void completeFromFile(Texts& texts, const MediaAsset& asset, const std::string& URL);
     static void applyTexts(const Texts& texts, VLTorviAudioFilePlayerAsset& record);

@@ -45,6 +45,19 @@ bool VLTorviAudioFilePlayerObjectManager::requireIdentifier(const std::optional<
     return given;
 }
 
+std::optional<ObjectAccount::Charge>
+VLTorviAudioFilePlayerObjectManager::charge(std::size_t bytes, std::string_view command, Reply& reply) const {
+    auto charge = account_->charge(bytes);
+    if (!charge) {
+        SystemLog::error(methodName("handleMessage:reply:"), __LINE__,
+                         "%{public}s:%d: `%{public}@` command refused: the client has made too many objects.",
+                         command);
+        reply.error(VLError::errorWithCode(platform_.localization, VLError::audioPlayback,
+                                           "The program has made too many objects."));
+    }
+    return charge;
+}
+
 std::string VLTorviAudioFilePlayerObjectManager::methodName(std::string_view selector) const {
     return std::string("-[").append(className_).append(" ").append(selector).append("]");
 }

@@ -4,7 +4,9 @@
 #include <optional>
 #include <string>
 #include <string_view>
+#include <utility>
 
+#include "objects/ObjectAccount.h"
 #include "reply/EventSink.h"
 #include "roles/Platform.h"
 #include "roles/Reply.h"
@@ -27,6 +29,9 @@ public:
     std::shared_ptr<EventSink> audioServer() const;
     void setAudioServer(std::weak_ptr<EventSink> audioServer);
 
+    /// Before the first command. Without it nothing is counted together with the objects of other managers.
+    void setAccount(std::shared_ptr<ObjectAccount> account) { account_ = std::move(account); }
+
 protected:
     /// `className` names the manager in the log; it is a literal.
     VLTorviAudioFilePlayerObjectManager(const Platform& platform, std::string_view className);
@@ -46,12 +51,18 @@ protected:
     [[nodiscard]] bool requireIdentifier(const std::optional<std::string>& identifier,
                                          std::string_view command, Reply& reply) const;
 
+    /// The charge for an object that takes so much. None, with one log line and error 24 as the answer, when
+    /// the client has made too many.
+    std::optional<ObjectAccount::Charge> charge(std::size_t bytes, std::string_view command,
+                                                Reply& reply) const;
+
 private:
     std::string methodName(std::string_view selector) const;
 
     const Platform platform_;
     const std::string_view className_;
     MutexProtected<std::weak_ptr<EventSink>> audioServer_;
+    std::shared_ptr<ObjectAccount> account_ = std::make_shared<ObjectAccount>();
     LiveObject<"object manager"> live_;
 };
 

@@ -7,6 +7,7 @@
 #include <unordered_map>
 #include <utility>
 
+#include "objects/ObjectAccount.h"
 #include "threads/MutexProtected.h"
 
 namespace tarn {
@@ -28,14 +29,14 @@ public:
             return nullptr;
         return maps_.withLocked([&](const Maps& maps) -> std::shared_ptr<Object> {
             auto found = maps.identifierToObjectMap.find(*identifier);
-            return found == maps.identifierToObjectMap.end() ? nullptr : found->second;
+            return found == maps.identifierToObjectMap.end() ? nullptr : found->second.object;
         });
     }
 
     std::shared_ptr<Object> objectForMediaObject(const void* mediaObject) const {
         return maps_.withLocked([&](const Maps& maps) -> std::shared_ptr<Object> {
             auto found = maps.entryOfMediaObject.find(mediaObject);
-            return found == maps.entryOfMediaObject.end() ? nullptr : found->second->second;
+            return found == maps.entryOfMediaObject.end() ? nullptr : found->second->second.object;
         });
     }
 
@@ -48,21 +49,24 @@ public:
         });
     }
 
-    /// Takes the place of the object that had the identifier, if there was one.
-    void setObject(const std::string& identifier, std::shared_ptr<Object> object) {
+    /// Takes the place of the object that had the identifier, if there was one. `charge` is given back when
+    /// the object is no longer here.
+    void setObject(const std::string& identifier, std::shared_ptr<Object> object,
+                   ObjectAccount::Charge charge = {}) {
+        Held held{std::move(object), std::move(charge)};
         maps_.withLocked([&](Maps& maps) {
             if (maps.closed)
                 return;
             auto& entry = *maps.identifierToObjectMap.try_emplace(identifier).first;
             maps.forgetMediaObjectOf(entry);
-            maps.entryOfMediaObject[object->mediaObject()] = &entry;
-            std::swap(entry.second, object);
+            maps.entryOfMediaObject[held.object->mediaObject()] = &entry;
+            std::swap(entry.second, held);
         });
     }
 
     /// An unknown identifier is ignored.
     void removeObject(const std::string& identifier) {
-        std::shared_ptr<Object> displaced;
+        Held displaced;
         maps_.withLocked([&](Maps& maps) {
             auto entry = maps.identifierToObjectMap.find(identifier);
             if (entry == maps.identifierToObjectMap.end())
@@ -83,7 +87,11 @@ public:
     }
 
 private:
-    using IdentifierToObjectMap = std::unordered_map<std::string, std::shared_ptr<Object>>;
+    struct Held {
+        std::shared_ptr<Object> object;
+        ObjectAccount::Charge charge;
+    };
+    using IdentifierToObjectMap = std::unordered_map<std::string, Held>;
     using Entry = typename IdentifierToObjectMap::value_type;
 
     struct Maps {
@@ -93,8 +101,8 @@ private:
         bool closed = false;
 
         void forgetMediaObjectOf(const Entry& entry) {
-            if (entry.second)
-                entryOfMediaObject.erase(entry.second->mediaObject());
+            if (entry.second.object)
+                entryOfMediaObject.erase(entry.second.object->mediaObject());
         }
     };
 

@@ -84,10 +84,14 @@ void VLTorviAudioFilePlayerItemManager::_serveSetItemCurrentTime(
 void VLTorviAudioFilePlayerItemManager::upsertItemWithIdentifier(const std::string& identifier,
                                                                  std::shared_ptr<MediaAsset> asset,
                                                                  Reply reply) {
+    auto charged = charge(ObjectAccount::ofItem + 2 * identifier.size(), "upsertWithAsset", reply);
+    if (!charged)
+        return;
     std::shared_ptr<MediaItem> playerItem = platform().media.makeItem(std::move(asset));
-    identifierToObjectMap_.setObject(
-        identifier, VLTorviAudioFilePlayerItem::initWithPlayerItem(platform().notifications, playerItem,
-                                                                   identifier, audioServer()));
+    identifierToObjectMap_.setObject(identifier,
+                                     VLTorviAudioFilePlayerItem::initWithPlayerItem(
+                                         platform().notifications, playerItem, identifier, audioServer()),
+                                     *std::move(charged));
     reply.data(
         VLProtoAudioFilePlayerStatus::statusMessageFromPlayerItem(*playerItem, std::nullopt)->serialize());
 }

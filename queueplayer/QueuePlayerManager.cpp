@@ -139,6 +139,11 @@ std::shared_ptr<MediaItem> VLTorviAudioFilePlayerQueuePlayerManager::playerItemW
 
 void VLTorviAudioFilePlayerQueuePlayerManager::upsertQueuePlayerWithIdentifier(
     const std::string& identifier, std::vector<std::shared_ptr<MediaItem>> playerItems, Reply reply) {
+    auto charged = charge(ObjectAccount::ofQueuePlayer + 2 * identifier.size() +
+                              ObjectAccount::ofQueuedItem * playerItems.size(),
+                          "upsertWithItems", reply);
+    if (!charged)
+        return;
     std::shared_ptr<MediaQueuePlayer> queuePlayer = platform().media.makeQueuePlayer(std::move(playerItems));
     queuePlayer->setAudioSession(platform().audioSession);
     setupAudioSession(*queuePlayer->audioSession());
@@ -150,7 +155,7 @@ void VLTorviAudioFilePlayerQueuePlayerManager::upsertQueuePlayerWithIdentifier(
             std::erase_if(players, [](const auto& made) { return made.expired(); });
         players.push_back(player);
     });
-    identifierToObjectMap_.setObject(identifier, std::move(player));
+    identifierToObjectMap_.setObject(identifier, std::move(player), *std::move(charged));
 
     // The answer names the current item, not the queue player.
     auto currentItem = queuePlayer->currentItem();

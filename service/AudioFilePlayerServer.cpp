@@ -11,6 +11,7 @@ namespace tarn {
 
 VLTorviAudioFilePlayerServer::VLTorviAudioFilePlayerServer(const Platform& platform)
     : platform_(platform),
+      account_(std::make_shared<ObjectAccount>()),
       assetManagerQueue_(platform.queues.create("ostrel.tarnd.assetManagerQueue")),
       playerItemManagerQueue_(platform.queues.create("ostrel.tarnd.playterItemManagerQueue")),
       queuePlayerManagerQueue_(platform.queues.create("ostrel.tarnd.queuePlayterManagerQueue")) {}
@@ -73,6 +74,7 @@ VLTorviAudioFilePlayerServer::createIfNeeded(std::shared_ptr<Manager> Managers::
         if (manager == nullptr) {
             manager = std::make_shared<Manager>(platform_);
             manager->setAudioServer(managers.audioServer);
+            manager->setAccount(account_);
             _updateManagerAssociations(managers);
         }
         return manager;

@@ -11,6 +11,7 @@
 
 namespace tarn {
 
+class ObjectAccount;
 class VLProtoAudioFilePlayerMessage;
 class VLTorviAudioFilePlayerAssetManager;
 class VLTorviAudioFilePlayerItemManager;
@@ -76,6 +77,7 @@ private:
     static void _updateManagerAssociations(Managers& managers);
 
     const Platform platform_;
+    const std::shared_ptr<ObjectAccount> account_; // of all managers
     MutexProtected<Managers> managers_;
     std::shared_ptr<SerialQueue> assetManagerQueue_; // never given work
     std::shared_ptr<SerialQueue> playerItemManagerQueue_;

@@ -133,13 +133,6 @@ TEST_F(QueueStoriesTest, SetsTheSessionUpForEveryPlayerAndGoesOnWhenThatFails) {
     EXPECT_THAT(errors(), ElementsAre("Could not set audio session category due to error: (test, code 7)."));
 }
 
-TEST_F(QueueStoriesTest, AnEmptyQueueHasNoCurrentItem) {
-    EXPECT_EQ(tell(upsertPlayer("player", {})), "push queuePlayer.setStatus identifier=player status=1\n"
-                                                "push queuePlayer.setRate identifier=player rate=0\n"
-                                                "push queuePlayer.setCurrentItem identifier=player\n"
-                                                "upsertWithItems: status=1\n");
-}
-
 TEST_F(QueueStoriesTest, AnUnknownItemMakesAndReplacesNothing) {
     mirror({"a"});
     auto before = player();
@@ -183,28 +176,6 @@ TEST_F(QueueStoriesTest, EditsTheQueueWhileItPlays) {
               "removeItem: no answer\n");
     EXPECT_EQ(tell(removeAllItems("player")), "push queuePlayer.setCurrentItem identifier=player\n"
                                               "removeAllItems: no answer\n");
-}
-
-TEST_F(QueueStoriesTest, AnEditWithAnUnknownItemIsAnsweredWhetherThePlayerIsKnownOrNot) {
-    mirror({"a"});
-    for (const char* name : {"player", "unknown"}) {
-        EXPECT_EQ(tell(appendItem(name, "x")), "appendItem: error 26\n");
-        EXPECT_EQ(tell(removeItem(name, "x")), "removeItem: error 26\n");
-        EXPECT_EQ(tell(replaceCurrentItem(name, "x")), "replaceCurrentItem: error 26\n");
-    }
-    EXPECT_EQ(errors().size(), 6u);
-}
-
-TEST_F(QueueStoriesTest, AnUnknownPlayerIsLeftAlone) {
-    mirror({"a"});
-    EXPECT_EQ(tell(setRate("unknown", 1)), "setRate: no answer\n");
-    EXPECT_EQ(tell(advanceToNextItem("unknown")), "advanceToNextItem: no answer\n");
-    EXPECT_EQ(tell(appendItem("unknown", "a")), "appendItem: no answer\n");
-    EXPECT_EQ(tell(removeItem("unknown", "a")), "removeItem: no answer\n");
-    EXPECT_EQ(tell(removeAllItems("unknown")), "removeAllItems: no answer\n");
-    EXPECT_EQ(tell(replaceCurrentItem("unknown", "a")), "replaceCurrentItem: no answer\n");
-    EXPECT_EQ(tell(destroyPlayer("unknown")), "destroy: no answer\n");
-    EXPECT_THAT(errors(), IsEmpty());
 }
 
 TEST_F(QueueStoriesTest, ReplacingThePlayerWhileItPlaysEndsItsSoundAndItsReports) {
@@ -274,14 +245,32 @@ TEST_F(QueueStoriesTest, OnlyTheFirstCommandOfAMessageIsServedInTheOrderOfTheTab
     }
 }
 
-TEST_F(QueueStoriesTest, WhatOnlyTheServiceSendsIsIgnored) {
-    auto message = std::make_shared<VLProtoAudioFileQueuePlayer>();
-    message->setSetStatus(std::make_shared<VLProtoAudioFilePlayerStatus>());
-    message->setSetCurrentItem(std::make_shared<VLProtoAudioFilePlayerUpdateContainedIdentifier>());
-    auto command = std::make_shared<VLProtoAudioFilePlayerMessage>();
-    command->setQueuePlayer(message);
-    EXPECT_EQ(tell(command), "setCurrentItem: no answer\n");
-    EXPECT_THAT(errors(), IsEmpty());
+TEST_F(QueueStoriesTest, AnEditWithAnUnknownItemIsAnsweredWhetherThePlayerIsKnownOrNot) {
+    mirror({"a"});
+    for (const char* name : {"player", "unknown"}) {
+        EXPECT_EQ(tell(appendItem(name, "x")), "appendItem: error 26\n");
+        EXPECT_EQ(tell(removeItem(name, "x")), "removeItem: error 26\n");
+        EXPECT_EQ(tell(replaceCurrentItem(name, "x")), "replaceCurrentItem: error 26\n");
+    }
+    EXPECT_EQ(errors().size(), 6u);
+}
+
+TEST_F(QueueStoriesTest, WhoMakesTooManyObjectsIsRefusedUntilOthersGo) {
+    mirror({"a"});
+    const auto make = [&](int number) {
+        const std::string name = std::to_string(number) + std::string(1'000'000, 'n');
+        return tell(number % 2 == 0 ? upsertItem(name, "a") : upsertPlayer(name, {"a"}));
+    };
+    int made = 0;
+    while (make(made).find("error 24") == std::string::npos)
+        ASSERT_LT(++made, 20);
+    EXPECT_EQ(made, 16) << "all kinds count together";
+    EXPECT_EQ(
+        tell(upsertAsset({.identifier = "b", .URL = "file:///a", .title = std::string(1'900'000, 't')})),
+        "upsertWithMetaData: error 24 because: The program has made too many objects.\n");
+    EXPECT_THAT(errors(), testing::Each(testing::HasSubstr("the client has made too many objects")));
+    tell(destroyItem("0" + std::string(1'000'000, 'n')));
+    EXPECT_EQ(make(0).find("error 24"), std::string::npos);
 }
 
 } // namespace

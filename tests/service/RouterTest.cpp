@@ -57,33 +57,6 @@ TEST_F(RouterTest, AManagerIsLinkedToOneThatIsMadeLater) {
     EXPECT_EQ(items->assetManager(), nullptr);
 }
 
-TEST_F(RouterTest, AManagerMadeAfterTheServiceIsGoneHasNone) {
-    router_->setAudioServer(std::make_shared<Service>());
-    EXPECT_EQ(router_->assetManagerCreateIfNeeded()->audioServer(), nullptr);
-    EXPECT_EQ(router_->audioServer(), nullptr);
-}
-
-TEST_F(RouterTest, OnlyTheFirstPartOfAMessageIsServed) {
-    const auto asset = commands::upsertAsset({.identifier = "a", .URL = "file:///none"});
-    for (const auto& [part, server] : {std::pair(commands::appendItem("a", "a"), "QueuePlayerManager"),
-                                       std::pair(commands::getCurrentTime("a"), "PlayerItemManager")}) {
-        CapturedLog log;
-        const auto message = std::make_shared<VLProtoAudioFilePlayerMessage>();
-        for (const auto& each : {asset, commands::getCurrentTime("a"), part})
-            message->mergeFrom(*each);
-        router_->handleMessage(message, Reply());
-        platform_.scheduler.runReady();
-        EXPECT_THAT(log.errors(), testing::ElementsAre(testing::HasSubstr(server)));
-    }
-}
-
-TEST_F(RouterTest, AMessageWithoutAWayToAnswerIsServed) {
-    CapturedLog log;
-    router_->handleMessage(commands::getCurrentTime("unknown"), {});
-    platform_.scheduler.runReady();
-    EXPECT_THAT(log.errors(), testing::ElementsAre(testing::HasSubstr("unknown")));
-}
-
 // The managers' slots are filled from two queues.
 TEST(RouterRaceTest, ManagersMadeAtTheSameTimeAreOneOfAKindAndLinked) {
     constexpr int rounds = 2'000;
@@ -115,6 +88,20 @@ TEST(RouterRaceTest, ManagersMadeAtTheSameTimeAreOneOfAKindAndLinked) {
         }
     });
     renew();
+}
+
+TEST_F(RouterTest, OnlyTheFirstPartOfAMessageIsServed) {
+    const auto asset = commands::upsertAsset({.identifier = "a", .URL = "file:///none"});
+    for (const auto& [part, server] : {std::pair(commands::appendItem("a", "a"), "QueuePlayerManager"),
+                                       std::pair(commands::getCurrentTime("a"), "PlayerItemManager")}) {
+        CapturedLog log;
+        const auto message = std::make_shared<VLProtoAudioFilePlayerMessage>();
+        for (const auto& each : {asset, commands::getCurrentTime("a"), part})
+            message->mergeFrom(*each);
+        router_->handleMessage(message, Reply());
+        platform_.scheduler.runReady();
+        EXPECT_THAT(log.errors(), testing::ElementsAre(testing::HasSubstr(server)));
+    }
 }
 
 } // namespace

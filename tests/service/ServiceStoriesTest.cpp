@@ -283,15 +283,19 @@ TYPED_TEST(ServiceStory, EventsGoToTheClientOfTheMomentInOrderOrNowhere) {
     });
 }
 
-/// Takes no work.
+/// Takes no work, and throws what it was given instead.
+template <class Exception>
 class FullQueue final : public SerialQueue {
 public:
-    void async(Work) override { throw std::runtime_error("the queue is full"); }
+    explicit FullQueue(Exception exception) : exception_(std::move(exception)) {}
+
+    void async(Work) override { throw exception_; }
     void sync(const std::function<void()>& work) override { work(); }
     bool isCurrent() const override { return false; }
     const std::string& label() const override { return label_; }
 
 private:
+    const Exception exception_;
     const std::string label_ = "full";
 };
 
@@ -302,7 +306,8 @@ TYPED_TEST(ServiceStory, AnExceptionWhileRoutingAnswersItsCommandOnly) {
         world.settle();
         auto& service = world.service();
         service.commandServiceQueue()->sync([&] {
-            service.audioFilePlayerServer()->setQueuePlayerManagerQueue(std::make_shared<FullQueue>());
+            service.audioFilePlayerServer()->setQueuePlayerManagerQueue(
+                std::make_shared<FullQueue<std::length_error>>(std::length_error("the queue is full")));
         });
         client.call(commands::encoded(commands::appendItem("unknown", "unknown")));
         client.send(commands::encoded(commands::appendItem("unknown", "unknown")));
@@ -315,6 +320,26 @@ TYPED_TEST(ServiceStory, AnExceptionWhileRoutingAnswersItsCommandOnly) {
             EXPECT_EQ(delivery.error->userInfo.at(localizedFailureReasonKey), "the queue is full");
         }
     });
+}
+
+// Half a change that goes on would be worse than a new start.
+TEST(ServiceDeathTest, AnExceptionOfAnotherKindEndsTheProcess) {
+    testing::GTEST_FLAG(death_test_style) = "threadsafe";
+    EXPECT_DEATH(
+        {
+            SimulatedWorld world(0);
+            SimulatedClient client(world.listeners());
+            client.send(commands::encoded(commands::getCurrentTime("unknown")));
+            world.settle();
+            auto& service = world.service();
+            service.commandServiceQueue()->sync([&] {
+                service.audioFilePlayerServer()->setQueuePlayerManagerQueue(
+                    std::make_shared<FullQueue<int>>(1));
+            });
+            client.send(commands::encoded(commands::appendItem("unknown", "unknown")));
+            world.settle();
+        },
+        "");
 }
 
 TEST(ServiceDeathTest, ReplacingTheConnectionFromTheCommandQueueIsReported) {
