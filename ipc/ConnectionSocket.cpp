@@ -13,8 +13,9 @@ constexpr std::size_t enoughForOneWrite = 65'536;
 
 } // namespace
 
-ConnectionSocket::ConnectionSocket(FileDescriptor socket, SocketPoller& poller, std::uint64_t key)
-    : socket_(std::move(socket)), poller_(poller), key_(key) {}
+ConnectionSocket::ConnectionSocket(FileDescriptor socket, SocketPoller& poller, std::uint64_t key,
+                                   Sum unfinished)
+    : socket_(std::move(socket)), unfinishedOfAll_(std::move(unfinished)), poller_(poller), key_(key) {}
 
 void ConnectionSocket::send(FrameKind kind, std::uint64_t callId, std::span<const std::uint8_t> body) {
     {
@@ -61,10 +62,12 @@ void ConnectionSocket::flushLocked() {
 void ConnectionSocket::beginCall(std::size_t bytes) {
     ++unfinishedCalls_;
     unfinishedBytes_ += bytes;
+    *unfinishedOfAll_ += bytes;
 }
 
 void ConnectionSocket::finishCall(std::size_t bytes) {
     unfinishedBytes_ -= bytes;
+    *unfinishedOfAll_ -= bytes;
     --unfinishedCalls_;
     if (!paused_ || isOverLimit(2))
         return;
@@ -84,9 +87,12 @@ void ConnectionSocket::limitReading() {
     showInterest();
 }
 
+// Calls of this connection are what it waits for, also when the others have more: without any it is not over
+// a limit.
 bool ConnectionSocket::isOverLimit(std::uint32_t divisor) const {
-    return unfinishedCalls_ >= mostUnfinishedCalls / divisor ||
-           unfinishedBytes_ >= mostUnfinishedBytes / divisor;
+    const std::size_t most = mostUnfinishedBytes / divisor;
+    return unfinishedCalls_ >= mostUnfinishedCalls / divisor || unfinishedBytes_ >= most ||
+           (*unfinishedOfAll_ >= most && unfinishedBytes_ >= shareOfUnfinishedBytes / divisor);
 }
 
 bool ConnectionSocket::watch() { return poller_.add(socket_.get(), key_, EPOLLRDHUP); }

@@ -25,12 +25,15 @@ public:
     static constexpr std::size_t mostQueuedBytes = 1'048'576;
     static constexpr std::uint32_t mostUnfinishedCalls = 1'024;
     static constexpr std::size_t mostUnfinishedBytes = std::size_t{4} * 1'048'576;
+    /// While the calls of all connections together take mostUnfinishedBytes, each may have this much.
+    static constexpr std::size_t shareOfUnfinishedBytes = 65'536;
+    using Sum = std::shared_ptr<std::atomic<std::size_t>>;
 
     /// Beside a connection's own key: word of its files. No connection has a key with this bit.
     static constexpr std::uint64_t arrivalKey = std::uint64_t{1} << 63;
 
-    /// The poller outlives close().
-    ConnectionSocket(FileDescriptor socket, SocketPoller& poller, std::uint64_t key);
+    /// The poller outlives close(). `unfinished` counts the bytes of the calls of all connections.
+    ConnectionSocket(FileDescriptor socket, SocketPoller& poller, std::uint64_t key, Sum unfinished);
 
     /// Any thread. What is sent inside a burst leaves at its end. Dropped once it is closed.
     void send(FrameKind kind, std::uint64_t callId, std::span<const std::uint8_t> body);
@@ -82,6 +85,7 @@ private:
 
     std::atomic<std::uint32_t> unfinishedCalls_ = 0;
     std::atomic<std::size_t> unfinishedBytes_ = 0;
+    const Sum unfinishedOfAll_;
     std::atomic<bool> paused_ = false;
     SocketPoller& poller_;
     const std::uint64_t key_;

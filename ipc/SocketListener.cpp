@@ -146,7 +146,8 @@ void SocketListener::letGo(int socket) {
 
 void SocketListener::offer(FileDescriptor descriptor) {
     const auto key = nextKey_++;
-    const auto socket = std::make_shared<ConnectionSocket>(std::move(descriptor), poller_, key);
+    const auto socket =
+        std::make_shared<ConnectionSocket>(std::move(descriptor), poller_, key, unfinishedBytes_);
     if (!socket->watch())
         return refuse("the system cannot watch it");
     const auto connection = std::make_shared<SocketConnection>(socket, key, tokens_, files_);

@@ -53,6 +53,7 @@ private:
     void offer(FileDescriptor descriptor);
     void displaceOthers(const SocketConnection* current, FrameKind news);
 
+    const ConnectionSocket::Sum unfinishedBytes_ = std::make_shared<std::atomic<std::size_t>>(0);
     FileDescriptor listeningSocket_;
     FileDescriptor spare_; // given up for a moment when there are no descriptors left, to refuse a client
     TokenTable& tokens_;

@@ -8,6 +8,8 @@ std::string_view TokenTable::grant(std::uint64_t connection, const std::string& 
                                    const std::string& path, ReceivedFile file) {
     if (!file.refusal.empty())
         return file.refusal;
+    if (token.size() > longestToken || path.size() > longestPath)
+        return "the token or the path is too long";
     auto shared = std::make_shared<const HeldFile>(std::move(file.file)); // gets what is displaced
     return state_.withLocked([&](State& state) -> std::string_view {
         auto& tokens = state.waiting[connection];

@@ -19,6 +19,8 @@ namespace tarn {
 class TokenTable final : public SandboxExtension, public FileAccess {
 public:
     static constexpr std::size_t mostWaiting = 64; // per connection
+    static constexpr std::size_t longestToken = 256;
+    static constexpr std::size_t longestPath = 4'095; // what the system opens
 
     /// Makes `token` good for `path`, in place of what the same connection granted under it before. Returns
     /// why it does not, or nothing.

@@ -59,16 +59,6 @@ TEST(FrameReader, ReadsTheSameFramesHoweverTheStreamIsSplit) {
     }
 }
 
-TEST(FrameReader, ReadsByteByByte) {
-    const Data stream =
-        frame(FrameKind::event, 0, "a") + frame(FrameKind::reply, 2, "b") + frame(FrameKind::released, 3);
-    FrameReader reader(Sender::service);
-    std::vector<Frame> frames;
-    for (const auto& byte : stream)
-        ASSERT_FALSE(reader.take({&byte, 1}, {}, frames));
-    EXPECT_EQ(describe(frames), "5:0:a 3:2:b 4:3: ");
-}
-
 TEST(FrameReader, StopsAtWhatDoesNotFitTheRulesAndKeepsWhatCameBefore) {
     const auto with = [](std::size_t position, std::uint8_t value) {
         Data broken = frame(FrameKind::call, 7, "body");
@@ -101,20 +91,6 @@ TEST(FrameReader, StopsAtWhatDoesNotFitTheRulesAndKeepsWhatCameBefore) {
         EXPECT_EQ(reader.take(frame(FrameKind::call, 2), {}, frames), broken);
         EXPECT_EQ(frames.size(), 1U);
     }
-}
-
-TEST(FrameReader, TakesABodyOfTheGreatestLengthInPieces) {
-    const Data body(FrameHeader::largestBody, 'z');
-    Data stream;
-    appendFrame(stream, FrameKind::call, 9, body);
-    FrameReader reader(Sender::client);
-    std::vector<Frame> frames;
-    for (std::size_t at = 0; at < stream.size(); at += 65'536) {
-        const auto length = std::min<std::size_t>(65'536, stream.size() - at);
-        ASSERT_FALSE(reader.take(std::span(stream).subspan(at, length), {}, frames));
-    }
-    ASSERT_EQ(frames.size(), 1U);
-    EXPECT_EQ(frames[0].body, body);
 }
 
 TEST(FrameReader, GivesAFileToTheExtensionWithWhoseBytesItCame) {

@@ -49,22 +49,12 @@ TEST_F(AListeningSocket, ReplacesAFileThatNobodyListensOn) {
     EXPECT_TRUE(connects());
 }
 
-TEST_F(AListeningSocket, LeavesOneThatIsServedAlone) {
-    const ListeningSocket first("name");
-    EXPECT_THROW(ListeningSocket("name"), std::runtime_error);
-    EXPECT_TRUE(connects());
-}
-
 TEST_F(AListeningSocket, LeavesOneOfAnotherProgramAlone) {
     const FileDescriptor other(::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0));
     ASSERT_TRUE(SocketAddress(path_).bind(other.get()));
     ASSERT_EQ(::listen(other.get(), 1), 0);
     EXPECT_THROW(ListeningSocket("name"), std::runtime_error);
     EXPECT_TRUE(connects());
-}
-
-TEST_F(AListeningSocket, SaysWhenThePathIsTooLong) {
-    EXPECT_THROW(ListeningSocket(std::string(200, 'n')), std::system_error);
 }
 
 } // namespace
