@@ -1,8 +1,8 @@
-// Anything at all as an envelope: decoded as the oracle says, and what was decoded survives every operation.
+// Anything at all as an envelope: what can be decoded at all encodes to the same bytes from then on, and
+// survives every operation. What it is decoded to is compared with another implementation in tests/proto.
 
 #include <cstdlib>
 
-#include "fuzz/Oracle.h"
 #include "proto/VelmoMessage.h"
 
 namespace tarn {
@@ -16,14 +16,11 @@ void require(bool condition) {
 
 void tryEnvelope(std::span<const std::uint8_t> bytes) {
     const auto message = VLProtoVelmoMessage::fromData(bytes);
-    const auto expected = expectedEncoding(bytes);
     const auto command = VLProtoVelmoMessage::fromDataWithoutPlist(bytes);
-    require((message != nullptr) == expected.has_value() && (command != nullptr) == expected.has_value());
+    require((message != nullptr) == (command != nullptr));
     if (!message)
         return;
     const Data encoding = message->serialize();
-    require(encoding == *expected);
-
     const auto again = VLProtoVelmoMessage::fromData(encoding);
     require(again && again->serialize() == encoding);
 

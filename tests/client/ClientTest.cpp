@@ -19,16 +19,6 @@ using namespace std::chrono_literals;
 using client::Client;
 using client::Outcome;
 
-std::shared_ptr<VLProtoObjectMessage> object(const char* identifier) {
-    auto message = std::make_shared<VLProtoObjectMessage>();
-    message->setIdentifier(identifier);
-    return message;
-}
-
-Data itemEnded(const char* item) {
-    return velmoMessageForPlayerItemNotifyDidPlayToEndTime(object(item))->serialize();
-}
-
 TEST(AClient, TurnsCommandsIntoEnvelopesAndAnswersIntoValues) {
     std::shared_ptr<VLProtoVelmoMessage> asked;
     Data answer;
@@ -75,46 +65,6 @@ TEST(AClient, TurnsCommandsIntoEnvelopesAndAnswersIntoValues) {
     EXPECT_EQ(rate.outcome, Outcome::released);
     EXPECT_TRUE(rate.succeeded());
     EXPECT_EQ(asked->audioFilePlayerMessage()->queuePlayer()->setRate()->rate(), 2.0F);
-}
-
-TEST(AClient, HandsOutEventsInOrderUntilTheConnectionIsLost) {
-    auto server = std::make_unique<TestServer>();
-    Client client;
-    EXPECT_EQ(client.nextEvent(1ms), std::nullopt);
-    server->service.journalOf(1);
-    for (const char* item : {"a", "b"})
-        server->service.connection()->remoteObjectProxy().receiveData(itemEnded(item));
-    EXPECT_EQ(std::get<client::ItemPlayedToEnd>(*client.nextEvent()).item, "a");
-    server.reset();
-    EXPECT_EQ(std::get<client::ItemPlayedToEnd>(*client.nextEvent()).item, "b");
-    EXPECT_TRUE(std::holds_alternative<client::ConnectionLost>(*client.nextEvent()));
-    EXPECT_EQ(client.nextEvent(), std::nullopt);
-}
-
-TEST(AClient, StartsAfreshWhenItConnectsAnew) {
-    FakeService* service = nullptr;
-    TestServer server([&](ReceivedCall) { // tells an event, and then that the command is done with
-        service->connection()->remoteObjectProxy().receiveData(itemEnded("old"));
-    });
-    service = &server.service;
-    Client client;
-    ASSERT_EQ(client.destroyAsset("none").get().outcome, Outcome::released);
-    client.reconnect();
-    EXPECT_EQ(client.nextEvent(1ms), std::nullopt);
-    server.service.journalOf(3);
-    server.service.connection()->remoteObjectProxy().receiveData(itemEnded("new"));
-    EXPECT_EQ(std::get<client::ItemPlayedToEnd>(*client.nextEvent()).item, "new");
-}
-
-// Nothing that waits for an event may wait for ever.
-TEST(AClient, HasNoEventsWhileThereIsNoConnection) {
-    auto server = std::make_unique<TestServer>();
-    Client client;
-    server.reset();
-    EXPECT_TRUE(std::holds_alternative<client::ConnectionLost>(*client.nextEvent()));
-    EXPECT_THROW(client.reconnect(), std::system_error);
-    EXPECT_EQ(client.nextEvent(), std::nullopt);
-    EXPECT_EQ(client.setRate("player", 1).get().outcome, Outcome::connectionLost);
 }
 
 TEST(AClient, GrantsAFileUnderATokenForThePathOfItsURL) {

@@ -79,20 +79,6 @@ TEST(AConnection, EndsEveryPendingCallOnceWhenItIsLost) {
     EXPECT_EQ(ask(other, "answer").outcome, Outcome::answered);
 }
 
-TEST(AConnection, EndsPendingCallsWhenTheProgramEndsIt) {
-    const TestServer server;
-    std::atomic<int> ended = 0;
-    {
-        Connection connection({nullptr, [] { FAIL() << "nothing was lost"; }});
-        connection.call(bytes("never"), [&](const Answer&) { ++ended; });
-        connection.reconnect();
-        EXPECT_EQ(ended, 1);
-        EXPECT_TRUE(connection.isConnected());
-        connection.call(bytes("never"), [&](const Answer&) { ++ended; });
-    }
-    EXPECT_EQ(ended, 2);
-}
-
 TEST(AConnection, MayBeMadeAnewByManyThreadsWhileOthersCall) {
     constexpr int rounds = 50;
     const TestServer server(answerAsAsked);
@@ -145,25 +131,6 @@ TEST(AConnection, TellsEventsAndAnswersInTheServicesOrder) {
         EXPECT_EQ(told[static_cast<std::size_t>(2 * i)], "event " + std::to_string(i));
         EXPECT_EQ(told[static_cast<std::size_t>(2 * i + 1)], "answer " + std::to_string(i));
     }
-}
-
-TEST(AConnection, ServesManyCallingThreads) {
-    constexpr int threads = 4;
-    constexpr int calls = 500;
-    const TestServer server(answerAsAsked);
-    Connection connection({});
-    std::atomic<int> answered = 0;
-    {
-        std::vector<std::jthread> callers;
-        callers.reserve(threads);
-        for (int i = 0; i < threads; ++i)
-            callers.emplace_back([&] {
-                for (int k = 0; k < calls; ++k)
-                    if (ask(connection, k % 2 == 0 ? "answer" : "drop").outcome != Outcome::connectionLost)
-                        ++answered;
-            });
-    }
-    EXPECT_EQ(answered, threads * calls);
 }
 
 TEST(AConnection, SaysWhyItCannotBeMadeOrUsed) {

@@ -60,17 +60,6 @@ TEST_F(AnApplicationRegistry, FollowsWhatLaunchesAComponent) {
     EXPECT_THAT(containing("org.other.Watch"), Optional(Eq("player")));
 }
 
-TEST_F(AnApplicationRegistry, FallsBackToNames) {
-    system.write("applications/org.example.Player.desktop", entryText);
-    system.write("applications/org.desktop", entryText);
-    system.write("applications/vendor/tools/alone.desktop", entryText);
-    EXPECT_THAT(containing("org.example.Player"), Optional(Eq("org.example.Player")));
-    EXPECT_THAT(containing("org.example.Player.Watch.Small"), Optional(Eq("org.example.Player")));
-    EXPECT_THAT(containing("vendor-tools-alone"), Optional(Eq("vendor-tools-alone")));
-    EXPECT_EQ(containing("org.example"), std::nullopt);
-    EXPECT_EQ(containing("../org.example.Player"), std::nullopt);
-}
-
 TEST_F(AnApplicationRegistry, PutsMetadataBeforeNamesAndTheUsersFolderFirst) {
     system.write("applications/org.example.Player.desktop", entryText);
     system.write("applications/org.example.Hidden.desktop", entryText);
@@ -125,23 +114,6 @@ TEST_F(AnApplicationRegistry, SeesWhatIsWrittenOverInPlace) {
     EXPECT_THAT(containing("org.other.Watch"), Optional(Eq("org.example.B")));
 }
 
-/// Writing through a mapping is no event, the end of it is: in between only memory can answer.
-TEST_F(AnApplicationRegistry, AnswersFromMemoryWhileNothingChanges) {
-    const fs::path entry = system.write("applications/org.example.A.desktop", entryText);
-    const FileDescriptor file(open(entry.c_str(), O_RDWR | O_CLOEXEC));
-    const auto length = static_cast<std::size_t>(fs::file_size(entry));
-    EXPECT_THAT(registry.applicationName("org.example.A"), Optional(Eq("Player")));
-
-    void* mapped = mmap(nullptr, length, PROT_READ | PROT_WRITE, MAP_SHARED, file.get(), 0);
-    ASSERT_NE(mapped, MAP_FAILED);
-    char* content = static_cast<char*>(mapped);
-    *std::find(content, content + length, 'P') = 'S'; // of "Player"
-    munmap(mapped, length);
-    EXPECT_THAT(registry.applicationName("org.example.A"), Optional(Eq("Player")));
-    fs::permissions(entry, fs::perms::owner_read);
-    EXPECT_THAT(registry.applicationName("org.example.A"), Optional(Eq("Slayer")));
-}
-
 TEST_F(AnApplicationRegistry, LosesOnlyHostileEntriesThemselves) {
     system.write("applications/org.example.Good.desktop", entryText);
     system.write("applications/org.example.Garbage.desktop", std::string("\0[Desktop Entry]\xFF=\n=", 20));
@@ -167,17 +139,6 @@ TEST_F(AnApplicationRegistry, LosesOnlyHostileEntriesThemselves) {
          {"org.example.Garbage", "org.example.Link", "org.example.Big", "org.example.Folder",
           "org.example.Dangling", "org.example.Fifo", "org.other.Cut", "org.other.Entity"})
         EXPECT_EQ(containing(hostile), std::nullopt) << hostile;
-}
-
-TEST(TheApplicationFolders, AreThoseOfTheEnvironment) {
-    std::map<std::string, std::string> variables = {{"HOME", "/home/me"}};
-    const auto folders = [&] {
-        return applicationFoldersFromEnvironment([&](const char* name) { return variables[name]; });
-    };
-    EXPECT_THAT(folders(), ElementsAre("/home/me/.local/share", "/usr/local/share", "/usr/share"));
-    variables["XDG_DATA_HOME"] = "/data";
-    variables["XDG_DATA_DIRS"] = "relative::/a:/data:/b";
-    EXPECT_THAT(folders(), ElementsAre("/data", "/a", "/b"));
 }
 
 } // namespace

@@ -77,24 +77,6 @@ TEST_F(RemoteTargetsTest, APauseReachesEverybodyAndTheOneUsedLastComesLast) {
     EXPECT_EQ(targets_.deliver(RemoteCommandKind::pause), RemoteCommandResult::commandFailed);
 }
 
-TEST_F(RemoteTargetsTest, ACommandThatIsDisabledOrHasNoPlayerReachesNobody) {
-    EXPECT_EQ(targets_.deliver(RemoteCommandKind::pause), RemoteCommandResult::noSuchContent);
-    const auto player = FakePlayer::make(targets_, playback(1));
-    const auto target =
-        targets_.previousTrackCommand().addTarget(*player, [] { return RemoteCommandResult::success; });
-    EXPECT_EQ(targets_.deliver(RemoteCommandKind::previousTrack), RemoteCommandResult::noSuchContent);
-}
-
-TEST_F(RemoteTargetsTest, TheControlsHearOfPlayersThatComeChangeAndGo) {
-    auto player = FakePlayer::make(targets_);
-    EXPECT_EQ(changes_, 1);
-    player->tell(playback(1));
-    EXPECT_EQ(changes_, 2);
-    player.reset();
-    EXPECT_EQ(changes_, 3);
-    EXPECT_THAT(targets_.players(), IsEmpty());
-}
-
 TEST(RemoteTargetsThreads, PlayersComeAndGoWhileCommandsAreDelivered) {
     constexpr int rounds = 2000;
     RemoteTargets targets;

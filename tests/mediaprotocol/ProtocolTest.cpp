@@ -102,32 +102,6 @@ TEST_F(Ring, OwesWordOnceWhenEnoughIsThere) {
     EXPECT_TRUE(writer.owesWord()) << "no more will come";
 }
 
-TEST_F(Ring, IsNotBelievedWhenItLies) {
-    const std::function<void(RingHeader&)> lies[] = {
-        [](RingHeader& header) { header.bytesWritten = 2 * RingMemory::size + 401; },
-        [](RingHeader& header) { header.bytesWritten = ~std::uint64_t{0}; },
-        [](RingHeader& header) { header.spansWritten = RingHeader::mostSpans + 2; },
-        [](RingHeader& header) { header.spansWritten = 0; },
-        [](RingHeader& header) { header.spans[1].frames = 101; },
-        [](RingHeader& header) { header.spans[1].frames = header.spans[1].bytes = 0; },
-        [](RingHeader& header) { header.spans[1].frames = (header.spans[1].bytes = 404) / 4; },
-        [](RingHeader& header) { header.spans[1].state = static_cast<MediaSpan::State>(3); },
-        [](RingHeader& header) { header.spans[1].generation = 2; },
-        [](RingHeader& header) { header.spans[1].start = -1; },
-        [](RingHeader& header) { header.spans[1].end = INT64_MAX; },
-    };
-    for (const auto& lie : lies) {
-        Ends ring;
-        PcmBuffer buffer;
-        ring.put(1, 100);
-        ring.put(1, 100);
-        ASSERT_EQ(ring.reader.take(buffer, 100).what, What::span);
-        lie(ring.raw.header());
-        EXPECT_EQ(ring.reader.take(buffer, 100).what, What::lie) << &lie - lies;
-    }
-    EXPECT_NE(::ftruncate(descriptor.get(), 0), 0) << "nor can it be taken away";
-}
-
 TEST(Channel, BringsNoMoreDescriptorsThanAreAskedFor) {
     const auto ends = Channel::makePair();
     const FileDescriptor file(::open("/dev/null", O_RDONLY | O_CLOEXEC));

@@ -63,13 +63,6 @@ TEST_F(AssetStoriesTest, TheFirstTagOfAKeyCountsAlsoWhenItHoldsNoText) {
               "upsertWithMetaData: duration=1 identifier=a\n");
 }
 
-TEST_F(AssetStoriesTest, AnUpsertComesBeforeADestroyOfTheSameMessage) {
-    auto command = upsertAsset({.identifier = "a", .URL = "file:///tagged.flac"});
-    command->mergeFrom(*destroyAsset("a"));
-    EXPECT_EQ(tell(command), "destroy: albumTitle=Album artist=Band duration=200 identifier=a title=Song\n");
-    EXPECT_NE(client->assets->assetWithIdentifier("a"), nullptr);
-}
-
 TEST_F(AssetStoriesTest, AnUpsertWithAURLReplacesTheRecordWhole) {
     tell(upsertAsset({"a", "file:///tagged.flac", "Mine", "My album", "Me"}));
     auto before = client->assets->assetWithIdentifier("a");
@@ -126,13 +119,6 @@ TEST_F(AssetStoriesTest, AFileThatDoesNotOpenChangesNothing) {
     EXPECT_EQ(client->assets->assetWithIdentifier("a"), before);
     EXPECT_EQ(device.sandboxExtensions.held(), 0u);
     EXPECT_THAT(errors(), ElementsAre(HasSubstr("Could not open audio file asset")));
-}
-
-TEST_F(AssetStoriesTest, ADestroyedAssetIsNotFoundAnyMore) {
-    tell(upsertAsset({.identifier = "a", .URL = "file:///tagged.flac"}));
-    EXPECT_EQ(tell(destroyAsset("a")), "destroy: no answer\n");
-    EXPECT_EQ(tell(destroyAsset("a")), "destroy: no answer\n");
-    EXPECT_EQ(tell(upsertItem("i", "a")), "upsertWithAsset: error 26\n");
 }
 
 } // namespace

@@ -64,16 +64,6 @@ TEST(ObjectRegistryTest, ForgetsWhatAReplacedOrRemovedObjectStoodFor) {
     EXPECT_EQ(registry.objectWithIdentifier("a"), nullptr);
 }
 
-TEST(ObjectRegistryTest, LetsADisplacedObjectLookIntoItWhileItIsDestroyed) {
-    ObjectRegistry<Entry> registry;
-    std::vector<std::optional<std::string>> seen;
-    auto look = [&] { seen.push_back(registry.identifierForMediaObject(&media[1])); };
-    registry.setObject("a", entry(&media[0], look));
-    registry.setObject("a", entry(&media[1], look));
-    registry.removeObject("a");
-    EXPECT_EQ(seen, (std::vector<std::optional<std::string>>{"a", std::nullopt}));
-}
-
 TEST(ObjectRegistryTest, KeepsNothingOnceItIsClosed) {
     ObjectRegistry<Entry> registry;
     std::optional<std::string> seen = "unseen";

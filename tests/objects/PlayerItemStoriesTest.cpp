@@ -67,15 +67,6 @@ TEST_F(PlayerItemStoriesTest, AReplacedItemReportsNoMoreThoughItPlaysOn) {
                          "push queuePlayer.setRate identifier=player rate=0\n");
 }
 
-TEST_F(PlayerItemStoriesTest, ADestroyedItemReportsNoMoreThoughItPlaysOn) {
-    mirror({"a"});
-    tell(setRate("player", 1));
-    EXPECT_EQ(tell(destroyItem("a")), "destroy: no answer\n");
-    EXPECT_EQ(pass(10s), "push queuePlayer.setCurrentItem identifier=player\n"
-                         "push queuePlayer.setRate identifier=player rate=0\n");
-    EXPECT_EQ(tell(destroyItem("a")), "destroy: no answer\n");
-}
-
 TEST_F(PlayerItemStoriesTest, OnlyTheFirstCommandOfAMessageIsServedInTheOrderOfTheTable) {
     mirror({"i"});
     tell(setCurrentTime("i", 2));
@@ -92,18 +83,6 @@ TEST_F(PlayerItemStoriesTest, OnlyTheFirstCommandOfAMessageIsServedInTheOrderOfT
     EXPECT_EQ(tell(upsert), "push playerItem.setStatus identifier=i status=0\n"
                             "destroy: status=0\n");
     EXPECT_NE(client->items->playerItemWithIdentifier("i"), nullptr);
-}
-
-TEST_F(PlayerItemStoriesTest, WhatOnlyTheServiceSendsIsIgnored) {
-    song("a");
-    tell(upsertItem("i", "a"));
-    auto message = std::make_shared<VLProtoAudioFilePlayerItem>();
-    message->setSetStatus(std::make_shared<VLProtoAudioFilePlayerStatus>());
-    message->setNotifyTimeJumped(std::make_shared<VLProtoObjectMessage>());
-    auto command = std::make_shared<VLProtoAudioFilePlayerMessage>();
-    command->setPlayerItem(message);
-    EXPECT_EQ(tell(command), "notifyTimeJumped: no answer\n");
-    EXPECT_THAT(errors(), IsEmpty());
 }
 
 } // namespace

@@ -161,24 +161,5 @@ TEST(Threads, ShareItemsAndPlayers) {
         EXPECT_EQ(count, before[kind]) << kind;
 }
 
-TEST(Threads, FindThePositionFrozenBehindAPause) {
-    ThreadLoop loop;
-    LocalNotificationCenter notifications;
-    SimulatedSandboxExtension sandbox;
-    SimulatedMediaEngine engine(loop, notifications, sandbox);
-    engine.addFile("file");
-    auto player = engine.makeQueuePlayer({engine.makeItem(engine.openAsset("file").asset)});
-    for (int i = 0; i < 20; ++i) {
-        player->play();
-        loop.finishPosted();
-        player->pause();
-        MediaTime paused = player->currentTime();
-        loop.finishPosted(); // the output has been stopped
-        EXPECT_EQ(player->currentTime(), paused);
-    }
-    player.reset();
-    loop.finish();
-}
-
 } // namespace
 } // namespace tarn

@@ -40,19 +40,6 @@ TEST_F(Edit, OfWhatComesNextLeavesWhatPlaysAlone) {
     EXPECT_EQ(test.platform.media.speaker().blends(), 0U);
 }
 
-TEST_F(Edit, ThatComesTooLateIsHeardForAMoment) {
-    advanceTo(9950ms);
-    test.player->removeItem(b);
-    advanceTo(10010ms);
-    EXPECT_EQ(test.nameOf(test.player->currentItem()), "c");
-    EXPECT_EQ(test.player->currentTime().seconds(), 0.0);
-    advanceTo(11s);
-    EXPECT_EQ(test.heard(), "0.000-10.000 a 0.000..10.000\n"
-                            "10.000-10.050 b 0.000..0.050\n"
-                            "10.050-11.000 c 0.000..0.950\n");
-    EXPECT_EQ(test.player->currentTime().seconds(), 0.95);
-}
-
 TEST_F(Edit, OfTheCurrentItemActsAtOnce) {
     advanceTo(3s);
     test.reports();
@@ -96,26 +83,6 @@ TEST_F(Edit, ThatEmptiesTheQueueKeepsTheRate) {
                             "60.000-62.000 x 0.000..3.000\n");
 }
 
-TEST_F(Edit, AppendsToTheLastItemWithoutAGap) {
-    test.player->removeItem(b);
-    test.player->removeItem(c);
-    advanceTo(9999ms);
-    test.player->insertItem(x, nullptr);
-    advanceTo(12s);
-    EXPECT_EQ(test.heard(), "0.000-10.000 a 0.000..10.000\n10.000-12.000 x 0.000..2.000\n");
-}
-
-TEST_F(Edit, WhilePausedIsHeardWhenPlayingGoesOn) {
-    advanceTo(3s);
-    test.player->pause();
-    advanceTo(4s);
-    test.player->advanceToNextItem();
-    b->seekToTime({5, 1});
-    test.player->setRate(2);
-    advanceTo(5s);
-    EXPECT_EQ(test.heard(), "0.000-3.000 a 0.000..3.000\n4.000-5.000 b 5.000..7.000\n");
-}
-
 TEST_F(Edit, ThatTakesAnItemOutAndBackGoesOnWhereItWas) {
     advanceTo(3s);
     test.player->removeItem(a);
@@ -125,21 +92,6 @@ TEST_F(Edit, ThatTakesAnItemOutAndBackGoesOnWhereItWas) {
     advanceTo(4s);
     EXPECT_EQ(test.nameOf(test.player->currentItem()), "a");
     EXPECT_NEAR(a->currentTime().seconds(), 3.9, 1e-9);
-}
-
-TEST_F(Edit, ThatIsDoneFromAReportTakesEffect) {
-    auto again = test.platform.notifications.addObserver(
-        MediaItem::didPlayToEndTime, c.get(),
-        [&](const Notification&) { test.player->insertItem(a, nullptr); });
-    advanceTo(35s);
-    EXPECT_EQ(test.heard(), "0.000-10.000 a 0.000..10.000\n"
-                            "10.000-20.000 b 0.000..10.000\n"
-                            "20.000-30.000 c 0.000..10.000\n");
-    EXPECT_EQ(test.nameOf(test.player->currentItem()), "a") << "it begins anew, but the queue had run out";
-    EXPECT_EQ(test.player->rate(), 0.0F);
-    test.player->play();
-    advanceTo(36s);
-    EXPECT_EQ(a->currentTime().seconds(), 1.0);
 }
 
 TEST_F(Edit, RefusesAnItemThatIsInTheQueueAlready) {
@@ -160,17 +112,6 @@ TEST_F(Edit, RefusesAnItemThatIsInTheQueueAlready) {
                               "30.000: c played to its end\n"
                               "30.000: current none\n"
                               "30.000: rate 0\n");
-}
-
-TEST_F(Edit, OfTwentyThousandItemsIsAsQuickAsOfTwo) {
-    std::vector<std::shared_ptr<MediaItem>> items;
-    auto asset = test.platform.media.openAsset("x").asset;
-    for (int i = 0; i < 20'000; ++i)
-        test.player->insertItem(items.emplace_back(test.platform.media.makeItem(asset)), nullptr);
-    for (const auto& item : items) // from the far end they would be searched for
-        test.player->removeItem(item);
-    advanceTo(12s);
-    EXPECT_EQ(test.nameOf(test.player->currentItem()), "b");
 }
 
 } // namespace

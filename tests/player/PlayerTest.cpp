@@ -30,25 +30,6 @@ TEST(Player, PlaysOneItemAfterTheOtherWithoutAGap) {
     EXPECT_EQ(test.platform.media.speaker().soundingOutputs(), 0U);
 }
 
-TEST(Player, PlaysItemsThatAreMuchShorterThanTheBuffer) {
-    Listening test;
-    std::vector<std::shared_ptr<MediaItem>> items;
-    for (const char* name : {"a", "b", "c", "d", "e", "f"})
-        items.push_back(test.item(name, 30ms));
-    items.push_back(test.item("empty", 0s));
-    items.push_back(test.item("g", 30ms));
-    test.play(items);
-    test.advance(1s);
-    EXPECT_EQ(test.heard(), "0.000-0.030 a 0.000..0.030\n"
-                            "0.030-0.060 b 0.000..0.030\n"
-                            "0.060-0.090 c 0.000..0.030\n"
-                            "0.090-0.120 d 0.000..0.030\n"
-                            "0.120-0.150 e 0.000..0.030\n"
-                            "0.150-0.180 f 0.000..0.030\n"
-                            "0.180-0.210 g 0.000..0.030\n");
-    EXPECT_EQ(test.player->rate(), 0.0F);
-}
-
 TEST(Player, OpensTheCurrentItemAndTheNextOneOnly) {
     Listening test;
     auto a = test.item("a"), b = test.item("b"), c = test.item("c");
@@ -193,41 +174,6 @@ TEST(Player, SeeksWhilePlaying) {
                             "5.100-6.200 a 30.000..31.100\n"
                             "6.200-7.200 a 59.000..60.000\n"
                             "7.200-9.100 b 0.000..1.900\n");
-}
-
-TEST(Player, BeginsAnItemThatHasPlayedToItsEndAnewUnlessItWasMoved) {
-    Listening test;
-    auto a = test.item("a", 10s);
-    test.play({a}, 10);
-    test.advance(1s);
-    test.player->insertItem(a, nullptr);
-    EXPECT_EQ(a->currentTime().seconds(), 0.0);
-    test.player->setRate(10);
-    test.advance(1s);
-    a->seekToTime({5, 1});
-    test.player->insertItem(a, nullptr);
-    EXPECT_EQ(a->currentTime().seconds(), 5.0);
-}
-
-TEST(Player, SeeksAwayFromAnEndThatIsHeardButNotReported) {
-    int inTime = 0;
-    for (std::uint64_t seed = 1; seed <= 20; ++seed) {
-        Listening test(seed);
-        auto a = test.item("a", 10s);
-        test.play({a, test.item("b", 10s)});
-        bool isInTime = false;
-        auto thread = test.platform.scheduler.createQueue("thread");
-        auto seek = test.platform.scheduler.at(10s, thread, [&] {
-            a->seekToTime({2, 1});
-            isInTime = test.player->currentItem() == a;
-        });
-        test.advance(11s);
-        inTime += isInTime ? 1 : 0;
-        EXPECT_EQ(test.nameOf(test.player->currentItem()), isInTime ? "a" : "b") << seed;
-        EXPECT_EQ(test.player->currentTime().seconds(), isInTime ? 3.0 : 1.0) << seed;
-    }
-    EXPECT_GT(inTime, 0);
-    EXPECT_LT(inTime, 20);
 }
 
 TEST(Player, SeeksBeforePlaying) {

@@ -13,17 +13,6 @@ MediaScript unplayable() {
     return script;
 }
 
-TEST(Trouble, AnItemThatCannotBePlayedIsPassedOver) {
-    Listening test;
-    auto b = test.item("b", unplayable());
-    test.play({test.item("a", 3s), b, test.item("c", 3s)}, 0);
-    EXPECT_EQ(b->status(), MediaStatus::failed);
-    EXPECT_EQ(b->error()->code, 7);
-    test.player->play();
-    test.advance(10s);
-    EXPECT_EQ(test.heard(), "0.000-3.000 a 0.000..3.000\n3.000-6.000 c 0.000..3.000\n");
-}
-
 TEST(Trouble, AQueueOfItemsThatCannotBePlayedRunsOut) {
     Listening test;
     auto a = test.item("a", unplayable()), b = test.item("b", unplayable());
@@ -232,41 +221,6 @@ TEST(TwoPlayers, TheNewestOneDrivesTheItemsTheyShare) {
     EXPECT_EQ(test.platform.media.speaker().outputs(), 1U);
     test.advance(2s);
     EXPECT_EQ(test.reports(), "4.000: rate 2\n7.000: a played to its end\n7.000: current b\n");
-}
-
-TEST(TwoPlayers, OnlyTheNewestOneReportsHowAnItemEnds) {
-    Listening test;
-    auto a = test.item("a", 10s);
-    test.play({a});
-    auto old = test.player;
-    test.advance(4s);
-    test.play({a}, 0);
-    test.reports();
-    test.advance(10s);
-    EXPECT_EQ(old->currentItem(), nullptr);
-    EXPECT_EQ(test.reports(), "10.000: current none\n10.000: rate 0\n");
-    EXPECT_EQ(a->currentTime().seconds(), 4.0);
-    test.player->play();
-    test.advance(10s);
-    EXPECT_EQ(test.reports(), "14.000: rate 1\n"
-                              "20.000: a played to its end\n"
-                              "20.000: current none\n"
-                              "20.000: rate 0\n");
-}
-
-TEST(TwoPlayers, AnEndInOneIsNoEndForTheOtherThatHoldsTheItem) {
-    Listening test;
-    auto a = test.item("a", 10s);
-    test.play({a});
-    auto old = test.player;
-    test.advance(4s);
-    test.play({a}, 3);
-    test.advance(2s); // the newest one has come to its end
-    EXPECT_EQ(a->currentTime().seconds(), 6.0);
-    old->removeItem(a);
-    test.play({a});
-    test.advance(1s);
-    EXPECT_EQ(a->currentTime().seconds(), 7.0);
 }
 
 TEST(TwoPlayers, TheOneBeforeDrivesWhatTheNewestLetsGo) {

@@ -19,12 +19,6 @@ std::shared_ptr<Message> decoded(std::string_view hex) {
     return Message::fromData(bytesFromHex(hex));
 }
 
-constexpr std::string_view tenContinuations = "FF FF FF FF FF FF FF FF FF FF ";
-
-TEST(Decoding, EndsWithSuccessAtAnEndOfGroupKey) {
-    EXPECT_EQ(decoded<Status>("10 01 0C 10 02 FF")->status(), 1);
-}
-
 TEST(Decoding, SkipsTheRestOfAnEmbeddedMessageThatEndedEarly) {
     // Object message: end of group, then bytes that are no field; afterwards the item's destroy.
     const auto item = decoded<VLProtoAudioFilePlayerItem>("0A 03 0C FF FF 12 03 0A 01 61");
@@ -38,29 +32,10 @@ TEST(Decoding, ReadsAKnownFieldAsItsKindWhateverTheKeySays) {
     EXPECT_EQ(decoded<Object>("30 00 00 00 00 00 00 F8 3F")->ndouble(), 1.5); // key says varint
 }
 
-TEST(Decoding, TakesAnEndlessKeyForFieldZeroOfAVarint) {
-    const auto status = decoded<Status>(std::string(tenContinuations) + "05 10 01");
-    ASSERT_TRUE(status);
-    EXPECT_EQ(status->status(), 1);
-}
-
-TEST(Decoding, TakesAnEndlessNumberForZeroAndGoesOnBehindIt) {
-    const auto status = decoded<Status>("10 " + std::string(tenContinuations) + "20 05");
-    ASSERT_TRUE(status && status->hasStatus());
-    EXPECT_EQ(status->status(), 0);
-    EXPECT_EQ(status->errorCode(), 5);
-}
-
 TEST(Decoding, KeepsTheLowHalfOfNumbersOf32Bits) {
     EXPECT_EQ(decoded<Object>("10 81 80 80 80 10")->subtype(), 1);
     EXPECT_EQ(decoded<Object>("10 FF FF FF FF FF FF FF FF FF 01")->subtype(), -1);
     EXPECT_TRUE(decoded<Object>("60 80 80 80 80 10")->nbool());
-}
-
-TEST(Decoding, SkipsUnknownFieldsAndForgetsThem) {
-    const auto object = decoded<Object>("08 01 1A 02 08 05 00 00 2A 01 74"); // field 3, field 0
-    ASSERT_TRUE(object);
-    EXPECT_EQ(object->serialize(), bytesFromHex("08 01 2A 01 74"));
 }
 
 TEST(Decoding, SkipsGroupsThatCloseAndRefusesOthers) {
@@ -69,12 +44,6 @@ TEST(Decoding, SkipsGroupsThatCloseAndRefusesOthers) {
     EXPECT_FALSE(decoded<Status>("A3 01 08 01"));       // never closes
     EXPECT_FALSE(decoded<Status>("A6 01"));             // a wire type that does not exist
     EXPECT_FALSE(decoded<Status>("A3 01 A7 01 A4 01")); // so inside of a group
-}
-
-TEST(Decoding, KeepsTheLastOfSeveralEmbeddedMessages) {
-    const auto item = decoded<VLProtoAudioFilePlayerItem>("1A 03 0A 01 61 1A 02 10 01");
-    EXPECT_FALSE(item->setStatus()->hasIdentifier());
-    EXPECT_EQ(item->setStatus()->status(), 1);
 }
 
 TEST(Decoding, LetsATextThatIsNotUtf8BeAbsent) {
@@ -123,23 +92,6 @@ TEST(Decoding, RefusesDeepGroups) {
     for (std::size_t index = 1; index < pairs.size(); index += 2)
         pairs[index] = 0x34;
     EXPECT_TRUE(Status::fromData(pairs));
-}
-
-TEST(ProtoReader, HandsOutMarksThatNest) {
-    const Data bytes = bytesFromHex("04 02 61 62 63 64");
-    ProtoReader reader(bytes);
-    std::uint32_t outer = 0;
-    std::uint32_t inner = 0;
-    ASSERT_TRUE(reader.placeMark(outer));
-    EXPECT_EQ(reader.length(), 5U);
-    ASSERT_TRUE(reader.placeMark(inner));
-    EXPECT_EQ(reader.length(), 4U);
-    reader.recallMark(inner);
-    EXPECT_EQ(reader.position(), 4U);
-    reader.recallMark(outer);
-    EXPECT_EQ(reader.position(), 5U);
-    EXPECT_EQ(reader.length(), 6U);
-    EXPECT_FALSE(reader.placeMark(outer)) << "64 hexadecimal is longer than what is left";
 }
 
 } // namespace

@@ -130,21 +130,6 @@ TEST_P(GoldenBytes, AreWrittenAndReadBack) {
     EXPECT_EQ(decoded->serialize(), bytesFromHex(GetParam().hex));
 }
 
-/// Cut inside of a field they are refused, cut between two they are what came before: never anything else.
-/// Each length is a block of its own, so that reading beyond it is seen.
-TEST_P(GoldenBytes, CutAtAnyLengthAreRefusedOrAPrefix) {
-    const Data whole = bytesFromHex(GetParam().hex);
-    for (std::size_t length = 0; length < whole.size(); ++length) {
-        const Data cut(whole.begin(), whole.begin() + static_cast<std::ptrdiff_t>(length));
-        const auto decoded = GetParam().decode(cut);
-        if (!decoded)
-            continue;
-        const Dictionary before = GetParam().decode(whole)->dictionaryRepresentation();
-        for (const auto& [name, value] : decoded->dictionaryRepresentation())
-            EXPECT_TRUE(before.contains(name)) << name << " of " << length << " bytes";
-    }
-}
-
 std::string testName(const testing::TestParamInfo<Golden>& parameter) {
     std::string name = parameter.param.name;
     std::ranges::replace(name, ' ', '_');

@@ -47,18 +47,6 @@ TEST_F(ActivationTest, AnyOtherRateIsAppliedExactlyOnceTheSessionIsActive) {
     EXPECT_EQ(rate(), 3);
 }
 
-TEST_F(ActivationTest, ARateThatIsNotFiniteActivatesAndIsRefusedByTheEngine) {
-    tell(setRate("player", 2));
-    for (float rate : {std::numeric_limits<float>::quiet_NaN(), std::numeric_limits<float>::infinity(),
-                       -std::numeric_limits<float>::infinity()}) {
-        auto activations = device.audioSession.activationRequests();
-        EXPECT_EQ(tell(setRate("player", rate)), "setRate: no answer\n");
-        EXPECT_EQ(device.audioSession.activationRequests(), activations + 1);
-        EXPECT_EQ(this->rate(), 2);
-    }
-    EXPECT_EQ(errors().size(), 3u);
-}
-
 TEST_F(ActivationTest, AFailedActivationLeavesTheRateAndSaysWhy) {
     device.audioSession.willActivate({.error = Error{"test", 7, {}}});
     EXPECT_EQ(tell(setRate("player", 1)),

@@ -63,20 +63,5 @@ TEST_F(LastReferenceTest, AQueuePlayerDiesOnTheThreadOfALateActivation) {
     expectPlayerGone();
 }
 
-TEST_F(LastReferenceTest, AQueuePlayerDiesOnTheThreadOfAnInterruption) {
-    tell(setRate("player", 0));
-    destroyPlayerDuring("queuePlayer.setRate identifier=player rate=1");
-    device.audioSession.endInterruption(AudioSession::optionShouldResume);
-    now();
-    expectPlayerGone();
-}
-
-TEST_F(LastReferenceTest, AQueuePlayerDiesOnTheThreadOfRemoteCommands) {
-    destroyPlayerDuring("queuePlayer.setRate identifier=player rate=0");
-    device.remoteCommands.press(RemoteCommandKind::pause);
-    now();
-    expectPlayerGone();
-}
-
 } // namespace
 } // namespace tarn

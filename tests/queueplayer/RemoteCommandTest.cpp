@@ -76,26 +76,6 @@ TEST_F(RemoteCommandTest, PreviousTrackIsDisabledForGood) {
     EXPECT_EQ(press(Kind::previousTrack), Result::noSuchContent);
 }
 
-TEST_F(RemoteCommandTest, WithSeveralPlayersPauseGoesToAllAndTheRestToOne) {
-    tell(upsertPlayer("newer", {"b"}));
-    EXPECT_EQ(press(Kind::play), Result::success);
-    EXPECT_EQ(seen, "push queuePlayer.setRate identifier=newer rate=1\n");
-    tell(setRate("player", 1));
-    tell(setRate("player", 0));
-    EXPECT_EQ(press(Kind::nextTrack), Result::noSuchContent);
-    EXPECT_EQ(seen, "push queuePlayer.setCurrentItem identifier=newer\n") << "what plays, and no other queue";
-    tell(appendItem("newer", "b"));
-    tell(setRate("player", 1));
-    EXPECT_EQ(press(Kind::pause), Result::success);
-    EXPECT_EQ(seen, "push queuePlayer.setRate identifier=newer rate=0\n"
-                    "push queuePlayer.setRate identifier=player rate=0\n");
-    EXPECT_EQ(press(Kind::play), Result::success);
-    EXPECT_EQ(seen, "push queuePlayer.setRate identifier=player rate=1\n") << "the one that was used last";
-    tell(destroyPlayer("newer"));
-    tell(destroyPlayer("player"));
-    EXPECT_EQ(press(Kind::play), Result::noSuchContent);
-}
-
 TEST_F(RemoteCommandTest, APlayThatWaitsForTheSessionHoldsUpNobodyElse) {
     device.audioSession.willActivate({.after = 20s});
     EXPECT_EQ(press(Kind::play), std::nullopt);

@@ -111,28 +111,5 @@ TEST(TheErrorBundle, DescribesEveryCodeInEveryLanguage) {
     EXPECT_THAT(log.lines(), IsEmpty());
 }
 
-TEST(ABundleOnDisk, SurvivesBrokenTables) {
-    const TemporaryFolder folder;
-    folder.write("en.lproj/Localizable.strings", "\"key\" = \"English\";");
-    folder.write("de.lproj/Localizable.strings", "\"key\" = \"Deu");
-    folder.write("fr.lproj/Other.strings", "");
-    folder.write("ko.lproj", "a file");
-    for (const char* language : {"de", "fr", "ko", "..", "ja", "en"}) {
-        const DirectoryLocalization localization(folder.path(), {language});
-        EXPECT_EQ(vlUtils_localizedStringForSystemLanguage(localization, "key", folder.path()), "English")
-            << language;
-    }
-}
-
-TEST(ABundleOnDisk, IsLookedUpOnce) {
-    const TemporaryFolder folder;
-    folder.write("en.lproj/Localizable.strings", "\"key\" = \"English\";");
-    const DirectoryLocalization localization(folder.path(), {"de"});
-    for (int time = 0; time < 2; ++time) {
-        EXPECT_EQ(vlUtils_localizedStringForSystemLanguage(localization, "key", folder.path()), "English");
-        folder.write("de.lproj/Localizable.strings", "\"key\" = \"Deutsch\";");
-    }
-}
-
 } // namespace
 } // namespace tarn

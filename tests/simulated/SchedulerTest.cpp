@@ -42,25 +42,6 @@ TEST(SchedulerTest, ASeedIsOneInterleavingAndManySeedsAreManyInOrderPerQueue) {
     EXPECT_GT(transcripts.size(), 200u);
 }
 
-TEST(SchedulerTest, WorkIsLeftInTheMiddleForOtherWork) {
-    std::set<std::string> seen;
-    for (std::uint64_t seed = 0; seed < 300; ++seed) {
-        std::string order;
-        SimulatedScheduler scheduler(seed);
-        auto one = scheduler.createQueue("one");
-        auto other = scheduler.createQueue("other");
-        one->async([&] {
-            order += "(";
-            scheduler.yieldPoint();
-            order += ")";
-        });
-        other->async([&] { order += "-"; });
-        scheduler.runReady();
-        seen.insert(order);
-    }
-    EXPECT_THAT(seen, testing::ElementsAre("()-", "(-)", "-()"));
-}
-
 TEST(SchedulerTest, SyncWaitsForEarlierWorkAlsoAcrossATimedWait) {
     SimulatedScheduler scheduler(1);
     SimulatedClock clock(scheduler);
@@ -79,40 +60,6 @@ TEST(SchedulerTest, SyncWaitsForEarlierWorkAlsoAcrossATimedWait) {
     EXPECT_THAT(order, testing::StartsWith("slow "));
     EXPECT_THAT(order, testing::HasSubstr("sync"));
     EXPECT_EQ(scheduler.now(), 17s);
-}
-
-TEST(SchedulerTest, ASignalCountsWhenItComesBeforeTheDeadline) {
-    for (auto [at, expected] : {std::pair{16999ms, true}, std::pair{17000ms, false}}) {
-        SimulatedScheduler scheduler(7);
-        SimulatedClock clock(scheduler);
-        auto signal = clock.makeSignal();
-        auto waiter = scheduler.createQueue("waiter");
-        auto signaller = scheduler.createQueue("signaller");
-        bool outcome = !expected;
-        waiter->async([&] { outcome = signal->wait(17s); });
-        auto timer = scheduler.at(at, signaller, [&] { signal->signal(); });
-        scheduler.runUntilIdle();
-        EXPECT_EQ(outcome, expected);
-        EXPECT_EQ(scheduler.now(), expected ? at : 17s);
-        EXPECT_TRUE(signal->wait(0s));
-    }
-}
-
-TEST(SchedulerTest, ATimerRunsOnItsQueueUnlessItWasDropped) {
-    SimulatedScheduler scheduler(3);
-    auto queue = scheduler.createQueue("queue");
-    std::string order;
-    auto second = scheduler.at(2s, queue, [&] { order += "2"; });
-    auto first = scheduler.at(1s, queue, [&] {
-        EXPECT_TRUE(queue->isCurrent());
-        order += "1";
-        second.reset();
-    });
-    auto third = scheduler.at(3s, queue, [&] { order += "3"; });
-    scheduler.advance(2500ms);
-    EXPECT_EQ(order, "1");
-    scheduler.runUntilIdle();
-    EXPECT_EQ(order, "13");
 }
 
 TEST(SchedulerDeathTest, WaitingInACircleIsReportedWithTheQueues) {

@@ -38,13 +38,6 @@ private:
     std::promise<void>* first_ = nullptr;
 };
 
-TEST(BurstTest, OutsideABurstNothingIsDeferred) {
-    auto flush = std::make_shared<CountedFlush>();
-    Burst::defer(flush);
-    Burst::defer(flush);
-    EXPECT_EQ(flush->count(), 2);
-}
-
 TEST(BurstTest, WhatManyDeferIsDoneOnceAtTheEndOrBeforeABlock) {
     auto flush = std::make_shared<CountedFlush>();
     {

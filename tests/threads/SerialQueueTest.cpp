@@ -60,40 +60,6 @@ TEST_F(SerialQueueTest, WorkOfManyThreadsRunsOneAtATimeAndInOrder) {
     EXPECT_THAT(inOrder, testing::Each(true));
 }
 
-TEST_F(SerialQueueTest, SyncOnAQueueThatNobodyIsInsideRunsInPlace) {
-    auto queue = queues_.create("test.idle");
-    std::thread::id ranOn;
-    queue->sync([&] {
-        ranOn = std::this_thread::get_id();
-        EXPECT_TRUE(queue->isCurrent());
-    });
-    EXPECT_EQ(ranOn, std::this_thread::get_id());
-    EXPECT_FALSE(queue->isCurrent());
-}
-
-TEST_F(SerialQueueTest, SyncWaitsForEverythingSubmittedBefore) {
-    auto queue = queues_.create("test.busy");
-    std::latch release(1);
-    int ran = 0;
-    queue->async([&] { release.wait(); });
-    for (int i = 0; i < 100; ++i)
-        queue->async([&] { ++ran; });
-    std::jthread releaser([&] { release.count_down(); });
-    queue->sync([&] { EXPECT_EQ(ran, 100); });
-}
-
-TEST_F(SerialQueueTest, WorkGivenToAnotherQueueIsTakenUpByTheSameWorker) {
-    auto first = queues_.create("test.first");
-    auto second = queues_.create("test.second");
-    std::promise<bool> sameThread;
-    first->async([&] {
-        second->async([&, worker = std::this_thread::get_id()] {
-            sameThread.set_value(worker == std::this_thread::get_id());
-        });
-    });
-    EXPECT_TRUE(sameThread.get_future().get());
-}
-
 TEST_F(SerialQueueTest, BlockedWorkersDoNotHoldUpOtherQueues) {
     constexpr int blocked = static_cast<int>(WorkerPool::mostSleeping) * 4;
     auto release = clock_.makeSignal();
@@ -122,13 +88,6 @@ TEST_F(SerialQueueTest, TheLastReferenceMayGoOnTheQueueItself) {
                                               })] {});
         EXPECT_TRUE(gone.get_future().get());
     }
-}
-
-TEST_F(SerialQueueTest, WorkRunsAlthoughItsQueueWasLetGo) {
-    std::latch ran(100);
-    for (int i = 0; i < 100; ++i)
-        queues_.create("test.dropped")->async([&] { ran.count_down(); });
-    ran.wait();
 }
 
 /// Queues for whose workers the system has so many threads, and no more until the limit is lifted.
@@ -242,10 +201,6 @@ TEST_P(OneThreadTest, AWorkerDoesNotLeaveAQueueThatSomebodyWaitsFor) {
 }
 
 INSTANTIATE_TEST_SUITE_P(, OneThreadTest, testing::Values(1));
-
-TEST(WorkerQueuesTest, AreNotMadeWithoutASingleThread) {
-    EXPECT_THROW(WorkerQueues([](const auto&) { return false; }), std::system_error);
-}
 
 using SerialQueueDeathTest = SerialQueueTest;
 

@@ -15,13 +15,6 @@ namespace {
 using testing::ElementsAre;
 using testing::HasSubstr;
 
-TEST(SplitLine, KnowsQuotesAndBackslashesAsAShellDoes) {
-    EXPECT_THAT(splitLine("  a  b\t"), ElementsAre("a", "b"));
-    EXPECT_THAT(splitLine(R"(title="A \"b\" c" 'x \y'z a\ b "")"),
-                ElementsAre(R"(title=A "b" c)", R"(x \yz)", "a b", ""));
-    EXPECT_THROW(splitLine("title='open"), std::invalid_argument);
-}
-
 TEST(EncodeCommand, PutsFieldsOfEveryKindIntoTheEnvelope) {
     const auto upsert = VLProtoVelmoMessage::fromData(encodeCommand(
         {"asset.upsertWithMetaData", "identifier=a", "URL=file:///x=y", "duration=1.5", "title="}));
@@ -72,22 +65,6 @@ TEST(DecodeEnvelope, NamesTheEventAndShowsAnErrorsTexts) {
               R"(event errorDict={Key="text"} identifier="q" status=2)");
     EXPECT_EQ(decodeEnvelope({0xFF}).name, "");
     EXPECT_EQ(decodeEnvelope({}).name, "");
-}
-
-TEST(OutputLine, IsOneLineWhateverTheTextsHold) {
-    Dictionary fields;
-    fields["text"].value = std::string("a\n\"b\" \\ \x01\xFFü");
-    fields["number"].value = 0.1;
-    fields["whole"].value = std::int64_t{-3};
-    fields["bytes"].value = Data{0, 0xAB};
-    fields["list"].value = DictionaryList{{std::string("x")}, {std::int32_t{1}}};
-    EXPECT_EQ(
-        outputLine(LineFormat::JSON, "answer", fields),
-        R"({"type":"answer","bytes":"00ab","list":["x",1],"number":0.1,"text":"a\u000a\"b\" \\ \u0001\ufffdü","whole":-3})");
-    EXPECT_EQ(outputLine(LineFormat::text, "answer", fields),
-              R"(answer bytes="00ab" list=["x",1] number=0.1 text="a\u000a\"b\" \\ \u0001\ufffdü" whole=-3)");
-    EXPECT_THAT(describeCommands(),
-                HasSubstr("queuePlayer.upsertWithItems identifier= playerItemIdentifiers="));
 }
 
 } // namespace

@@ -20,24 +20,6 @@ TEST_F(LifetimeTest, ThePlayerIsOnTheBusOnlyWhileAQueuePlayerLives) {
     }
 }
 
-TEST_F(LifetimeTest, TheEndOfThePlayerDoesNotCostItsLastAnswer) {
-    bringPlayer();
-    player_->hold();
-    ChildProcess pausing(bus_.calling({"Pause"}));
-    ASSERT_TRUE(player_->waitForCommands(1));
-    player_->letGo();
-    player_.reset();
-    EXPECT_EQ(pausing.wait(), 0);
-}
-
-TEST_F(LifetimeTest, ASecondServiceHasANameOfItsOwn) {
-    SignalListener second(bus_, "org.mpris.MediaPlayer2.tarnd.instance" + std::to_string(getpid()));
-    bringPlayer();
-    LinuxMediaControls another(applicationName, {bus_.address(), ""});
-    const auto other = FakePlayer::make(another.remoteCommands());
-    EXPECT_THAT(second.until("appeared"), testing::Not(testing::Contains(HasSubstr("no "))));
-}
-
 TEST_F(LifetimeTest, ThePlayerComesBackWithTheBus) {
     const CapturedLog log;
     bringPlayer(1);

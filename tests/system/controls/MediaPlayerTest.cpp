@@ -67,23 +67,6 @@ TEST_F(MediaPlayerTest, EachEventIsSignalledOnceAndInOrder) {
     EXPECT_TRUE(player_->waitForCommands(1)) << "it may be urgent";
 }
 
-TEST_F(MediaPlayerTest, OfManyPublicationsTheLastOneIsShownAndHostileOnesCostNothing) {
-    bringPlayer();
-    for (int number = 0; number < 1000; ++number)
-        publish(track("Track " + std::to_string(number)));
-    for (const std::string& text : {std::string("\xff\xfe\x80\xed\xa0\x80"), std::string(1 << 20, '\n')})
-        publish({.title = text,
-                 .duration = 1e300,
-                 .elapsedTime = {},
-                 .playbackRate = {},
-                 .artist = text,
-                 .albumTitle = text},
-                text);
-    player_->tell({});
-    for (const std::string& line : listener_.until(everything))
-        EXPECT_THAT(line, testing::AnyOf("Player: PlaybackStatus Metadata", "Root: Identity DesktopEntry"));
-}
-
 TEST_F(MediaPlayerTest, WhatPlaysIsControlledAndShownWhateverWasPublishedLast) {
     bringPlayer(2);
     publish(track("Second"));
@@ -146,17 +129,6 @@ TEST_F(MediaPlayerTest, AnAnswerTellsWhatCameOfTheCommand) {
     EXPECT_EQ(listener_.next(), "Player: CanGoNext");
     EXPECT_EQ(bus_.call({"Next"}), "");
     EXPECT_THAT(player_->commands(), ElementsAre("play", "next", "pause"));
-}
-
-TEST_F(MediaPlayerTest, AnActivationThatTakesItsTimeHoldsUpOnlyCommands) {
-    bringPlayer();
-    player_->hold();
-    ChildProcess waiting(bus_.calling({"Play"}));
-    ASSERT_TRUE(player_->waitForCommands(1));
-    EXPECT_EQ(bus_.property("PlaybackStatus"), "s \"Paused\"");
-    EXPECT_EQ(waiting.readLine(std::chrono::milliseconds(50)), std::nullopt);
-    player_->letGo();
-    EXPECT_EQ(waiting.wait(), 0);
 }
 
 TEST(RemoteCommandThreadTest, AFloodOfCommandsIsRefused) {

@@ -146,19 +146,6 @@ TEST_F(ServiceTest, WhatAClientDoesIsSignalledOnceAndThePositionIsRight) {
     EXPECT_EQ(listener_.next(), "Player: PlaybackStatus Metadata CanGoNext CanPlay CanPause CanSeek");
 }
 
-TEST_F(ServiceTest, WhatPlaysIsControlledAlsoWhenAnotherPlayerCameLater) {
-    play();
-    mirror("book,org.example.Books", {"Chapter"});
-    EXPECT_EQ(listener_.next(), "Root: Identity DesktopEntry");
-    EXPECT_EQ(listener_.next(), "Player: PlaybackStatus Metadata"); // the record of the other
-    EXPECT_EQ(bus_.call({"Next"}), "");
-    EXPECT_EQ(listener_.until("Player: PlaybackStatus Metadata CanGoNext").size(), 1U); // "Root:" again
-    EXPECT_EQ(bus_.playerctl({"metadata", "title"}).output, "Second\n");
-    EXPECT_EQ(bus_.call({"PlayPause"}), "");
-    EXPECT_EQ(listener_.next(), statusChanged);
-    EXPECT_EQ(status(), "Paused\n");
-}
-
 TEST_F(ServiceTest, ACallInterruptsWhatPlays) {
     play();
     auto phone = call();

@@ -57,26 +57,5 @@ TEST_F(SleepTest, SleepWaitsForThePause) {
     EXPECT_THAT(player_->commands(), ElementsAre("pause")); // nothing resumed by itself
 }
 
-TEST_F(SleepTest, APlayThatTakesItsTimeDoesNotHoldUpThePauseNorBeginInTheSleep) {
-    for (const float rate : {1.0F, 0.0F}) {
-        bringPlayer(1);
-        ASSERT_TRUE(manager_.waitForLocks(awake));
-        player_->tell(playing(rate));
-        player_->hold("play");
-        ChildProcess waiting(bus_.calling({"Play"}));
-        ASSERT_TRUE(player_->waitForCommands(1));
-        manager_.prepareForSleep(true);
-        EXPECT_TRUE(player_->waitForCommands(2));
-        EXPECT_TRUE(manager_.waitForLocks(rate == 0 ? std::vector<std::string>()
-                                                    : std::vector<std::string>{"idle:block"}));
-        player_->letGo();
-        EXPECT_EQ(waiting.wait(), 0);
-        ASSERT_TRUE(player_->waitForCommands(3));
-        EXPECT_THAT(player_->commands(), ElementsAre("play", "pause", "pause"));
-        player_.reset();
-        EXPECT_THAT(listener_.until("vanished"), testing::SizeIs(rate == 0 ? 1 : 0));
-    }
-}
-
 } // namespace
 } // namespace tarn

@@ -140,22 +140,6 @@ TEST_F(SoundTest, SeeksToTheSampleWhilePlaying) {
     }
 }
 
-TEST_F(SoundTest, IsSilentAtOnceWhenItsLastOwnerLetsGo) {
-    auto player = makePlayer({makeItem(makeSweep(6 * second, 44100, 2))});
-    const Recorder recorder;
-    player->setRate(1);
-    recorder.waitFrames(44'100);
-    player.reset();
-    const std::size_t then = recorder.frames();
-    recorder.waitFrames(22'050);
-    const auto samples = recorder.samples();
-    std::size_t last = samples.size();
-    while (last > 0 && samples[last - 1] == 0)
-        --last;
-    // 50 ms of the sink's own block were on their way, and as much may not have come to the recorder.
-    EXPECT_LT(last / 2, then + 5'292);
-}
-
 TEST_F(SoundTest, GoesOnInSilenceWithoutAServerAndSoundsAgainWhereItIs) {
     CapturedLog log;
     const Recording recording = makeSweep(12 * second, 44100, 2);
@@ -325,20 +309,6 @@ INSTANTIATE_TEST_SUITE_P(Formats, LossyJoin,
                                          std::pair("ogg", "-c:a libvorbis -q:a 7"),
                                          std::pair("opus", "-c:a libopus -b:a 192k")),
                          [](const auto& information) { return std::string(information.param.first); });
-
-TEST_F(SoundTest, AFileThatTurnsOutBadFailsAndTheQueueGoesOn) {
-    const auto bad = makeItem(makeSweep(3 * second, 44100, 2), "bad.flac");
-    const auto good = makeItem(makeSweep(44'100, 44100, 2), "good.wav");
-    std::filesystem::resize_file(folder / "bad.flac", 100'000);
-    const auto player = makePlayer({bad, good});
-    player->setRate(1);
-    ASSERT_TRUE(events.wait(MediaItem::failedToPlayToEndTime));
-    EXPECT_EQ(bad->status(), MediaStatus::failed);
-    ASSERT_TRUE(bad->error());
-    EXPECT_EQ(bad->error()->domain, mediaErrorDomain);
-    ASSERT_TRUE(events.wait(MediaItem::didPlayToEndTime));
-    EXPECT_EQ(good->status(), MediaStatus::readyToPlay);
-}
 
 } // namespace
 } // namespace tarn

@@ -14,35 +14,6 @@ namespace {
 using client::Client;
 using client::Outcome;
 
-TEST(Clients, AreServedOneAfterTheOther) {
-    ServiceUnderTest service;
-    const auto song = service.song();
-    for (int i = 0; i < 3; ++i) {
-        Client client(service.options());
-        EXPECT_TRUE(isServed(client, song));
-    }
-    EXPECT_EQ(service.stop(), 0);
-}
-
-TEST(Clients, ANewOneFindsNothingOfTheOneBeforeWhichIsToldThatAndNothingMore) {
-    ServiceUnderTest service;
-    const auto song = service.song();
-    Client first(service.options());
-    ASSERT_TRUE(isServed(first, song));
-    Client second(service.options());
-    const auto position = second.currentTime("item").get();
-    EXPECT_EQ(position.outcome, Outcome::failed);
-    EXPECT_EQ(position.error.code, 26);
-    EXPECT_TRUE(isServed(second, song));
-
-    std::optional<client::Event> last;
-    while (auto event = first.nextEvent())
-        last = std::move(event);
-    EXPECT_TRUE(std::holds_alternative<client::TakenOver>(*last));
-    EXPECT_EQ(first.currentTime("item").get().outcome, Outcome::takenOver) << "it is not the other's";
-    EXPECT_TRUE(first.connection().isConnected());
-}
-
 TEST(Clients, EveryCommandSentAheadOfAReplacementEndsOnce) {
     constexpr int commands = 500;
     ServiceUnderTest service;
@@ -57,25 +28,6 @@ TEST(Clients, EveryCommandSentAheadOfAReplacementEndsOnce) {
         EXPECT_TRUE(completion.outcome == Outcome::released || completion.outcome == Outcome::takenOver);
     }
     EXPECT_TRUE(isServed(second, service.song()));
-}
-
-TEST(Clients, OneThatDiesAndComesBackAtOnceIsServed) {
-    constexpr int lives = 30;
-    ServiceUnderTest service;
-    const auto path = service.socketPath();
-    for (int i = 0; i < lives; ++i) {
-        const pid_t child = ::fork();
-        if (child == 0) {
-            // As a client that is killed in the middle of its work.
-            const RawClient doomed(path);
-            for (int k = 0; k < 20; ++k)
-                doomed.send(FrameKind::call, 1);
-            ::kill(::getpid(), SIGKILL);
-        }
-        ASSERT_EQ(::waitpid(child, nullptr, 0), child);
-        Client client(service.options());
-        ASSERT_EQ(client.destroyAsset("none").get().outcome, Outcome::released) << i;
-    }
 }
 
 TEST(Clients, ReplacingEachOtherLeaveNothingBehind) {
