@@ -134,9 +134,11 @@ def field(number: int, content) -> bytes:
         return bytes([number << 3 | 5]) + struct.pack("<f", content)
     if isinstance(content, str):
         content = content.encode()
-    length = len(content)
-    prefix = bytes([length]) if length < 128 else bytes([length & 127 | 128, length >> 7])
-    return bytes([number << 3 | 2]) + prefix + content
+    length, prefix = len(content), b""
+    while length > 127:
+        prefix += bytes([length & 127 | 128])
+        length >>= 7
+    return bytes([number << 3 | 2]) + prefix + bytes([length]) + content
 
 
 class Tarn(Player):
