@@ -26,7 +26,9 @@ public:
     /// For a socket on which no files are expected: one that comes is let go, and is taken for the end.
     Received receive(int socket);
 
-    /// For a socket on which files may come. They are left there, with the bytes that they belong to.
+    /// For a socket on which files may come. They are left there, with the bytes that they belong to. When
+    /// much is there `withFiles` may be said of bytes that come before those of a file: a look that fills the
+    /// buffer tells of every file that waits.
     Received receiveUpToFiles(int socket);
 
     /// For a socket that is about to be closed: ends its receiving side and drops what came and was not read.

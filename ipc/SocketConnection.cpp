@@ -125,15 +125,15 @@ void SocketConnection::beginArrival(std::span<const std::uint8_t> bytes) {
 }
 
 bool SocketConnection::finishArrival() {
-    auto files = arrival_ ? arrival_->take() : std::nullopt;
-    if (!files)
+    auto arrived = arrival_ ? arrival_->take() : std::nullopt;
+    if (!arrived)
         return true;
     socket_->endArrival(arrival_->descriptor());
     arrival_.reset();
-    if (files->empty())
+    if (!arrived->isTaken)
         interrupt("its files could not be taken");
     else
-        take(std::exchange(arrivingBytes_, {}), *std::move(files));
+        take(std::exchange(arrivingBytes_, {}), std::move(arrived->files));
     socket_->limitReading();
     return loss_ == Loss::none;
 }

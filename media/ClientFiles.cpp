@@ -51,7 +51,7 @@ public:
 
     int descriptor() const override { return child_.channel().socket(); }
 
-    std::optional<std::vector<ReceivedFile>> take() override {
+    std::optional<Outcome> take() override {
         ReceivedMessage message;
         const Channel::Result result = child_.channel().receiveNow(message, 1);
         if (result == Channel::Result::notNow)
@@ -59,8 +59,10 @@ public:
         alarm_.reset();
         const auto answer = message.as<Ported>();
         if (result != Channel::Result::done || !answer)
-            return std::vector<ReceivedFile>();
+            return Outcome();
         idle_ = answer->idle == 1;
+        if (answer->refusal == Ported::Refusal::noFile)
+            return Outcome{.isTaken = true, .files = {}};
         std::vector<ReceivedFile> files(answer->refusal == Ported::Refusal::notOneFile ? 2 : 1);
         auto held = FilePorter::heldFile(message, *answer);
         if (answer->refusal == Ported::Refusal::none && held && held->form != FileForm::path)
@@ -68,7 +70,7 @@ public:
         else
             for (ReceivedFile& file : files)
                 file.refusal = textOf(answer->refusal);
-        return files;
+        return Outcome{.isTaken = true, .files = std::move(files)};
     }
 
 private:

@@ -124,8 +124,10 @@ Ported Porter::openPath(const std::string& path, FileDescriptor& file) {
 
 Ported Porter::receiveFile(FileDescriptor connection, std::size_t bytes, std::vector<FileDescriptor>& files) {
     files.clear();
-    receiveFiles(connection.get(), bytes, files);
+    const bool taken = receiveFiles(connection.get(), bytes, files);
     connection.reset(); // at once: while it is open here the client does not see the service's end
+    if (taken && files.empty())
+        return {.refusal = Ported::Refusal::noFile, .idle = 1};
     if (files.size() != 1)
         return {.refusal = Ported::Refusal::notOneFile};
     if (!isRegular(files[0].get()))

@@ -107,7 +107,7 @@ struct DropFile {
 
 /// The file that was asked for comes along, or there is none.
 struct Ported {
-    enum class Refusal : std::uint32_t { none, cannotOpen, notRegular, notReadable, notOneFile };
+    enum class Refusal : std::uint32_t { none, cannotOpen, notRegular, notReadable, noFile, notOneFile };
 
     MessageKind kind = MessageKind::ported;
     Refusal refusal = Refusal::none;

@@ -32,8 +32,13 @@ public:
         /// Readable when take() has something to give. Stays open as long as this lives.
         virtual int descriptor() const = 0;
 
-        /// What came, once; empty when it could not be taken. None as long as nothing is known yet.
-        virtual std::optional<std::vector<ReceivedFile>> take() = 0;
+        struct Outcome {
+            bool isTaken = false; ///< otherwise it is not known what became of the bytes
+            std::vector<ReceivedFile> files;
+        };
+
+        /// What came, once. None as long as nothing is known yet.
+        virtual std::optional<Outcome> take() = 0;
     };
 
     /// Takes the next `bytes` bytes out of the socket, and the files among them. Nothing else may read it

@@ -178,6 +178,28 @@ TEST(SocketListener, EndsABrokenStreamWithOneLineAndServesTheOthers) {
     EXPECT_TRUE(good.receive());
 }
 
+TEST(SocketListener, TakesAFileBehindMoreThanOneReadBrings) {
+    std::promise<void> begun;
+    std::promise<void> letGo;
+    TestServer server([&](ReceivedCall call) {
+        if (call.data != bytes("first"))
+            return echo(std::move(call));
+        begun.set_value();
+        letGo.get_future().wait();
+    });
+    const TemporaryFolder folder;
+    const auto path = folder.write("song", "music").string();
+    const FileDescriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC));
+    auto client = server.connect();
+    ASSERT_TRUE(client.send(FrameKind::call, 0, "first"));
+    begun.get_future().wait();
+    ASSERT_TRUE(client.send(FrameKind::call, 0, std::string(100'000, 'c')));
+    ASSERT_TRUE(client.grant("one", path, file.get()));
+    letGo.set_value(); // all of it is there when it is read
+    ASSERT_TRUE(client.send(FrameKind::call, 1) && client.receive());
+    EXPECT_GE(server.tokens.consume("one"), 0);
+}
+
 TEST(SocketListener, RefusesTheSixtyFifthClientUntilOneGoes) {
     TestServer server(echo);
     std::vector<RawClient> clients;
