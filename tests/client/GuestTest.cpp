@@ -36,6 +36,7 @@ TEST(AGuest, NeedsNoThreadInAProgramWithALoopOfItsOwn) {
     const auto threads = numberOfThreads();
     Client client(
         {.socketPath = service.socketPath(), .driver = client::Driver::program, .reconnectLimit = 20s});
+    bool played = false;
     bool ended = false;
     client.upsertAsset({.identifier = "a", .URL = song}, [&](const auto& asset) {
         EXPECT_EQ(asset.value.duration, 1);
@@ -46,8 +47,10 @@ TEST(AGuest, NeedsNoThreadInAProgramWithALoopOfItsOwn) {
     while (!ended) { // as every main loop does
         pollfd ready{client.eventDescriptor(), POLLIN, 0};
         ASSERT_EQ(::poll(&ready, 1, 20'000), 1);
-        for (const auto& event : client.drainEvents())
-            ended |= describe(event) == "player: rate 0"; // the last of what the end brings
+        for (const auto& event : client.drainEvents()) {
+            played |= std::holds_alternative<client::ItemPlayedToEnd>(event);
+            ended |= played && describe(event) == "player: rate 0"; // the last of what the end brings
+        }
     }
     service.kill();
     EXPECT_EQ(describe(*client.nextEvent(20s)), "reconnecting");
