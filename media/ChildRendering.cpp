@@ -72,8 +72,10 @@ RenderedSpan ChildRendering::render(PcmBuffer& buffer, std::size_t maxFrames) {
         const RingReader::Taken taken = takeFromRing(buffer, maxFrames);
         if (taken.what == What::span)
             return spanOf(taken.span);
-        if (taken.what == What::lie || (gone_ && !beginAnew()))
+        if (taken.what == What::lie)
             fail(broken());
+        else if (gone_)
+            settleLoss();
         else
             beginWait();
     }
@@ -129,9 +131,26 @@ RenderedSpan ChildRendering::emptySpan(RenderedSpan::State state) const {
     return span;
 }
 
+/// The child is gone. True when the item has failed with it, false while something is still to come.
+bool ChildRendering::settleLoss() {
+    if (lossAlarm_ || beginAnew())
+        return false;
+    if (!std::exchange(lossWasSeen_, true)) {
+        endWait();
+        lossAlarm_ = loop_.at(loop_.now() + MediaChild::parentEndsWithin, [this] {
+            lossAlarm_.reset();
+            if (settleLoss())
+                goesOn_();
+        });
+        return false;
+    }
+    fail(broken());
+    return true;
+}
+
 /// False when the child has ended by itself, or there is no other.
 bool ChildRendering::beginAnew() {
-    if (!child_ || !child_->endedWithItsParent() || std::exchange(anew_, true))
+    if (!child_ || !child_->endedWithItsParent(0ms) || std::exchange(anew_, true))
         return false;
     auto next = another_();
     if (!next)
@@ -139,6 +158,7 @@ bool ChildRendering::beginAnew() {
     endWait();
     child_ = std::move(next->child);
     ring_ = std::move(next->ring);
+    lossWasSeen_ = false;
     gone_ = false;
     opened_ = false;
     wordsWanted_ = 0;
@@ -191,10 +211,7 @@ bool ChildRendering::readMessages() {
     }
     if (!gone_ || opened_ || error_)
         return true;
-    if (beginAnew())
-        return false;
-    fail(broken());
-    return true;
+    return settleLoss();
 }
 
 /// Takes note of what the child says; false when it cannot be, and then nothing that it says counts.

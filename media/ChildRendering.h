@@ -40,6 +40,7 @@ private:
     RenderedSpan spanOf(const MediaSpan& span);
     RenderedSpan emptySpan(RenderedSpan::State state) const;
     void askToSeek();
+    bool settleLoss();
     bool beginAnew();
     void beginWait();
     void endWait();
@@ -60,6 +61,7 @@ private:
     bool opened_ = false;         // by the child that there is
     bool wasOpened_ = false;      // by it or one before
     bool anew_ = false;           // was begun, and nothing has come since
+    bool lossWasSeen_ = false;    // and was not the parent's then
     bool gone_ = false;           // the child, though what it made is still in the ring
     std::optional<Error> error_;  // nothing follows any more
     std::optional<Error> reason_; // of the span with which this generation fails
@@ -77,6 +79,7 @@ private:
     // While word of the child is waited for.
     RegistrationHandle watch_;
     RegistrationHandle alarm_;
+    RegistrationHandle lossAlarm_; // while it is not known yet whether the parent has ended too
 };
 
 } // namespace tarn

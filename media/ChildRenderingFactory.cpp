@@ -38,7 +38,7 @@ ChildRenderingFactory::begin(const std::shared_ptr<LinuxMediaAsset>& asset) {
     const auto sent = loan.form == FileForm::none
                           ? Channel::Result::broken
                           : child->channel().send(request, std::span(&loan.descriptor, 1));
-    if (sent != Channel::Result::done && !child->endedWithItsParent())
+    if (sent != Channel::Result::done && !child->endedWithItsParent(std::chrono::milliseconds(0)))
         return mediaError(MediaErrorCode::cannotOpen, "The file could not be opened.");
     return ChildRendering::Renderer{*std::move(child), RingReader(std::move(*ring))};
 }

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <chrono>
 #include <cstdint>
 #include <memory>
 #include <utility>
@@ -30,8 +31,14 @@ public:
 
     const Channel& channel() const { return channel_; }
 
-    /// The parent has ended, and this child with it: that says nothing about what it was asked.
-    bool endedWithItsParent() const { return parent_->isGone(); }
+    /// How long the end of the parent may take to be seen behind that of the child.
+    static constexpr std::chrono::milliseconds parentEndsWithin{20};
+
+    /// Of a child that has ended: the parent has too, and so that says nothing about what the child was
+    /// asked. Waits so long for it.
+    bool endedWithItsParent(std::chrono::milliseconds within = parentEndsWithin) const {
+        return parent_->isGone(within);
+    }
 
 private:
     Channel channel_;

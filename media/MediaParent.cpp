@@ -86,10 +86,9 @@ bool MediaParent::isGood() const {
     return result == Channel::Result::notNow;
 }
 
-// The kernel closes its socket before it ends the children, and before it drops those that were asked for.
-bool MediaParent::isGone() const {
+bool MediaParent::isGone(std::chrono::milliseconds within) const {
     pollfd end{.fd = control_.socket(), .events = 0, .revents = 0};
-    return ::poll(&end, 1, 0) == 1;
+    return ::poll(&end, 1, static_cast<int>(within.count())) == 1;
 }
 
 } // namespace tarn

@@ -2,6 +2,7 @@
 
 #include <sys/types.h>
 
+#include <chrono>
 #include <cstdint>
 #include <memory>
 #include <optional>
@@ -39,8 +40,9 @@ public:
     /// made that one crash may have begun to learn.
     bool isGood() const;
 
-    /// True as soon as a child could have ended because of it.
-    bool isGone() const;
+    /// Whether it has ended, or does within this time. The end of a child that it brought about may be seen a
+    /// moment before its own.
+    bool isGone(std::chrono::milliseconds within) const;
 
 private:
     const pid_t process_;
