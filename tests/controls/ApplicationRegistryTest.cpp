@@ -141,5 +141,16 @@ TEST_F(AnApplicationRegistry, LosesOnlyHostileEntriesThemselves) {
         EXPECT_EQ(containing(hostile), std::nullopt) << hostile;
 }
 
+TEST_F(AnApplicationRegistry, FallsBackToNames) {
+    system.write("applications/org.example.Player.desktop", entryText);
+    system.write("applications/org.desktop", entryText);
+    system.write("applications/vendor/tools/alone.desktop", entryText);
+    EXPECT_THAT(containing("org.example.Player"), Optional(Eq("org.example.Player")));
+    EXPECT_THAT(containing("org.example.Player.Watch.Small"), Optional(Eq("org.example.Player")));
+    EXPECT_THAT(containing("vendor-tools-alone"), Optional(Eq("vendor-tools-alone")));
+    EXPECT_EQ(containing("org.example"), std::nullopt);
+    EXPECT_EQ(containing("../org.example.Player"), std::nullopt);
+}
+
 } // namespace
 } // namespace tarn

@@ -67,5 +67,12 @@ TEST(DecodeEnvelope, NamesTheEventAndShowsAnErrorsTexts) {
     EXPECT_EQ(decodeEnvelope({}).name, "");
 }
 
+TEST(SplitLine, KnowsQuotesAndBackslashesAsAShellDoes) {
+    EXPECT_THAT(splitLine("  a  b\t"), ElementsAre("a", "b"));
+    EXPECT_THAT(splitLine(R"(title="A \"b\" c" 'x \y'z a\ b "")"),
+                ElementsAre(R"(title=A "b" c)", R"(x \yz)", "a b", ""));
+    EXPECT_THROW(splitLine("title='open"), std::invalid_argument);
+}
+
 } // namespace
 } // namespace tarn::tool

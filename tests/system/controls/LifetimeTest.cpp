@@ -70,5 +70,13 @@ TEST(LateBusTest, TheServiceGoesOnWithoutABusAndFindsItWhenItComes) {
     EXPECT_TRUE(second.waitFor("The session bus is out of reach"));
 }
 
+TEST_F(LifetimeTest, ASecondServiceHasANameOfItsOwn) {
+    SignalListener second(bus_, "org.mpris.MediaPlayer2.tarnd.instance" + std::to_string(getpid()));
+    bringPlayer();
+    LinuxMediaControls another(applicationName, {bus_.address(), ""});
+    const auto other = FakePlayer::make(another.remoteCommands());
+    EXPECT_THAT(second.until("appeared"), testing::Not(testing::Contains(HasSubstr("no "))));
+}
+
 } // namespace
 } // namespace tarn
