@@ -160,6 +160,8 @@ TEST_P(AStandardErrorSink, LosesWholeLinesRatherThanWaitForItsReader) {
     EXPECT_THAT(channel.readAll(),
                 AllOf(StartsWith("<3>"), HasSubstr(std::to_string(lost) + " lines are missing"),
                       EndsWith("\n" + line)));
+    sink.write(failure);
+    EXPECT_EQ(channel.readAll(), line) << "it is told once";
 }
 
 INSTANTIATE_TEST_SUITE_P(PipesAndSockets, AStandardErrorSink, testing::Bool());
