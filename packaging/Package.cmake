@@ -83,7 +83,7 @@ set(CPACK_DEBIAN_PYTHON_PACKAGE_RECOMMENDS tarnd)
 
 set(CPACK_COMPONENT_DOCUMENTATION_DESCRIPTION "documentation of the background audio service tarnd
 The protocol, how to integrate the service, what the media controls see, what
-to do when something does not play, and examples in C++ and Python.")
+to do when something does not play, and examples in C++, C and Python.")
 set(CPACK_DEBIAN_DOCUMENTATION_PACKAGE_SECTION doc)
 set(CPACK_DEBIAN_DOCUMENTATION_PACKAGE_ARCHITECTURE all)
 include(CPack)
