@@ -107,11 +107,16 @@ private:
         return true;
     }
 
+    static std::optional<std::string> asciiOf(BytesView characters) {
+        if (std::ranges::any_of(characters, [](std::uint8_t character) { return character > 0x7F; }))
+            return std::nullopt;
+        return std::string(characters.begin(), characters.end());
+    }
+
     std::optional<std::string> text(std::uint64_t index) const {
         const auto found = object(index);
         if (found && found->type == asciiType && found->count <= found->content.size())
-            return std::string(found->content.begin(),
-                               found->content.begin() + static_cast<std::ptrdiff_t>(found->count));
+            return asciiOf(found->content.first(static_cast<std::size_t>(found->count)));
         if (found && found->type == utf16Type && found->count <= found->content.size() / 2)
             return utf8Of(found->content.first(static_cast<std::size_t>(2 * found->count)));
         return std::nullopt;
